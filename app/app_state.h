@@ -1,0 +1,88 @@
+/**
+ * @file app_state.h
+ * The state the dialog, the preview thread and the recording callbacks share. It lives for the whole
+ * program; none of it belongs to a dialog object. Words that two threads touch are read and written
+ * through shared().
+ */
+#ifndef APP_STATE_H
+#define APP_STATE_H
+
+#include <pthread.h>
+
+#include <QCheckBox>
+#include <QTimer>
+#include <atomic>
+#include <cstdio>
+#include <ctime>
+
+#include "global.h"
+#include "zv_type.h"
+
+// The card and what the operator chose for it.
+extern HANDLE zv_handle;
+extern ZV_VIDEO_STANDARD zv_format;
+extern ZV_RESOLUTION zv_resolution;
+extern ZV_VIDEO_MODE zv_mode;
+extern ZV_VIDEO_PROPERTY zv_property;
+extern ZV_RECT zv_rect;
+extern ZV_RECT zv_rect_motion;
+extern ZV_VIDEO_CONFIG zv_config;
+extern ZV_VIDEO_CONFIG zv_clean_config;
+extern ZV_VIDEO_CODEC zv_record_mode;
+
+// Preview. `video_enable` is written under the mutex and read by the preview thread without it.
+extern pthread_mutex_t thread_mutex;
+extern int video_enable;
+extern int g_finish_preview;
+extern int g_width;
+extern int g_height;
+
+// Channel sets, bit n = channel n + 1.
+extern unsigned int g_preview_ch;
+extern unsigned int g_record_ch;
+extern unsigned int g_audio_ch;
+extern unsigned int g_video_ch;
+extern unsigned int g_motion_ch;
+extern int g_valid_record_ch;
+extern CHANNEL_SETTING_MODE g_channel_mode;
+extern QCheckBox *g_check_handle[16];
+
+// Recording.
+extern int g_finish_record;
+extern int g_record_width;
+extern int g_record_height;
+extern char g_filepath[256];
+extern char g_video_path[256];
+extern char g_audio_path[256];
+extern FILE *g_fp_mpg4[16];
+extern FILE *g_fp_mjpg[16];
+extern FILE *g_fp_audio[4];
+extern int g_cur_hour;
+extern int g_min_diskspace;
+extern int g_time_interval;
+extern QTimer timer;
+extern time_t ttt;
+extern int lenlen;
+
+/// Status of the most recent SDK call of the dialog.
+extern int g_res;
+
+extern const char *const ntsc_fps_str[];
+extern const char *const pal_fps_str[];
+
+/// A word that two threads share.
+template <typename T>
+std::atomic_ref<T> shared(T &word) {
+  return std::atomic_ref<T>(word);
+}
+
+/// Keeps the status of an SDK call in g_res and prints `message` as a line when the call failed.
+/// True on success. Every SDK call of the dialog whose failure is reported goes through here.
+bool sdk_ok(int status, const char *message);
+
+// Callbacks of the recording, called on the SDK's capture threads.
+void mpeg4_call_back(unsigned int ch, unsigned char *data, int length, int flags);
+void mjpeg_call_back(unsigned int ch, unsigned char *data, int length, int flags);
+void audio_call_back(unsigned int ch, unsigned char *data, int length, int flags);
+
+#endif

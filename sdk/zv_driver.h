@@ -1,0 +1,253 @@
+/**
+ * @file zv_driver.h
+ * The device boundary: node paths, command codes, wire records, registers and memory regions of the
+ * card's kernel driver. Nothing else in the tree repeats a code, a size or an offset.
+ *
+ * Command codes follow the Linux _IOC layout, but they are what the driver matches, so they stand
+ * here as numbers. All words are little-endian; every record is passed by address.
+ */
+#ifndef ZV_DRIVER_H
+#define ZV_DRIVER_H
+
+#include <cstddef>
+
+#include "zv_type.h"
+
+namespace zarvo::driver {
+
+// Device nodes.
+inline constexpr char kEncoderNode[] = "/dev/zarvo_enc0";
+inline constexpr char kDisplayNode[] = "/dev/zarvo_disp0";
+inline constexpr char kAudioNode[] = "/dev/zarvo_g723_0";
+inline constexpr char kVideoInputNode[] = "/dev/zarvo_vin0";
+inline constexpr char kDecoderNode[] = "/dev/zarvo_dec0";
+
+// Commands of the encoder device.
+inline constexpr u32 ENC_IOC_SET_SCALE = 0x40086500;           // ChannelValue
+inline constexpr u32 ENC_IOC_SET_INTERVAL = 0x400C6501;        // Interval
+inline constexpr u32 ENC_IOC_SET_GOP = 0x40086502;             // ChannelValue
+inline constexpr u32 ENC_IOC_SET_QP = 0x40086503;              // ChannelValue
+inline constexpr u32 ENC_IOC_GET_SCALE = 0xC0086504;           // ChannelValue
+inline constexpr u32 ENC_IOC_GET_INTERVAL = 0xC00C6505;        // Interval
+inline constexpr u32 ENC_IOC_GET_GOP = 0xC0086506;             // ChannelValue
+inline constexpr u32 ENC_IOC_GET_QP = 0xC0086507;              // ChannelValue
+inline constexpr u32 ENC_IOC_MPEG4_DONE = 0x00006509;          // no argument
+inline constexpr u32 ENC_IOC_CHANNEL_NUMBER_ON = 0xC004650B;   // u32 channel
+inline constexpr u32 ENC_IOC_CHANNEL_NUMBER_OFF = 0xC004650C;  // u32 channel
+inline constexpr u32 ENC_IOC_WRITE_REG = 0xC008650E;           // Register
+inline constexpr u32 ENC_IOC_MPEG4_REQUEST = 0x0000650F;       // no argument
+inline constexpr u32 ENC_IOC_STOP = 0x00006510;                // 0
+inline constexpr u32 ENC_IOC_SET_STANDARD = 0xC0046511;        // u32 standard
+inline constexpr u32 ENC_IOC_START = 0x00006512;               // no argument
+inline constexpr u32 ENC_IOC_SET_CBR = 0xC00C6513;             // Cbr
+inline constexpr u32 ENC_IOC_SET_QP_RANGE = 0xC0106514;        // QpRange
+
+// Commands of the display device.
+inline constexpr u32 DISP_IOC_BEGIN_UPDATE = 0x00006400;      // no argument
+inline constexpr u32 DISP_IOC_END_UPDATE = 0x00006401;        // no argument
+inline constexpr u32 DISP_IOC_SET_WINDOW = 0x40206402;        // ZV_DISPLAY_WINDOW
+inline constexpr u32 DISP_IOC_SET_ZOOM = 0x400C6403;          // Zoom
+inline constexpr u32 DISP_IOC_SET_SOURCE_CFG = 0x40046406;    // u32: bits 28-31 source group
+inline constexpr u32 DISP_IOC_SET_GRID = 0x40306407;          // Grid
+inline constexpr u32 DISP_IOC_SET_RECT = 0x401C6408;          // FrameRect
+inline constexpr u32 DISP_IOC_MOTION_TRACE_ON = 0x00006409;   // no argument
+inline constexpr u32 DISP_IOC_MOTION_TRACE_OFF = 0x0000640A;  // no argument
+inline constexpr u32 DISP_IOC_GET_WIDTH = 0x8004640B;         // u32 pixels, out
+inline constexpr u32 DISP_IOC_GET_HEIGHT = 0x8004640C;        // u32 lines of one field, out
+inline constexpr u32 DISP_IOC_SET_STANDARD = 0xC004640D;      // u32 standard
+inline constexpr u32 DISP_IOC_READ_REG = 0xC008640E;          // Register, value out
+inline constexpr u32 DISP_IOC_WRITE_REG = 0xC008640F;         // Register
+inline constexpr u32 DISP_IOC_PREVIEW_ON = 0x00006410;        // no argument
+inline constexpr u32 DISP_IOC_PREVIEW_OFF = 0x00006411;       // no argument
+inline constexpr u32 DISP_IOC_GET_MOTION = 0x80046412;        // u32 channel bits, out
+inline constexpr u32 DISP_IOC_SELECT_BUFFER = 0xC0046413;     // u32 preview buffer 0-3
+
+// Commands of the video-input device.
+inline constexpr u32 VIN_IOC_SET_MASK = 0x40147601;           // Mask
+inline constexpr u32 VIN_IOC_SET_MOTION_MAP = 0x40187602;     // MotionMap
+inline constexpr u32 VIN_IOC_SET_STANDARD = 0xC0047604;       // u32 standard
+inline constexpr u32 VIN_IOC_READ_REG = 0xC0087605;           // Register, value out
+inline constexpr u32 VIN_IOC_WRITE_REG = 0xC0087606;          // Register
+inline constexpr u32 VIN_IOC_READ_TW2815 = 0xC0037607;        // DecoderRegister, value out
+inline constexpr u32 VIN_IOC_WRITE_TW2815 = 0xC0037608;       // DecoderRegister
+inline constexpr u32 VIN_IOC_SET_WIDTH = 0xC0047609;          // u32 pixels, 720 or 704
+inline constexpr u32 VIN_IOC_BOARD_CMD = 0xC008760A;          // BoardCommand, reply out
+inline constexpr u32 VIN_IOC_GET_MOTION_LEVELS = 0xC002760B;  // MotionLevels; the size field says 2
+
+/// A value of one channel.
+struct ChannelValue {
+  u32 channel;
+  u32 value;
+};
+
+/// Frame interval of one channel.
+struct Interval {
+  u32 channel;
+  u32 code;  ///< bits 0-7 frame-skip count, bit 9 drop mode
+  u32 drop;  ///< the drop mode again; unused when reading
+};
+inline constexpr u32 kIntervalSkipMask = 0xFF;
+inline constexpr u32 kIntervalDropShift = 9;
+
+struct Cbr {
+  u32 channel;
+  u32 value;
+  u32 enable;
+};
+
+struct QpRange {
+  u32 channel;
+  u32 max;
+  u32 min;
+  u32 enable;
+};
+
+/// A codec-chip or video-input register.
+struct Register {
+  u32 address;
+  u32 value;
+};
+
+struct Zoom {
+  u32 level;
+  u32 x;
+  u32 y;
+};
+
+struct Grid {
+  u32 column[5];
+  u32 row[5];
+  u32 cells;  ///< bit row * 4 + column for each cell with an ordinary window
+  u32 reserved;
+};
+
+struct FrameRect {
+  u32 number;  ///< kScreenFrame or kPipFrame
+  u32 x_start;
+  u32 y_start;
+  u32 x_end;
+  u32 y_end;
+  u32 enable;
+  u32 reserved;
+};
+inline constexpr u32 kScreenFrame = 0;
+inline constexpr u32 kPipFrame = 1;
+
+/// A privacy mask; note both x edges before both y edges.
+struct Mask {
+  u32 channel;
+  u32 x_start;
+  u32 x_end;
+  u32 y_start;
+  u32 y_end;
+};
+
+/// Thresholds of a block rectangle. The natural layout of the caller's pointer width: 32 bytes on a
+/// 64-bit machine, though the code's size field stays 24.
+struct MotionMap {
+  u32 channel;
+  u32 column;
+  u32 row;
+  u32 columns;
+  u32 rows;
+  const u16 *thresholds;  ///< columns x rows values
+};
+inline constexpr u32 kMotionBlock = 16;    ///< pixels and lines of a motion block
+inline constexpr u32 kMotionMapSide = 64;  ///< blocks a side of a whole map
+
+/// A TW2815 register.
+struct DecoderRegister {
+  u8 chip;
+  u8 address;
+  u8 value;
+};
+
+struct BoardCommand {
+  u32 command;
+  u32 reply;
+};
+
+struct MotionLevels {
+  u16 level[16];
+};
+
+static_assert(sizeof(ChannelValue) == 8 && sizeof(Register) == 8 && sizeof(BoardCommand) == 8);
+static_assert(sizeof(Interval) == 12 && sizeof(Cbr) == 12 && sizeof(Zoom) == 12);
+static_assert(sizeof(QpRange) == 16 && sizeof(Mask) == 20 && sizeof(FrameRect) == 28);
+static_assert(sizeof(Grid) == 48 && offsetof(Grid, row) == 20 && offsetof(Grid, cells) == 40);
+static_assert(sizeof(ZV_DISPLAY_WINDOW) == 32 && offsetof(ZV_DISPLAY_WINDOW, flags) == 28);
+static_assert(sizeof(DecoderRegister) == 3 && sizeof(MotionLevels) == 32);
+static_assert(offsetof(Mask, x_end) == 8 && offsetof(Mask, y_start) == 12);
+static_assert(offsetof(MotionMap, rows) == 16 &&
+              offsetof(MotionMap, thresholds) == (sizeof(void *) == 8 ? 24 : 20));
+
+// Scale codes of ENC_IOC_SET_SCALE; only D1 differs from ZV_SCALE_VALUE.
+inline constexpr u32 kScaleCodeD1 = 9;
+
+// Stream region, mapped from the encoder device at offset 0.
+inline constexpr std::size_t kStreamRegionSize = 0x200000;
+inline constexpr std::size_t kMjpegAreaOffset = 0x100000;
+inline constexpr std::size_t kMpeg4AreaSize = kMjpegAreaOffset;
+inline constexpr std::size_t kMjpegAreaSize = kStreamRegionSize - kMjpegAreaOffset;
+
+// MPEG-4 area: descriptor, then the bitstream.
+inline constexpr std::size_t kMpeg4DescriptorSize = 64;
+inline constexpr std::size_t kMpeg4ReadSize = 0x100000;
+inline constexpr std::size_t kMpeg4TimeSeconds = 20;       ///< u32 in the descriptor
+inline constexpr std::size_t kMpeg4TimeMicroseconds = 24;  ///< u32 in the descriptor
+
+// Motion-JPEG area: a kilobyte of the SDK's own, descriptor, then the scan data.
+inline constexpr std::size_t kMjpegDescriptorOffset = 1024;
+inline constexpr std::size_t kMjpegDescriptorSize = 16;
+inline constexpr std::size_t kMjpegDataOffset = kMjpegDescriptorOffset + kMjpegDescriptorSize;
+inline constexpr std::size_t kMjpegReadSize = kMjpegAreaSize - kMjpegDescriptorOffset;
+
+struct MjpegDescriptor {
+  u32 channel;
+  u32 width;
+  u32 height;
+  u32 reserved;
+};
+static_assert(sizeof(MjpegDescriptor) == kMjpegDescriptorSize && kMjpegReadSize == 0xFFC00);
+
+// Audio reads: one block an input, input n at n * kAudioBlockSize.
+inline constexpr std::size_t kAudioBlockSize = 48;
+inline constexpr std::size_t kAudioReadCount = 4;
+
+// Preview buffers, mapped read-only from the display device; UYVY pictures.
+inline constexpr u32 kPreviewBuffers = 4;
+inline constexpr std::size_t kPreviewBufferSize = 0x240000;
+
+// Codec-chip registers.
+inline constexpr u32 kRegMotionEnable = 0x260;    ///< bits 16-31: detection on a channel
+inline constexpr u32 kRegMotionControl = 0x268;   ///< written 0xFFFF
+inline constexpr u32 kRegDisplayState = 0x310;    ///< bit 31: the display is running
+inline constexpr u32 kRegMjpegQuality = 0x670;    ///< written through the encoder device
+inline constexpr u32 kRegWatchdogPeriod = 0xBE4;  ///< kWatchdogPeriod while fed, 0 off
+inline constexpr u32 kMotionEnableMask = 0xFFFF0000;
+inline constexpr u32 kMotionControlAll = 0xFFFF;
+inline constexpr u32 kDisplayStateBit = 0x80000000;
+inline constexpr u32 kWatchdogPeriod = 0x1FF;
+
+// Video-input registers.
+inline constexpr u32 kRegPrivacyMask = 0x140;  ///< + 4 * channel: x_start, x_end, y_start, y_end / 8
+inline constexpr u32 kRegRouting = 0x180;      ///< + 4 * window: bits 28-31 the channel shown
+inline constexpr u32 kRoutingShift = 28;
+
+// TW2815 registers; channels 4k to 4k + 3 sit on chip k.
+inline constexpr u32 kDecoderChips = 4;
+inline constexpr u32 kChannelsPerChip = 4;
+inline constexpr u8 kDecoderProperty = 0x07;  ///< + 16 * (channel mod 4): hue, then the others
+inline constexpr u8 kDecoderChannelStride = 0x10;
+inline constexpr u8 kDecoderStatus = 0x5A;  ///< bits 0-3 video, 4-7 audio present
+
+// Board controller.
+inline constexpr u32 kBoardWatchdogOn = 0x2B;
+inline constexpr u32 kBoardWatchdogOff = 0x2D;
+inline constexpr u32 kBoardVersion = 0x3A;
+inline constexpr u32 kBoardWatchdogOnReply = 0xA3;
+inline constexpr u32 kBoardWatchdogOffReply = 0xA5;
+
+}  // namespace zarvo::driver
+
+#endif

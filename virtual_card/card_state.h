@@ -1,0 +1,72 @@
+/**
+ * @file card_state.h
+ * What the card has been told: the settings behind its registers and commands. The devices write it,
+ * the engine draws and encodes from a copy.
+ */
+#ifndef VIRTUAL_CARD_CARD_STATE_H
+#define VIRTUAL_CARD_CARD_STATE_H
+
+#include <array>
+
+#include "virtual_card.h"
+#include "zv_driver.h"
+
+namespace virtual_card {
+
+namespace driver = zarvo::driver;
+
+inline constexpr unsigned kChannels = ZV_CHANNELS;
+inline constexpr unsigned kAudioInputs = ZV_AUDIO_CHANNELS;
+
+struct EncoderSettings {
+  u32 scale_code = 0;     ///< 0 off, 1 half D1, 2 CIF, 9 D1
+  u32 interval_code = 0;  ///< bits 0-7 skip, bit 9 drop mode
+  u32 gop = 0;
+  u32 qp = 0;
+  driver::Cbr cbr{};
+  driver::QpRange qp_range{};
+  bool number_overlay = false;  ///< the channel number is burnt into the encoded picture
+};
+
+/// Decoder registers of a channel, 128 neutral.
+struct PictureSettings {
+  u8 hue = 128;
+  u8 saturation = 128;
+  u8 contrast = 128;
+  u8 brightness = 128;
+};
+
+struct ChannelState {
+  EncoderSettings encoder;
+  PictureSettings picture;
+  driver::Mask mask{};  ///< pixels and lines, already in the chip's units of 8; empty: no mask
+  Scene scene = Scene::moving;
+  bool lost = false;
+};
+
+struct DisplayState {
+  std::array<ZV_DISPLAY_WINDOW, 16> window{};
+  std::array<u32, 16> routing{};  ///< channel shown at each window; this, not window.channel, decides
+  driver::Zoom zoom{};
+  std::array<driver::FrameRect, 2> frame{};
+  driver::Grid grid{};
+  bool on = false;
+  bool motion_trace = false;
+};
+
+struct CardState {
+  u32 standard = VIDEO_STANDARD_ZV_NTSC;
+  u32 width = 720;
+  bool encoding = false;  ///< between ENC_IOC_START and ENC_IOC_STOP
+  u32 mjpeg_quality = 0x02000102;
+  u32 motion_enable = 0;  ///< bit n: detection on channel n
+  u32 sound_present = 0xF;
+  std::array<ChannelState, kChannels> channel{};
+  DisplayState display;
+
+  u32 lines() const { return standard == VIDEO_STANDARD_ZV_NTSC ? 480 : 576; }
+};
+
+}  // namespace virtual_card
+
+#endif
