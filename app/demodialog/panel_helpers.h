@@ -1,0 +1,38 @@
+/**
+ * @file panel_helpers.h
+ * What the panels of the dialog have in common: reading numbers and tables, unchecking radio buttons.
+ */
+#ifndef PANEL_HELPERS_H
+#define PANEL_HELPERS_H
+
+#include <QAbstractButton>
+#include <QButtonGroup>
+#include <QLineEdit>
+#include <cstddef>
+
+/// The number typed into an edit, base 10. Text that is no number of 32 bits, also an empty one, is 0;
+/// blanks around a number do not matter.
+inline int number_in(const QLineEdit *edit) {
+  return edit->text().toInt();
+}
+
+/// The value that belongs to item `index` of a combo box; `fallback` for an index without a value.
+template <typename T, std::size_t N>
+T item_value(const T (&table)[N], int index, T fallback) {
+  return index >= 0 && static_cast<std::size_t>(index) < N ? table[index] : fallback;
+}
+
+/// Unchecks a radio button. An exclusive button refuses to be unchecked, so that no button of its group
+/// would be chosen; the exclusiveness is lifted for the moment.
+inline void uncheck(QAbstractButton *button) {
+  const bool auto_exclusive = button->autoExclusive();
+  QButtonGroup *const group = button->group();
+  const bool exclusive = group && group->exclusive();
+  button->setAutoExclusive(false);
+  if (group) group->setExclusive(false);
+  button->setChecked(false);
+  button->setAutoExclusive(auto_exclusive);
+  if (group) group->setExclusive(exclusive);
+}
+
+#endif
