@@ -1,0 +1,68 @@
+/**
+ * @file card.h
+ * What every example needs: an open card that closes itself, and SDK statuses turned into exceptions.
+ */
+#ifndef CARD_H
+#define CARD_H
+
+#include <stdexcept>
+#include <string>
+
+#include "zv_lib.h"
+
+/// What a status means, in words for the person at the keyboard.
+inline const char *status_text(int status) {
+  switch (status) {
+    case ZV_ERR_OPEN:
+      return "no device node could be opened; is the driver loaded, or the virtual card in front?";
+    case ZV_ERR_ALREADY_OPEN:
+      return "a card is already open in this process";
+    case ZV_ERR_NO_MEMORY:
+      return "out of memory, or a region of the card could not be mapped";
+    case ZV_ERR_MODE:
+      return "no such preview mode";
+    case ZV_ERR_CHANNEL:
+      return "channel out of range";
+    case ZV_ERR_STANDARD:
+      return "no such video standard";
+    case ZV_ERR_RESOLUTION:
+      return "no such resolution";
+    case ZV_ERR_CONFIG:
+      return "the settings are invalid or exceed the frame-rate budget of the card";
+    case ZV_ERR_PARAM:
+      return "value out of range";
+    case ZV_ERR_THREAD_CREATE:
+      return "a thread could not be created";
+    case ZV_ERR_THREAD_JOIN:
+      return "a thread could not be ended";
+    case ZV_ERR_CLOSE:
+      return "a device node could not be closed";
+    case ZV_ERR_DEVICE:
+      return "the card refused or did not answer";
+    default:
+      return "unknown status";
+  }
+}
+
+/// Throws when an SDK call has failed: "zv_Open failed with status 1: no device node ...".
+inline void check(int status, const char *call) {
+  if (status != ZV_OK) {
+    throw std::runtime_error(std::string(call) + " failed with status " + std::to_string(status) + ": " +
+                             status_text(status));
+  }
+}
+
+/// An open card. A capture that still runs is stopped before the card is closed.
+struct Card {
+  HANDLE handle = nullptr;
+
+  Card() { check(zv_Open(&handle), "zv_Open"); }
+  ~Card() {
+    zv_Stop(handle);
+    zv_Close(handle);
+  }
+  Card(const Card &) = delete;
+  Card &operator=(const Card &) = delete;
+};
+
+#endif

@@ -1,0 +1,119 @@
+#include "record_options.h"
+
+#include <getopt.h>
+
+#include <charconv>
+#include <cstdio>
+#include <cstdlib>
+#include <map>
+#include <string>
+
+namespace {
+
+constexpr char kHelp[] =
+    "Usage: zarvo_record [options]\n"
+    "Records channels of the capture card, one elementary stream a file.\n\n"
+    "  --seconds N         how long, 1 to 86400 (5)\n"
+    "  --channels LIST     video channels, e.g. 1-16 or 1,3,5-8\n"
+    "                      (as many as the card encodes at the full rate: 16 cif, 8 half-d1 or 4 d1)\n"
+    "  --codec NAME        mpeg4 or mjpeg (mpeg4)\n"
+    "  --scale NAME        cif, half-d1 or d1 (cif)\n"
+    "  --standard NAME     ntsc or pal (ntsc)\n"
+    "  --audio LIST        audio inputs, e.g. 1-4, or none (1-4)\n"
+    "  --output DIR        where the files go; made when missing (recordings)\n"
+    "  --help              this text\n";
+
+const std::map<std::string, ZV_SCALE_VALUE> kScales = {
+    {"cif", SCALE_ZV_CIF}, {"half-d1", SCALE_ZV_HALF_D1}, {"d1", SCALE_ZV_D1}};
+const std::map<std::string, ZV_VIDEO_CODEC> kCodecs = {{"mpeg4", VIDEO_CODEC_ZV_MPEG4},
+                                                       {"mjpeg", VIDEO_CODEC_ZV_MJPEG}};
+const std::map<std::string, ZV_VIDEO_STANDARD> kStandards = {{"ntsc", VIDEO_STANDARD_ZV_NTSC},
+                                                             {"pal", VIDEO_STANDARD_ZV_PAL}};
+/// The first channels of each size that the card's frame-rate budget holds at the full rate.
+const std::map<ZV_SCALE_VALUE, u32> kBudget = {
+    {SCALE_ZV_CIF, 0xFFFF}, {SCALE_ZV_HALF_D1, 0xFF}, {SCALE_ZV_D1, 0xF}};
+
+unsigned parse_number(const std::string &option, const std::string &text, unsigned highest) {
+  unsigned number = 0;
+  const char *const text_end = text.data() + text.size();
+  const auto [end, error] = std::from_chars(text.data(), text_end, number);
+  if (error != std::errc{} || end != text_end || number < 1 || number > highest) {
+    throw UsageError(option + ": '" + text + "' is not a number from 1 to " + std::to_string(highest));
+  }
+  return number;
+}
+
+/// "1,3,5-8" to a mask with bit 0 for number 1.
+u32 parse_list(const std::string &option, const std::string &text, unsigned highest) {
+  u32 mask = 0;
+  for (std::size_t at = 0, comma = 0; comma != std::string::npos; at = comma + 1) {
+    comma = text.find(',', at);
+    const std::string item = text.substr(at, comma == std::string::npos ? comma : comma - at);
+    const std::size_t dash = item.find('-');
+    const unsigned first = parse_number(option, item.substr(0, dash), highest);
+    const unsigned last =
+        dash == std::string::npos ? first : parse_number(option, item.substr(dash + 1), highest);
+    if (last < first) throw UsageError(option + ": the range '" + item + "' runs backwards");
+    for (unsigned number = first; number <= last; ++number) mask |= 1u << (number - 1);
+  }
+  return mask;
+}
+
+template <typename Value>
+Value parse_name(const std::string &option, const std::string &text,
+                 const std::map<std::string, Value> &values) {
+  if (const auto found = values.find(text); found != values.end()) return found->second;
+  std::string possible;
+  for (const auto &[name, value] : values) possible += (possible.empty() ? "" : ", ") + name;
+  throw UsageError(option + ": '" + text + "' is unknown; possible are " + possible);
+}
+
+}  // namespace
+
+RecordOptions parse_options(int argc, char **argv) {
+  static const option kLong[] = {{"seconds", required_argument, nullptr, 's'},
+                                 {"channels", required_argument, nullptr, 'c'},
+                                 {"codec", required_argument, nullptr, 'v'},
+                                 {"scale", required_argument, nullptr, 'z'},
+                                 {"standard", required_argument, nullptr, 't'},
+                                 {"audio", required_argument, nullptr, 'a'},
+                                 {"output", required_argument, nullptr, 'o'},
+                                 {"help", no_argument, nullptr, 'h'},
+                                 {nullptr, 0, nullptr, 0}};
+  RecordOptions options;
+  for (int letter; (letter = getopt_long(argc, argv, "", kLong, nullptr)) != -1;) {
+    const std::string text = optarg ? optarg : "";
+    switch (letter) {
+      case 's':
+        options.seconds = parse_number("--seconds", text, 86400);
+        break;
+      case 'c':
+        options.channels = parse_list("--channels", text, ZV_CHANNELS);
+        break;
+      case 'v':
+        options.codec = parse_name("--codec", text, kCodecs);
+        break;
+      case 'z':
+        options.scale = parse_name("--scale", text, kScales);
+        break;
+      case 't':
+        options.standard = parse_name("--standard", text, kStandards);
+        break;
+      case 'a':
+        options.audio = text == "none" ? 0 : parse_list("--audio", text, ZV_AUDIO_CHANNELS);
+        break;
+      case 'o':
+        options.output = text;
+        break;
+      case 'h':
+        std::fputs(kHelp, stdout);
+        std::exit(0);
+      default:
+        throw UsageError("see --help for the options");  // getopt_long has named the culprit
+    }
+  }
+  if (optind < argc) throw UsageError(std::string("'") + argv[optind] + "' is not an option; see --help");
+  if (options.output.empty()) throw UsageError("--output: the name of the folder is empty");
+  if (options.channels == 0) options.channels = kBudget.at(options.scale);
+  return options;
+}
