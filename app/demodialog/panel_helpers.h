@@ -6,7 +6,6 @@
 #define PANEL_HELPERS_H
 
 #include <QAbstractButton>
-#include <QButtonGroup>
 #include <QLineEdit>
 #include <cstddef>
 
@@ -22,17 +21,12 @@ T item_value(const T (&table)[N], int index, T fallback) {
   return index >= 0 && static_cast<std::size_t>(index) < N ? table[index] : fallback;
 }
 
-/// Unchecks a radio button. An exclusive button refuses to be unchecked, so that no button of its group
-/// would be chosen; the exclusiveness is lifted for the moment.
+/// Unchecks a radio button. An exclusive button refuses to be unchecked, since no button of its group
+/// would be chosen then; the exclusiveness is lifted for the moment.
 inline void uncheck(QAbstractButton *button) {
-  const bool auto_exclusive = button->autoExclusive();
-  QButtonGroup *const group = button->group();
-  const bool exclusive = group && group->exclusive();
   button->setAutoExclusive(false);
-  if (group) group->setExclusive(false);
   button->setChecked(false);
-  button->setAutoExclusive(auto_exclusive);
-  if (group) group->setExclusive(exclusive);
+  button->setAutoExclusive(true);
 }
 
 #endif

@@ -120,6 +120,7 @@ void DemoDialog::WriteHeader(FILE *fp, int ch) {
   update_record_size(comboQualityMode->currentIndex());
   header.record_width = g_record_width;
   header.record_height = g_record_height;
-  std::snprintf(header.channel_label, sizeof header.channel_label, "Channel %d", ch + 1);
+  const std::string label = "Channel " + std::to_string(ch + 1);
+  label.copy(header.channel_label, sizeof header.channel_label);
   std::fwrite(&header, sizeof header, 1, fp);
 }

@@ -1,0 +1,61 @@
+#include "launch.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+
+namespace players {
+namespace {
+
+/// Returns only when the program cannot be run; then errno tells why.
+void run(const Command &command) {
+  std::vector<char *> argv = {const_cast<char *>(command.program.c_str())};
+  for (const std::string &argument : command.arguments) argv.push_back(const_cast<char *>(argument.c_str()));
+  argv.push_back(nullptr);
+  execvp(argv[0], argv.data());
+}
+
+}  // namespace
+
+int open_argument(int argc, char **argv) {
+  if (argc != 2) {
+    std::fprintf(stderr, "Usage: %s FILE\n", argc > 0 ? argv[0] : "player");
+    return -1;
+  }
+  const int file = open(argv[1], O_RDONLY);
+  if (file < 0) {
+    std::fprintf(stderr, "%s: %s\n", argv[1], std::strerror(errno));
+    return -1;
+  }
+  struct stat info {};
+  if (fstat(file, &info) != 0 || S_ISDIR(info.st_mode)) {
+    std::fprintf(stderr, "%s: not a recording but a folder\n", argv[1]);
+    close(file);
+    return -1;
+  }
+  return file;
+}
+
+std::string base_name(const std::string &path) {
+  return path.substr(path.rfind('/') + 1);
+}
+
+int hand_over(int file, const std::vector<Command> &commands) {
+  if (dup2(file, STDIN_FILENO) < 0) {
+    std::perror("dup2");
+    return 1;
+  }
+  if (file != STDIN_FILENO) close(file);
+  for (const Command &command : commands) {
+    run(command);
+    if (errno != ENOENT) std::fprintf(stderr, "%s: %s\n", command.program.c_str(), std::strerror(errno));
+  }
+  std::fputs("No player found. Install ffplay (package ffmpeg) or mpv.\n", stderr);
+  return 1;
+}
+
+}  // namespace players
