@@ -10,10 +10,12 @@
 #include <pthread.h>
 
 #include <QCheckBox>
+#include <QStringList>
 #include <QTimer>
 #include <atomic>
 #include <cstdio>
 #include <ctime>
+#include <mutex>
 
 #include "global.h"
 #include "zv_type.h"
@@ -36,6 +38,9 @@ extern int video_enable;
 extern int g_finish_preview;
 extern int g_width;
 extern int g_height;
+/// Held around each change of split, standard or resolution together with the SDK call that sends it,
+/// and by the preview thread while it compares the choice with the card.
+extern std::mutex layout_mutex;
 
 // Channel sets, bit n = channel n + 1.
 extern unsigned int g_preview_ch;
@@ -69,6 +74,8 @@ extern int g_res;
 
 extern const char *const ntsc_fps_str[];
 extern const char *const pal_fps_str[];
+/// The labels of a standard's list, without its closing null.
+QStringList frame_rate_labels(ZV_VIDEO_STANDARD standard);
 
 /// A word that two threads share.
 template <typename T>

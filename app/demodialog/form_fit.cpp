@@ -1,0 +1,103 @@
+#include "form_fit.h"
+
+#include <QComboBox>
+#include <QGroupBox>
+#include <QLabel>
+#include <QLineEdit>
+#include <QPushButton>
+#include <QStyleOptionGroupBox>
+#include <algorithm>
+#include <cmath>
+
+namespace {
+
+// Room around a text, pixels: frame and padding, and a combo box's arrow.
+constexpr int kPadding = 4;
+constexpr int kArrow = 22;
+
+struct Factors {
+  double across = 1;
+  double down = 1;
+
+  void make_room(QSize needed, QSize given) {
+    across = std::max(across, static_cast<double>(needed.width()) / given.width());
+    down = std::max(down, static_cast<double>(needed.height()) / given.height());
+  }
+  QSize stretched(QSize size) const {
+    return {static_cast<int>(std::ceil(size.width() * across)),
+            static_cast<int>(std::ceil(size.height() * down))};
+  }
+  QRect stretched(QRect rect) const {
+    const auto edge = [](int at, double factor) { return static_cast<int>(std::lround(at * factor)); };
+    const QPoint corner(edge(rect.x(), across), edge(rect.y(), down));
+    return {corner,
+            QPoint(edge(rect.x() + rect.width(), across) - 1, edge(rect.y() + rect.height(), down) - 1)};
+  }
+};
+
+// What the form says is kept with the widget the first time, before anything is stretched.
+template <typename Value>
+Value from_form(QWidget *widget, const char *name, Value now) {
+  if (!widget->property(name).isValid()) widget->setProperty(name, now);
+  return widget->property(name).value<Value>();
+}
+
+QRect place_in_form(QWidget *child) {
+  return from_form(child, "form_place", child->geometry());
+}
+QSize size_in_form(QGroupBox *group) {
+  return from_form(group, "form_size", group->minimumSize());
+}
+
+QSize room_for_text(const QWidget *child) {
+  const QFontMetrics metrics = child->fontMetrics();
+  const auto padded = [&](int width) { return QSize(width + 2 * kPadding, metrics.height() + kPadding); };
+  if (const auto *combo = qobject_cast<const QComboBox *>(child)) {
+    int widest = 0;
+    for (int n = 0; n < combo->count(); ++n)
+      widest = std::max(widest, metrics.horizontalAdvance(combo->itemText(n)));
+    return padded(widest + kArrow);
+  }
+  if (const auto *button = qobject_cast<const QPushButton *>(child))
+    return padded(metrics.size(Qt::TextShowMnemonic, button->text()).width());
+  if (qobject_cast<const QLineEdit *>(child) != nullptr) return padded(metrics.horizontalAdvance("0000"));
+  if (qobject_cast<const QLabel *>(child) != nullptr ||
+      qobject_cast<const QAbstractButton *>(child) != nullptr)
+    return child->sizeHint();
+  return {};
+}
+
+int title_bottom(const QGroupBox *group) {
+  QStyleOptionGroupBox option;
+  option.initFrom(group);
+  option.text = group->title();
+  option.subControls = QStyle::SC_GroupBoxLabel;
+  const QStyle *style = group->style();
+  return style->subControlRect(QStyle::CC_GroupBox, &option, QStyle::SC_GroupBoxLabel, group).bottom();
+}
+
+QWidgetList children_of(const QGroupBox *group) {
+  return group->findChildren<QWidget *>(QString(), Qt::FindDirectChildrenOnly);
+}
+
+Factors factors_for(const QList<QGroupBox *> &groups) {
+  Factors factors;
+  for (const QGroupBox *group : groups)
+    for (QWidget *child : children_of(group)) {
+      const QRect place = place_in_form(child);
+      factors.make_room(room_for_text(child), place.size());
+      factors.make_room({0, title_bottom(group)}, {1, place.y()});
+    }
+  return factors;
+}
+
+}  // namespace
+
+void fit_form(QWidget &dialog) {
+  const auto groups = dialog.findChildren<QGroupBox *>(QString(), Qt::FindDirectChildrenOnly);
+  const Factors factors = factors_for(groups);
+  for (QGroupBox *group : groups) {
+    for (QWidget *child : children_of(group)) child->setGeometry(factors.stretched(place_in_form(child)));
+    group->setMinimumSize(factors.stretched(size_in_form(group)));
+  }
+}

@@ -1,0 +1,93 @@
+#include "sdl.h"
+
+#include <SDL.h>
+
+#include <algorithm>
+#include <cstddef>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+
+namespace {
+
+constexpr int kBitsPerPixel = 24;
+constexpr std::size_t kBytesPerPixel = 2;  // of a UYVY picture
+
+SDL_Surface *screen = nullptr;
+SDL_Overlay *overlay = nullptr;
+SDL_Rect video_rect;
+SDL_Event event;
+
+// Rows of the overlay may be padded; rows of a picture never are.
+void copy_into_overlay(const unsigned char *picture, std::size_t length) {
+  const std::size_t row = static_cast<std::size_t>(overlay->w) * kBytesPerPixel;
+  const std::size_t pitch = overlay->pitches[0];
+  Uint8 *plane = overlay->pixels[0];
+  length = std::min(length, row * static_cast<std::size_t>(overlay->h));
+  if (pitch == row) {
+    std::memcpy(plane, picture, length);
+    return;
+  }
+  for (; length > 0; plane += pitch) {
+    const std::size_t part = std::min(length, row);
+    std::memcpy(plane, picture, std::min(part, pitch));
+    picture += part;
+    length -= part;
+  }
+}
+
+}  // namespace
+
+int InitialSDL(int width, int height) {
+  // putenv() keeps the strings themselves.
+  static char direct[] = "SDL_VIDEO_YUV_DIRECT=1";
+  static char accelerated[] = "SDL_VIDEO_YUV_HWACCEL=1";
+  putenv(direct);
+  putenv(accelerated);
+  // Signals stay the program's own: without the parachute a crash is not hidden by SDL's handlers.
+  if (SDL_Init(SDL_INIT_VIDEO | SDL_INIT_NOPARACHUTE) != 0) {
+    std::printf("Initial SDL error: %s\n", SDL_GetError());
+    return -1;
+  }
+  screen = SDL_SetVideoMode(width, height, kBitsPerPixel, 0);
+  if (screen == nullptr) {
+    std::printf("Unable to set video mode: %s\n", SDL_GetError());
+    return -1;
+  }
+  SDL_WM_SetCaption("Preview", nullptr);
+  overlay = SDL_CreateYUVOverlay(width, height, SDL_UYVY_OVERLAY, screen);
+  if (overlay == nullptr) {
+    std::printf("Unable to create YUV overlay: %s\n", SDL_GetError());
+    return -1;
+  }
+  video_rect = {0, 0, static_cast<Uint16>(width), static_cast<Uint16>(height)};
+  return 0;
+}
+
+void UpDataYUVScreen(unsigned char *picture, int length) {
+  if (SDL_LockYUVOverlay(overlay) == 0) {
+    if (length > 0) copy_into_overlay(picture, static_cast<std::size_t>(length));
+    SDL_UnlockYUVOverlay(overlay);
+  }
+  SDL_DisplayYUVOverlay(overlay, &video_rect);
+  // Nobody asks for the events, yet the window manager wants them answered. A request to close the
+  // window waits in SDL's queue without effect.
+  SDL_PumpEvents();
+}
+
+void UpdateFrameRate(int fps) {
+  char caption[128] = {};
+  std::snprintf(caption, sizeof caption, "Preview FPS : %d", fps);
+  SDL_WM_SetCaption(caption, nullptr);
+}
+
+int CheckExitEvent() {
+  return SDL_PollEvent(&event) == 1 && event.type == SDL_QUIT ? 1 : 0;
+}
+
+void CloseSDL() {
+  if (overlay != nullptr) SDL_FreeYUVOverlay(overlay);
+  overlay = nullptr;
+  screen = nullptr;
+  SDL_Quit();
+}
