@@ -3,6 +3,7 @@
 #include <unistd.h>
 
 #include <cstdio>
+#include <mutex>
 
 #include "app_state.h"
 #include "demodialog.h"
@@ -12,8 +13,13 @@
 namespace {
 
 constexpr unsigned kAudioMask = (1u << ZV_AUDIO_CHANNELS) - 1u;
-constexpr const char *kPreviewChannelsError = "ERROR:zv_EnablePreviewChannels Error!";
 constexpr const char *kAudioChannelsError = "ERROR:zv_EnableAudioChannels Error!";
+
+/// Sends the preview set. The preview thread changes the same windows.
+void send_preview_channels() {
+  const std::lock_guard lock(layout_mutex);
+  sdk_ok(zv_EnablePreviewChannels(zv_handle, g_preview_ch), "ERROR:zv_EnablePreviewChannels Error!");
+}
 
 /// Makes the first `count` boxes editable and the others not.
 void enable_boxes(unsigned count) {
@@ -49,7 +55,7 @@ void DemoDialog::ChSettingChange() {
     case ENABLE_PREVIEW:
       g_preview_ch = mask;
       std::printf("ChSettingChange(): g_preview_ch = %4x\n", g_preview_ch);
-      sdk_ok(zv_EnablePreviewChannels(zv_handle, g_preview_ch), kPreviewChannelsError);
+      send_preview_channels();
       break;
     case ENABLE_AUDIO:
       g_audio_ch = mask & kAudioMask;
@@ -66,7 +72,7 @@ void DemoDialog::ChSettingChange() {
 
 void DemoDialog::EnablePreview() {
   g_channel_mode = INITIAL_CASE;
-  sdk_ok(zv_EnablePreviewChannels(zv_handle, g_preview_ch), kPreviewChannelsError);
+  send_preview_channels();
   SetCheckBox(g_preview_ch);
   enable_boxes(ZV_CHANNELS);
   g_channel_mode = ENABLE_PREVIEW;

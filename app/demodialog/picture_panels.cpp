@@ -2,6 +2,7 @@
 /// sensitivity, motion areas, motion detection. Numbers go to the SDK as typed; it alone refuses.
 #include <cstdio>
 #include <cstring>
+#include <mutex>
 
 #include "app_state.h"
 #include "demodialog.h"
@@ -98,6 +99,7 @@ void DemoDialog::GetFocus() {
 void DemoDialog::SetFocus() {
   const u32 channel = unsigned_in(edtFocus) - 1u;
   std::printf("Set Focus channel = %d\n", channel);
+  const std::lock_guard lock(layout_mutex);
   sdk_ok(zv_SetFocusChannel(zv_handle, channel), "ERROR:zv_SetFocusChannel Error!");
 }
 

@@ -89,10 +89,8 @@ void DemoDialog::StartRecord() {
     return;
   }
   WriteEnableCh();
-  g_res = zv_Start(zv_handle);
-  if (g_res != ZV_OK) {
+  if (!sdk_ok(zv_Start(zv_handle), "ERROR:zv_Start Error!")) {
     CloseFile();
-    std::puts("ERROR:zv_Start Error!");
     return;
   }
   timer.start(g_time_interval);
