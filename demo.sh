@@ -1,0 +1,223 @@
+#!/usr/bin/env bash
+# Shows the whole system on this machine. See usage() below.
+set -euo pipefail
+# shellcheck source=tools/common.sh
+. "$(dirname "${BASH_SOURCE[0]}")/tools/common.sh"
+# shellcheck source=tools/streams.sh
+. "$ZARVO_ROOT/tools/streams.sh"
+# shellcheck source=tools/operator.sh
+. "$ZARVO_ROOT/tools/operator.sh"
+
+usage() {
+  cat <<'TEXT'
+Usage: ./demo.sh                      with a display: open the program; without: record, then tour
+       ./demo.sh window               open the program
+       ./demo.sh record [OPTION...]   record without the program; the options are those of zarvo_record
+       ./demo.sh tour                 let a scripted operator use the program on an invisible display
+
+Uses the card of this machine if there is one (/dev/zarvo_enc0), otherwise the virtual card.
+Installs what is missing, builds, and leaves its results in build/demo.
+TEXT
+}
+
+BUILD=$ZARVO_ROOT/build/release
+RESULTS=$ZARVO_ROOT/build/demo
+SHOTS=$RESULTS/screenshots
+CARD=$BUILD/virtual_card/libzarvo_virtual_card.so
+PROGRAM=$BUILD/app/zarvo_demo
+WIDGET_MAP=$BUILD/tests/end_to_end/widget_map
+export XDG_RUNTIME_DIR=${XDG_RUNTIME_DIR:-/tmp}
+
+prepare() {
+  install_missing
+  say "Building (release) in $BUILD"
+  build release zarvo_record zarvo_motion zarvo_demo zarvo_virtual_card Videoplayer Audioplayer widget_map
+  use_card "$CARD"
+  mkdir -p "$RESULTS"
+  if [ -e /dev/zarvo_enc0 ]; then say "Using the card of this machine"; else say "No card here: using the virtual card"; fi
+}
+
+# The program expects the players beside its working directory and a root for its recordings.
+prepare_working_folder() {
+  mkdir -p "$RESULTS/Data"
+  cp "$BUILD/players/Videoplayer" "$BUILD/players/Audioplayer" "$RESULTS/"
+}
+
+run_window() {
+  prepare_working_folder
+  say "Opening the program in $RESULTS; its recordings go to $RESULTS/Data. Close the dialog to end."
+  cd "$RESULTS"
+  exec "${ON_CARD[@]}" "$PROGRAM"
+}
+
+run_record() {
+  local log=$RESULTS/record.log file frames files=() videos=()
+  say "Recording without the program: zarvo_record --seconds 5 $*"
+  rm -rf "$RESULTS/record"
+  "${ON_CARD[@]}" "$BUILD/examples/zarvo_record" --seconds 5 --output "$RESULTS/record" "$@" | tee "$log"
+  mapfile -t files < <(sed -nE 's/: [0-9]+ (frames|blocks), .*//p' "$log")
+  [ ${#files[@]} -gt 0 ] || return 0 # --help records nothing
+
+  say "What ffprobe and ffmpeg say of each file (codec, width, height, frames; audio: codec, rate, blocks)"
+  report_streams "${files[@]}" || FAILED=1
+  mapfile -t videos < <(sed -nE 's/: [0-9]+ frames, .*//p' "$log")
+  for file in "${videos[@]}"; do
+    frames=$(sed -nE "s|^$file: ([0-9]+) frames, .*|\\1|p" "$log")
+    [ "$(decoded_frames "$file")" = "$frames" ] || fail "$file: not all of its $frames frames decode"
+    [ $# -gt 0 ] || { [ "$frames" -ge 148 ] && [ "$frames" -le 152 ]; } || fail "$file: $frames frames instead of 150"
+    save_frame "$file" "$((frames / 2))" "$file.png" || fail "$file: no frame to save"
+  done
+  montage "${videos[@]/%/.png}" -geometry 352x240+2+2 "$RESULTS/record/frames.png"
+  echo "A frame of each channel: $RESULTS/record/frames.png"
+}
+
+# shot NAME [WINDOW]: a screenshot of the window (or the whole screen), and one frame of the tour.
+shot() {
+  picture "${2:-root}" "$SHOTS/$1.png"
+  import -silent -window root -resize 50% "$SHOTS/tour-$(printf '%02d' $((++TOUR))).png"
+}
+
+tour_preview() {
+  local split
+  say "Preview in all six splits"
+  click btnPreviewStart
+  wait_preview
+  for split in 1 4 6 8 9 16; do
+    click "btnSplit$split"
+    sleep 1.2 # for the eye: the card changes the layout with the next picture
+    shot "preview-split-$split" "$PREVIEW"
+  done
+  wait_until 10 rate_near 30 || fail "the preview runs at $(preview_rate) pictures a second, not 30"
+  echo "  caption: $(preview_caption)"
+}
+
+tour_panels() {
+  say "Hue of camera 6, a mask on camera 11, motion marks, focus on camera 5"
+  choose comboProperty 5
+  enter edtHue 90
+  click btnSetProperty
+  choose comboShield 10
+  enter edtLeft 160
+  enter edtTop 120
+  enter edtRight 560
+  enter edtBottom 360
+  click btnSetShield
+  sleep 1
+  shot preview-hue-and-mask "$PREVIEW"
+  click btnMotionStart
+  sleep 1.5
+  shot preview-motion "$PREVIEW"
+  click btnMotionStop
+  click btnSplit6
+  enter edtFocus 5
+  click btnSetFocus
+  sleep 1
+  shot preview-focus-5 "$PREVIEW"
+  click btnPreviewStop
+  wait_until 10 preview_gone || fail "the preview window did not close"
+}
+
+tour_pal() {
+  say "The same in PAL"
+  click radioPAL
+  click btnSplit16
+  click btnPreviewStart
+  wait_preview
+  wait_until 10 rate_near 25 || fail "the preview runs at $(preview_rate) pictures a second, not 25"
+  echo "  caption: $(preview_caption)"
+  shot preview-pal "$PREVIEW"
+  click btnPreviewStop
+  wait_until 10 preview_gone || fail "the preview window did not close"
+  click radioNTSC
+}
+
+tour_recording() {
+  local files=()
+  say "Recording 16 CIF channels and 2 audio inputs, with the preview on"
+  click btnPreviewStart
+  wait_preview
+  choose comboQualityMode 1
+  click radioEnAudio
+  click checkCh1
+  click checkCh2
+  click btnRecordStart
+  wait_line kbps 6 30
+  shot dialog-recording "$DIALOG"
+  click btnRecordStop
+  wait_until 10 files_closed || fail "the recordings stay open after Stop"
+  click btnPreviewStop
+  wait_until 10 preview_gone || fail "the preview window did not close"
+
+  say "The recorded files: header, contents (codec, width, height, frames) and ffmpeg's verdict"
+  mapfile -t files < <(find "$RESULTS/Data" -name '*.rec' -o -name '*.aud' | sort)
+  [ ${#files[@]} -eq 18 ] || fail "${#files[@]} files instead of 16 video and 2 audio files"
+  report_streams "${files[@]}" || FAILED=1
+}
+
+run_tour() {
+  say "A scripted operator uses the program on an invisible display"
+  rm -rf "$RESULTS/Data" "$SHOTS"
+  mkdir -p "$SHOTS"
+  prepare_working_folder
+  TOUR=0
+  open_display
+  start_program "$RESULTS"
+  shot dialog "$DIALOG"
+  tour_preview
+  tour_panels
+  tour_pal
+  tour_recording
+  close_program
+  [ "$STATUS" -eq 0 ] || fail "the program ended with status $STATUS"
+  close_display
+
+  say "Picture-in-picture and zoom, with the example zarvo_motion"
+  "${ON_CARD[@]}" "$BUILD/examples/zarvo_motion" "$RESULTS/zoom" || fail "zarvo_motion failed"
+  mogrify -format png "$RESULTS"/zoom/*.ppm
+  convert -delay 120 -loop 0 "$SHOTS"/tour-*.png -layers optimize -colors 64 "$SHOTS/tour.gif"
+  rm "$SHOTS"/tour-*.png
+}
+
+fail() {
+  printf 'FAILED: %s\n' "$*" >&2
+  FAILED=1
+}
+
+finish() {
+  say "Results are in $RESULTS"
+  [ -z "${1:-}" ] || printf '%s\n' "$@"
+  if [ "$FAILED" -ne 0 ]; then
+    echo "Something failed: see the lines with FAILED above." >&2
+    exit 1
+  fi
+  echo "Everything worked."
+}
+
+FAILED=0
+mode=${1:-all}
+[ $# -eq 0 ] || shift
+case $mode in
+  all | record | tour | window) ;;
+  -h | --help | help)
+    usage
+    exit 0
+    ;;
+  *)
+    usage >&2
+    die "'$mode' is not one of record, tour and window"
+    ;;
+esac
+if [ "$mode" = all ] && [ -n "${DISPLAY:-}${WAYLAND_DISPLAY:-}" ]; then mode=window; fi
+
+prepare
+case $mode in
+  window) run_window ;;
+  record) run_record "$@" ;;
+  tour) run_tour ;;
+  all)
+    run_record
+    run_tour
+    ;;
+esac
+finish "  recordings    record/ (zarvo_record), Data/ (the program)" \
+  "  screenshots   screenshots/, zoom/" "  program's log output.log"

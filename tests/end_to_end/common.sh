@@ -1,0 +1,59 @@
+# shellcheck shell=bash
+# The world of an end-to-end test: a folder of its own, the helpers of tools/, and checks that name
+# what they found. ctest gives the paths of the built programs. Sourced, never run.
+set -euo pipefail
+
+HERE=$(cd "$(dirname "${BASH_SOURCE[0]}")" && pwd)
+# shellcheck source=tools/common.sh
+. "$HERE/../../tools/common.sh"
+# shellcheck source=tools/streams.sh
+. "$ZARVO_ROOT/tools/streams.sh"
+# shellcheck source=tools/operator.sh
+. "$ZARVO_ROOT/tools/operator.sh"
+
+CARD=$ZARVO_CARD
+PROGRAM=${ZARVO_DEMO:-}
+WIDGET_MAP=${ZARVO_WIDGET_MAP:-}
+unset ZARVO_VIRTUAL_CARD
+export TZ=UTC XDG_RUNTIME_DIR=${XDG_RUNTIME_DIR:-/tmp}
+
+FOLDER=$(mktemp -d)
+clean_up() {
+  [ -z "$OPERATOR_FOLDER" ] || close_display
+  rm -rf "$FOLDER"
+}
+trap clean_up EXIT
+use_card "$CARD"
+
+# expect WHAT COMMAND...: the command must succeed.
+expect() {
+  local what=$1
+  shift
+  "$@" || die "$what"
+}
+
+# expect_equal WHAT EXPECTED ACTUAL
+expect_equal() { [ "$2" = "$3" ] || die "$1: expected '$2', got '$3'"; }
+
+# expect_decodes FILE...: every file is there and decodes without an error line.
+expect_decodes() { report_streams "$@" || die "not all recordings decode"; }
+
+# open_program: the demo application in $FOLDER/work, on an invisible display.
+open_program() {
+  mkdir -p "$FOLDER/work/Data"
+  open_display
+  trap clean_up EXIT
+  start_program "$FOLDER/work"
+}
+
+# end_program: closes the dialog; the program must end with status 0.
+end_program() {
+  close_program
+  expect_equal "exit status of the program" 0 "$STATUS"
+}
+
+# record_cif: chooses 16 CIF channels and starts the recording.
+record_cif() {
+  choose comboQualityMode 1
+  click btnRecordStart
+}

@@ -1,0 +1,20 @@
+#!/usr/bin/env bash
+# Ctrl-C and a polite kill end a recording early, with status 0 and complete files.
+. "$(dirname "$0")/common.sh"
+
+for signal in INT TERM; do
+  out=$FOLDER/$signal
+  # A background job of a script ignores SIGINT; env gives the program the default back.
+  "${ON_CARD[@]}" --default-signal=INT "$ZARVO_RECORD" --seconds 600 --channels 1-4 --output "$out" >"$FOLDER/log" 2>&1 &
+  recorder=$!
+  expect "no data came: $(cat "$FOLDER/log")" wait_until 30 test -s "$out/ch04.m4v" -a -s "$out/audio4.g726"
+  kill -s "$signal" "$recorder"
+  status=0
+  wait "$recorder" || status=$?
+  expect_equal "status after SIG$signal" 0 "$status"
+  expect_decodes "$out"/ch0{1,2,3,4}.m4v "$out"/audio{1,2,3,4}.g726
+  for file in "$out"/ch*.m4v; do
+    told=$(sed -nE "s|^$file: ([0-9]+) frames, .*|\\1|p" "$FOLDER/log")
+    expect_equal "frames in $file and in its line" "$told" "$(decoded_frames "$file")"
+  done
+done

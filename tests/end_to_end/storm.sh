@@ -1,0 +1,17 @@
+#!/usr/bin/env bash
+# Start and Stop of the preview 50 times as fast as xdotool can: a lost Stop or a second thread in SDL
+# would leave a window, hang the dialog or crash the program.
+. "$(dirname "$0")/common.sh"
+
+open_program
+for ((n = 0; n < 50; ++n)); do
+  click btnPreviewStart
+  click btnPreviewStop
+done
+expect "a preview window is left" wait_until 30 preview_gone
+click btnPreviewStart
+wait_preview
+click btnPreviewStop
+expect "the preview window does not close" wait_until 30 preview_gone
+end_program
+expect_equal "preview threads started and ended" "$(lines 'Exit video thread')" "$(lines 'Start video thread')"

@@ -1,0 +1,67 @@
+# shellcheck shell=bash
+# What demo.sh, test.sh and the end-to-end tests share. Sourced, never run.
+
+ZARVO_ROOT=$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)
+
+say() { printf '\n== %s\n' "$*"; }
+
+die() {
+  printf 'error: %s\n' "$*" >&2
+  exit 1
+}
+
+# install_missing: installs the packages of tools/packages.txt that are not there. Asks nothing.
+install_missing() {
+  local as_root=() missing=() package
+  command -v dpkg-query >/dev/null && command -v apt-get >/dev/null ||
+    die "this script installs its tools with apt-get (Debian 12); elsewhere install what tools/packages.txt names"
+  while read -r package; do
+    dpkg-query -W -f '${db:Status-Status}\n' "$package" 2>/dev/null | grep -qx installed || missing+=("$package")
+  done < <(grep -v '^#' "$ZARVO_ROOT/tools/packages.txt")
+  [ ${#missing[@]} -gt 0 ] || return 0
+  if [ "$(id -u)" -ne 0 ]; then
+    command -v sudo >/dev/null || die "these packages are missing and need root to install: ${missing[*]}"
+    as_root=(sudo)
+  fi
+  say "Installing ${#missing[@]} missing packages with apt-get: ${missing[*]}"
+  "${as_root[@]}" apt-get update -q
+  "${as_root[@]}" env DEBIAN_FRONTEND=noninteractive apt-get install -q -y --no-install-recommends "${missing[@]}"
+}
+
+# build PRESET [TARGET...] [-- CMAKE-OPTION...]: configures and builds build/PRESET, with ccache if it is there.
+build() {
+  local preset=$1 targets=() options=()
+  shift
+  while [ $# -gt 0 ] && [ "$1" != -- ]; do
+    targets+=("$1")
+    shift
+  done
+  [ $# -eq 0 ] || options=("${@:2}")
+  if command -v ccache >/dev/null; then
+    options+=(-DCMAKE_C_COMPILER_LAUNCHER=ccache -DCMAKE_CXX_COMPILER_LAUNCHER=ccache)
+  fi
+  (cd "$ZARVO_ROOT" && cmake --preset "$preset" "${options[@]}" >/dev/null &&
+    cmake --build --preset "$preset" -j "$(nproc)" ${targets[0]:+--target "${targets[@]}"})
+}
+
+# use_card CARD-LIBRARY: fills the array ON_CARD with the command that puts a program on the card of this
+# machine, or else on the virtual card: "${ON_CARD[@]}" PROGRAM .... A program built with a sanitizer needs
+# the sanitizer's runtime in front of the card. ZARVO_PRELOAD names one more library, to stand behind it.
+use_card() {
+  local runtime
+  ON_CARD=(env)
+  [ ! -e /dev/zarvo_enc0 ] || return 0
+  [ -f "$1" ] || die "the virtual card $1 is not built"
+  runtime=$(ldd "$1" | awk '/lib(asan|tsan)\.so/ { print $3; exit }')
+  ON_CARD+=("LD_PRELOAD=${runtime:+$runtime:}$1${ZARVO_PRELOAD:+:$ZARVO_PRELOAD}")
+}
+
+# wait_until SECONDS COMMAND...: waits for a condition, false when it has not come true in that time.
+wait_until() {
+  local latest=$((SECONDS + $1))
+  shift
+  until "$@" >/dev/null 2>&1; do
+    [ "$SECONDS" -lt "$latest" ] || return 1
+    sleep 0.05
+  done
+}

@@ -1,0 +1,122 @@
+# shellcheck shell=bash
+# An operator made of xdotool: opens the demo application on a display of its own, clicks widgets by
+# their object names, waits for lines and windows, and takes screenshots. Sourced, never run; needs
+# common.sh. The caller sets PROGRAM, CARD and WIDGET_MAP to the built files.
+
+OPERATOR_FOLDER=   # display number, log, widget positions; removed at the end
+DIALOG=            # X window of the dialog
+declare -A WIDGET  # object name to "x y" in the dialog
+
+# open_display: an X server without a screen, and a window manager on it.
+open_display() {
+  OPERATOR_FOLDER=$(mktemp -d)
+  trap close_display EXIT
+  Xvfb -displayfd 3 -screen 0 1680x1050x24 -nolisten tcp 3>"$OPERATOR_FOLDER/display" >"$OPERATOR_FOLDER/xvfb.log" 2>&1 &
+  XVFB=$!
+  wait_until 20 test -s "$OPERATOR_FOLDER/display" || die "Xvfb did not start: $(cat "$OPERATOR_FOLDER/xvfb.log")"
+  DISPLAY=:$(cat "$OPERATOR_FOLDER/display")
+  export DISPLAY QT_QPA_PLATFORM=xcb SDL_VIDEODRIVER=x11
+  openbox >"$OPERATOR_FOLDER/openbox.log" 2>&1 &
+  OPENBOX=$!
+  wait_until 20 xprop -root _NET_SUPPORTING_WM_CHECK || die "openbox did not start"
+}
+
+close_display() {
+  trap - EXIT
+  local process
+  for process in "${DEMO:-}" "${OPENBOX:-}" "${XVFB:-}"; do
+    [ -z "$process" ] || kill "$process" 2>/dev/null || true
+  done
+  wait 2>/dev/null || true
+  rm -rf "$OPERATOR_FOLDER"
+}
+
+# start_program FOLDER: the demo application in that working directory; its lines go to FOLDER/output.log.
+start_program() {
+  LOG=$1/output.log
+  use_card "$CARD"
+  read_widget_map
+  (cd "$1" && exec "${ON_CARD[@]}" "$PROGRAM") >"$LOG" 2>&1 &
+  DEMO=$!
+  wait_until 30 dialog_shown || die "the dialog did not appear: $(cat "$LOG")"
+  xdotool windowmove "$DIALOG" 20 40
+  focus_dialog
+}
+
+dialog_shown() { DIALOG=$(xdotool search --onlyvisible --name '^Tarn Demo$' | head -n 1) && [ -n "$DIALOG" ]; }
+
+# The positions depend on fonts and style, so the same dialog tells them, on the same display.
+read_widget_map() {
+  local name x y
+  while read -r name x y; do WIDGET[$name]="$x $y"; done < <("${ON_CARD[@]}" "$WIDGET_MAP" 2>/dev/null | sed -n 's/^widget //p')
+  [ ${#WIDGET[@]} -gt 0 ] || die "$WIDGET_MAP told no widget positions"
+}
+
+focus_dialog() { xdotool windowactivate --sync "$DIALOG"; }
+
+# click WIDGET
+click() {
+  [ -n "${WIDGET[$1]:-}" ] || die "the dialog has no widget $1"
+  # shellcheck disable=SC2086 # two numbers
+  xdotool windowactivate --sync "$DIALOG" mousemove --sync --window "$DIALOG" ${WIDGET[$1]} click 1
+}
+
+# choose COMBO INDEX: opens the list and picks the item, as a hand with arrow keys does.
+choose() {
+  local keys=(Home) n
+  for ((n = 0; n < $2; ++n)); do keys+=(Down); done
+  click "$1"
+  wait_until 5 popup_shown || die "the list of $1 did not open"
+  xdotool key --delay 30 "${keys[@]}" Return
+  wait_until 5 popup_gone || die "the list of $1 did not close"
+}
+
+# A popup is a second visible window of the dialog's process.
+popup_shown() { [ "$(qt_windows)" -ge 2 ]; }
+popup_gone() { [ "$(qt_windows)" -le 1 ]; }
+qt_windows() { xdotool search --onlyvisible --class zarvo_demo 2>/dev/null | wc -l; }
+
+# enter EDIT TEXT: replaces the text of a line edit.
+enter() {
+  click "$1"
+  xdotool key ctrl+a type --delay 5 -- "$2"
+}
+
+# wait_line PATTERN [COUNT [SECONDS]]: until the program has printed that many lines with the pattern.
+wait_line() { wait_until "${3:-20}" has_lines "$1" "${2:-1}" || die "the program did not print '$1': $(tail -n 5 "$LOG")"; }
+has_lines() { [ "$(grep -c -- "$1" "$LOG")" -ge "$2" ]; }
+lines() { grep -c -- "$1" "$LOG"; }
+
+# wait_preview: until the preview window is there and its caption tells a rate; PREVIEW is the window.
+wait_preview() {
+  wait_until 20 preview_shown || die "no preview window appeared: $(tail -n 5 "$LOG")"
+  xdotool windowmove "$PREVIEW" 920 40 2>/dev/null
+  wait_until 20 preview_runs || die "the preview shows no pictures"
+}
+preview_shown() { PREVIEW=$(xdotool search --onlyvisible --name '^Preview' | head -n 1) && [ -n "$PREVIEW" ]; }
+preview_gone() { ! preview_shown; }
+preview_runs() { [[ $(preview_caption) =~ ^Preview\ FPS\ :\ [1-9] ]]; }
+preview_caption() { xdotool getwindowname "$PREVIEW"; }
+
+# preview_rate: the pictures of the last second, as the caption tells.
+preview_rate() { preview_caption | sed 's/.*: //'; }
+
+# picture WINDOW FILE: a screenshot of a window, or of the whole screen for "root".
+picture() { import -silent -window "$1" "$2" && printf '  saved %s\n' "$2"; }
+
+# close_program: the operator closes the dialog; STATUS is what the program ended with.
+close_program() {
+  focus_dialog
+  xdotool key alt+F4
+  wait_until 30 process_gone "$DEMO" || die "the program did not end after its dialog was closed"
+  STATUS=0
+  wait "$DEMO" || STATUS=$?
+  DEMO=
+}
+process_gone() { ! kill -0 "$1"; }
+
+# rate_near RATE: whether the caption tells that rate, give or take 2. The first second of a layout may be short.
+rate_near() { local rate; rate=$(preview_rate) && [ "$rate" -ge $(($1 - 2)) ] && [ "$rate" -le $(($1 + 2)) ]; }
+
+# files_closed: whether the program has closed all its recordings.
+files_closed() { ! find "/proc/$DEMO/fd" -lname '*.rec' | grep -q .; }
