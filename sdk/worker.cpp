@@ -1,0 +1,34 @@
+#include "worker.h"
+
+namespace zarvo {
+
+namespace {
+
+// Exit values of threads, which pthread_join() hands out as plain pointers.
+char cancel_state_failed[] = "ERROR:pthread_setcancelstate failed.\n";
+char cancel_type_failed[] = "ERROR:pthread_setcanceltype failed.\n";
+
+}  // namespace
+
+bool Worker::start(Routine routine, void *argument) {
+  void *result = nullptr;
+  if (!join(result)) return false;
+  joinable_ = pthread_create(&id_, nullptr, routine, argument) == 0;
+  return joinable_;
+}
+
+bool Worker::join(void *&result) {
+  if (!joinable_) return true;
+  if (pthread_join(id_, &result) != 0) return false;
+  joinable_ = false;
+  return true;
+}
+
+void *make_cancellable() {
+  int old = 0;
+  if (pthread_setcancelstate(PTHREAD_CANCEL_ENABLE, &old) != 0) return cancel_state_failed;
+  if (pthread_setcanceltype(PTHREAD_CANCEL_DEFERRED, &old) != 0) return cancel_type_failed;
+  return nullptr;
+}
+
+}  // namespace zarvo

@@ -1,0 +1,57 @@
+/**
+ * @file audio.cpp
+ * The audio data thread.
+ */
+#include <unistd.h>
+
+#include "internal.h"
+#include "zv_card.h"
+#include "zv_lib.h"
+
+namespace zarvo {
+
+namespace {
+
+bool audio_enabled() {
+  pthread_mutex_lock(&mutex_zv_audio_enable);
+  const bool enabled = zv_audio_thread_enable != 0;
+  pthread_mutex_unlock(&mutex_zv_audio_enable);
+  return enabled;
+}
+
+void deliver_blocks(const ZV_CARD &card) {
+  for (u32 n = 0; n < ZV_AUDIO_CHANNELS; ++n) {
+    const ZV_STREAM_CALLBACK callback = card.audio_callback;
+    if ((card.audio_mask >> n & 1) != 0 && callback != nullptr)
+      callback(n, audio_buf + driver::kAudioBlockSize * n, driver::kAudioBlockSize, 0);
+  }
+}
+
+int audio_stream(ZV_CARD &, u32 channel) {
+  return channel < ZV_AUDIO_CHANNELS ? ZV_OK : ZV_ERR_CHANNEL;
+}
+
+}  // namespace
+
+void *get_audio_data_thread(void *argument) {
+  constexpr useconds_t kPassPause = 100;
+  if (void *failure = make_cancellable()) return failure;
+  const ZV_CARD &card = *static_cast<ZV_CARD *>(argument);
+  while (audio_enabled()) {
+    if (card.audio_mask != 0) {
+      // The count is in blocks: the driver fills one block an input.
+      if (read(card.g723_fd, audio_buf, driver::kAudioReadCount) <= 0) continue;
+      deliver_blocks(card);
+    }
+    usleep(kPassPause);
+  }
+  return nullptr;
+}
+
+}  // namespace zarvo
+
+using namespace zarvo;
+
+int zv_GetAudioStream(HANDLE handle, u32 channel) {
+  return status_from(handle, audio_stream, channel);
+}

@@ -1,0 +1,189 @@
+/**
+ * @file encode_config.cpp
+ * Encoder settings of the channels: store, check against the frame-rate budget, enable.
+ */
+#include <cstdio>
+
+#include "command.h"
+#include "internal.h"
+#include "interval.h"
+#include "zv_card.h"
+#include "zv_lib.h"
+
+namespace zarvo {
+
+void store_config(ZV_VIDEO_CONFIG &stored, const ZV_VIDEO_CONFIG &record) {
+  stored.mjpeg = record.mjpeg;
+  scale_of(stored).store(record.scale, std::memory_order_relaxed);
+  stored.gop = record.gop;
+  stored.qp = record.qp;
+  stored.interval = record.interval;
+  stored.twofield = record.twofield;
+  stored.jpeg_qp = record.jpeg_qp;
+  stored.enable = record.enable;
+  stored.CBRValue = record.CBRValue;
+  stored.CBREnable = record.CBREnable;
+  stored.QPMinMaxEnable = record.QPMinMaxEnable;
+  stored.QPMax = record.QPMax;
+  stored.QPMin = record.QPMin;
+}
+
+namespace {
+
+int set_encode_config(ZV_CARD &card, u32 channel, const ZV_VIDEO_CONFIG *record) {
+  if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;
+  if (record == nullptr) return ZV_ERR_PARAM;
+  ZV_VIDEO_CONFIG &config = card.config[channel];
+  store_config(config, *record);
+  if (config.enable != 0 && config.scale == SCALE_ZV_NO_ENCODE) {
+    std::printf("Error: zv_SetVideoEncodeConfig--invalid scale value.\n");
+    return ZV_ERR_CONFIG;
+  }
+  const bool two_field_slow = config.twofield == TWOFIELD_ENABLE && config.interval != 0;
+  return two_field_slow ? ZV_ERR_CONFIG : ZV_OK;
+}
+
+int get_encode_config(ZV_CARD &card, u32 channel, ZV_VIDEO_CONFIG *record) {
+  if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;
+  if (record == nullptr) return ZV_ERR_PARAM;
+  *record = card.config[channel];
+  return ZV_OK;
+}
+
+/// How the budget sees one channel's configuration.
+struct Load {
+  u32 skip;
+  bool drop;
+  bool d1;
+  bool both_fields;  ///< two fields of every frame
+};
+
+Load load_of(const ZV_VIDEO_CONFIG &config) {
+  const u32 value = static_cast<u32>(config.interval);
+  const FrameInterval interval = frame_interval(value);
+  const bool d1 = config.scale == SCALE_ZV_D1 && value < kIntervalCount;
+  const bool two_field = config.twofield != TWOFIELD_DISABLE;
+  const u32 skip = interval.skip + (d1 || (two_field && value == 0) ? 0 : 1);
+  return {skip, interval.drop, d1, two_field && skip == 0};
+}
+
+/// Frames a second, in whole frames as the card's budget counts them.
+u32 counted_rate(const Load &load, u32 base) {
+  if (load.both_fields) return load.drop ? 0 : base;
+  const u32 group = load.skip + (load.d1 ? 1 : 0);
+  return load.drop ? (group - 1) * base / group : base / group;
+}
+
+/// Size of a channel's pictures in CIF pictures.
+u32 weight_of(const ZV_VIDEO_CONFIG &config, const Load &load, u32 channel) {
+  switch (config.scale) {
+    case SCALE_ZV_NO_ENCODE:
+      return 0;
+    case SCALE_ZV_HALF_D1:
+      return load.both_fields ? 4 : 2;
+    case SCALE_ZV_CIF:
+      return load.both_fields ? 2 : 1;
+    case SCALE_ZV_D1:
+      return 4;
+    default:
+      std::printf("Error: invalid scale value, channel = %d, scale = %d.\n", static_cast<int>(channel),
+                  static_cast<int>(config.scale));
+      return 0;
+  }
+}
+
+}  // namespace
+
+int check_encode_config(ZV_CARD &card) {
+  const u32 base = card.standard == VIDEO_STANDARD_ZV_NTSC ? 30 : 25;
+  // Sixteen CIF channels at the full rate.
+  const float budget = static_cast<float>(ZV_CHANNELS * base);
+  float total = 0;
+  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) {
+    const ZV_VIDEO_CONFIG &config = card.config[channel];
+    const Load load = load_of(config);
+    const u32 rate = config.scale == SCALE_ZV_NO_ENCODE ? 0 : counted_rate(load, base);
+    if (config.twofield == TWOFIELD_ENABLE && (load.skip != 0 || load.d1)) return ZV_ERR_CONFIG;
+    total += static_cast<float>(weight_of(config, load, channel) * rate);
+    if (total > budget) {
+      std::printf("Error: zv_CheckVideoEncodeConfig--Exceed maximum total frame rate!!\n");
+      return ZV_ERR_CONFIG;
+    }
+  }
+  return ZV_OK;
+}
+
+namespace {
+
+/// Marks the channels of `mask` enabled and wipes the others, up to the first that cannot be.
+int mark_channels(ZV_CARD &card, u32 mask) {
+  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) {
+    ZV_VIDEO_CONFIG &config = card.config[channel];
+    if ((mask >> channel & 1) == 0) {
+      store_config(config, ZV_VIDEO_CONFIG{});
+      continue;
+    }
+    config.enable = 1;
+    if (config.scale == SCALE_ZV_NO_ENCODE) {
+      std::printf(
+          "ZarvoSDK: Error: zv_EnableVideoRecordChannels--invalid scale value of Channel%d. Please confirm  "
+          "video config first.\n",
+          static_cast<int>(channel));
+      return ZV_ERR_CONFIG;
+    }
+  }
+  return ZV_OK;
+}
+
+/// The card has one quality register: every Motion-JPEG channel writes it, the last one's word stays.
+void send_jpeg_quality(const ZV_CARD &card) {
+  constexpr u32 kQualityWords[] = {0x02020202, 0x02000102, 0x02000102};  // by ZV_JPEG_QUALITY
+  u32 word = kQualityWords[JPEG_QP_ZV_MEDIUM];
+  for (const ZV_VIDEO_CONFIG &config : card.config) {
+    if (config.mjpeg == VIDEO_CODEC_ZV_MPEG4) continue;
+    const u32 quality = static_cast<u32>(config.jpeg_qp);
+    if (quality <= JPEG_QP_ZV_HIGH) word = kQualityWords[quality];
+    issue(card.enc_fd, driver::ENC_IOC_WRITE_REG, driver::Register{driver::kRegMjpegQuality, word});
+  }
+}
+
+}  // namespace
+
+int enable_record_channels(ZV_CARD &card, u32 mask) {
+  if (mask >> ZV_CHANNELS != 0) return ZV_ERR_CHANNEL;
+  card.record_mask = mask;
+  if (mark_channels(card, mask) != ZV_OK || check_encode_config(card) != ZV_OK) return ZV_ERR_CONFIG;
+  send_jpeg_quality(card);
+  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) set_video_config(card, channel);
+  return ZV_OK;
+}
+
+int enable_audio_channels(ZV_CARD &card, u32 mask) {
+  if (mask >> ZV_AUDIO_CHANNELS != 0) return ZV_ERR_CHANNEL;
+  card.audio_mask = mask;
+  return ZV_OK;
+}
+
+}  // namespace zarvo
+
+using namespace zarvo;
+
+int zv_GetVideoEncodeConfig(HANDLE handle, u32 channel, ZV_VIDEO_CONFIG *config) {
+  return status_from(handle, get_encode_config, channel, config);
+}
+
+int zv_SetVideoEncodeConfig(HANDLE handle, u32 channel, const ZV_VIDEO_CONFIG *config) {
+  return status_from(handle, set_encode_config, channel, config);
+}
+
+int zv_CheckVideoEncodeConfig(HANDLE handle) {
+  return status_from(handle, check_encode_config);
+}
+
+int zv_EnableVideoRecordChannels(HANDLE handle, u32 mask) {
+  return status_from(handle, enable_record_channels, mask);
+}
+
+int zv_EnableAudioChannels(HANDLE handle, u32 mask) {
+  return status_from(handle, enable_audio_channels, mask);
+}

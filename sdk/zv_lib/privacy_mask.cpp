@@ -1,0 +1,47 @@
+/**
+ * @file privacy_mask.cpp
+ * The privacy mask of a channel.
+ */
+#include "command.h"
+#include "internal.h"
+#include "zv_card.h"
+#include "zv_lib.h"
+
+namespace zarvo {
+
+namespace {
+
+int set_shield(ZV_CARD &card, u32 channel, const ZV_RECT *rect) {
+  if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;
+  if (rect == nullptr || !fits_input(card, *rect)) return ZV_ERR_PARAM;
+  card.shield[channel] = *rect;
+  issue(card.vin_fd, driver::VIN_IOC_SET_MASK,
+        driver::Mask{channel, rect->x_start, rect->x_end, rect->y_start, rect->y_end});
+  return ZV_OK;
+}
+
+int get_shield(ZV_CARD &card, u32 channel, ZV_RECT *rect) {
+  if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;
+  if (rect == nullptr) return ZV_ERR_PARAM;
+  const u32 packed = read_video_input(card, driver::kRegPrivacyMask + 4 * channel);
+  const auto edge = [packed](u32 shift) { return (packed >> shift & 0xFF) * 8; };
+  rect->x_start = edge(24);
+  rect->x_end = edge(16);
+  rect->y_start = edge(8);
+  rect->y_end = edge(0);
+  return ZV_OK;
+}
+
+}  // namespace
+
+}  // namespace zarvo
+
+using namespace zarvo;
+
+int zv_SetShieldRect(HANDLE handle, u32 channel, const ZV_RECT *rect) {
+  return status_from(handle, set_shield, channel, rect);
+}
+
+int zv_GetShieldRect(HANDLE handle, u32 channel, ZV_RECT *rect) {
+  return status_from(handle, get_shield, channel, rect);
+}

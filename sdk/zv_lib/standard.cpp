@@ -1,0 +1,115 @@
+/**
+ * @file standard.cpp
+ * Video standard, input width, and the preview picture.
+ */
+#include <unistd.h>
+
+#include <cstring>
+
+#include "command.h"
+#include "internal.h"
+#include "zv_bits.h"
+#include "zv_card.h"
+#include "zv_lib.h"
+
+namespace zarvo {
+
+PictureSize input_picture(const ZV_CARD &card) {
+  return {card.resolution == RESOLUTION_ZV_720 ? 720u : 704u,
+          card.standard == VIDEO_STANDARD_ZV_NTSC ? 480u : 576u};
+}
+
+bool fits_input(const ZV_CARD &card, const ZV_RECT &rect) {
+  const PictureSize picture = input_picture(card);
+  return rect.x_start <= rect.x_end && rect.x_end <= picture.width && rect.y_start <= rect.y_end &&
+         rect.y_end <= picture.height;
+}
+
+int set_video_standard(ZV_CARD &card, u32 standard) {
+  if (standard > VIDEO_STANDARD_ZV_PAL) return ZV_ERR_STANDARD;
+  card.standard = standard;
+  const u32 running = get_bit(read_codec(card, driver::kRegDisplayState), driver::kDisplayStateBit);
+  u32 word = standard;
+  issue(card.vin_fd, driver::VIN_IOC_SET_STANDARD, word);
+  issue(card.enc_fd, driver::ENC_IOC_SET_STANDARD, word);
+  issue(card.disp_fd, driver::DISP_IOC_SET_STANDARD, word);
+  if (running != 0) open_display(card, card.display.mode);
+  const u32 state = read_codec(card, driver::kRegDisplayState);
+  write_codec(card, driver::kRegDisplayState, restore_bit(state, driver::kDisplayStateBit, running));
+  return ZV_OK;
+}
+
+namespace {
+
+int set_resolution(ZV_CARD &card, u32 resolution) {
+  if (resolution > RESOLUTION_ZV_704) return ZV_ERR_RESOLUTION;
+  card.resolution = resolution;
+  issue(card.vin_fd, driver::VIN_IOC_SET_WIDTH, u32{input_picture(card).width});
+  set_video_standard(card, card.standard);
+  set_preview_mode(card, card.display.mode);
+  return ZV_OK;
+}
+
+u32 resolution_of(ZV_CARD &card) {
+  return card.resolution;
+}
+
+u32 standard_of(ZV_CARD &card) {
+  return card.standard;
+}
+
+int enable_preview_channels(ZV_CARD &card, u32 mask) {
+  if (mask >> ZV_CHANNELS != 0) return ZV_ERR_CHANNEL;
+  issue(card.disp_fd, mask != 0 ? driver::DISP_IOC_PREVIEW_ON : driver::DISP_IOC_PREVIEW_OFF);
+  for (u32 n = 0; n < ZV_CHANNELS; ++n) {
+    ZV_DISPLAY_WINDOW &window = card.display.window[n];
+    window.flags = (mask >> n & 1) != 0 ? ZV_WINDOW_ENABLED : 0;
+    issue(card.disp_fd, driver::DISP_IOC_SET_WINDOW, window);
+  }
+  return ZV_OK;
+}
+
+int preview_screen(ZV_CARD &card, u8 **picture) {
+  if (picture == nullptr) return -1;
+  // The driver answers with one word, but it is asked for a whole picture: the scratch buffer has
+  // room for one, so that nobody's memory suffers from a generous driver.
+  u32 index = driver::kPreviewBuffers;
+  pthread_mutex_lock(&mutex_preview);
+  std::memcpy(preview_scratch, &index, sizeof index);
+  const ssize_t result = read(card.disp_fd, preview_scratch, driver::kPreviewBufferSize);
+  std::memcpy(&index, preview_scratch, sizeof index);
+  pthread_mutex_unlock(&mutex_preview);
+  const bool whole = result > 0 && static_cast<std::size_t>(result) <= driver::kPreviewBufferSize;
+  if (whole && index < driver::kPreviewBuffers) *picture = preview_buf[index];
+  return static_cast<int>(result);
+}
+
+}  // namespace
+
+}  // namespace zarvo
+
+using namespace zarvo;
+
+u32 zv_GetResolution(HANDLE handle) {
+  return value_from(handle, 0, resolution_of);
+}
+
+int zv_SetResolution(HANDLE handle, u32 resolution) {
+  return status_from(handle, set_resolution, resolution);
+}
+
+u32 zv_GetVideoStandard(HANDLE handle) {
+  return value_from(handle, 0, standard_of);
+}
+
+int zv_SetVideoStandard(HANDLE handle, u32 standard) {
+  return status_from(handle, set_video_standard, standard);
+}
+
+int zv_EnablePreviewChannels(HANDLE handle, u32 mask) {
+  return status_from(handle, enable_preview_channels, mask);
+}
+
+int zv_GetPreviewScreen(HANDLE handle, u8 **picture) {
+  return value_from(handle, -1, preview_screen, picture);
+}

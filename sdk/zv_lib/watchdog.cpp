@@ -1,0 +1,130 @@
+/**
+ * @file watchdog.cpp
+ * The hardware watchdog and the thread that feeds it.
+ */
+#include <time.h>
+#include <unistd.h>
+
+#include <cstdint>
+#include <cstdio>
+
+#include "command.h"
+#include "internal.h"
+#include "zv_bits.h"
+#include "zv_card.h"
+#include "zv_lib.h"
+
+namespace zarvo {
+
+Shared<int> zv_watchdog_thread_enable;
+Worker zv_watchdog_thread;
+void *zv_watchdog_thread_result;
+
+namespace {
+
+constexpr std::int64_t kKickPeriod = 30000;  ///< milliseconds
+constexpr useconds_t kLookPause = 5000;      ///< microseconds between looks at the flag and the clock
+constexpr int kAttempts = 10;
+
+/// Writes the run flag under its mutex and returns what it was.
+int set_watchdog_flag(int value) {
+  pthread_mutex_lock(&mutex_watchdog);
+  const int before = zv_watchdog_thread_enable.exchange(value);
+  pthread_mutex_unlock(&mutex_watchdog);
+  return before;
+}
+
+bool watchdog_enabled() {
+  pthread_mutex_lock(&mutex_watchdog);
+  const bool enabled = zv_watchdog_thread_enable != 0;
+  pthread_mutex_unlock(&mutex_watchdog);
+  return enabled;
+}
+
+/// Repeats a board command until the controller gives the expected reply. `reply` is the last one.
+bool handshake(const ZV_CARD &card, u32 command, u32 expected, u32 &reply) {
+  for (int attempt = 0; attempt < kAttempts; ++attempt) {
+    reply = board_command(card, command, 0);
+    if (reply == expected) return true;
+  }
+  return false;
+}
+
+bool kick(const ZV_CARD &card, u32 &reply) {
+  return handshake(card, driver::kBoardWatchdogOn, driver::kBoardWatchdogOnReply, reply);
+}
+
+std::int64_t now_ms() {
+  timespec now{};
+  clock_gettime(CLOCK_MONOTONIC, &now);
+  return std::int64_t{now.tv_sec} * 1000 + now.tv_nsec / 1000000;
+}
+
+/// Feeds the watchdog until the run flag is cleared or the controller fails to answer.
+void feed(const ZV_CARD &card) {
+  std::int64_t next_kick = now_ms() + kKickPeriod;
+  while (watchdog_enabled()) {
+    if (now_ms() < next_kick) {
+      usleep(kLookPause);
+      continue;
+    }
+    next_kick = now_ms() + kKickPeriod;
+    write_codec(card, driver::kRegWatchdogPeriod, driver::kWatchdogPeriod);
+    u32 reply = 0;
+    if (!kick(card, reply)) {
+      std::printf("ERROR: Zarvo WatchDog reset failed. code = 0x%x.\n", reply);
+      return;
+    }
+  }
+}
+
+}  // namespace
+
+void *watchdog_thread(void *argument) {
+  const ZV_CARD &card = *static_cast<ZV_CARD *>(argument);
+  write_codec(card, driver::kRegWatchdogPeriod, driver::kWatchdogPeriod);
+  zv_delay(500);
+  u32 reply = 0;
+  if (kick(card, reply)) {
+    if (void *failure = make_cancellable()) return failure;
+    feed(card);
+  } else {
+    std::printf("ERROR: Zarvo WatchDog init failed. code = 0x%x\n", reply);
+  }
+  set_watchdog_flag(0);
+  board_command(card, driver::kBoardWatchdogOff, 0);
+  write_codec(card, driver::kRegWatchdogPeriod, 0);
+  return nullptr;
+}
+
+namespace {
+
+int enable_watchdog(ZV_CARD &card) {
+  if (set_watchdog_flag(1) != 0) return ZV_OK;
+  if (zv_watchdog_thread.start(watchdog_thread, &card)) return ZV_OK;
+  set_watchdog_flag(0);
+  return ZV_ERR_THREAD_CREATE;
+}
+
+int disable_watchdog(ZV_CARD &card) {
+  if (set_watchdog_flag(0) == 0) return ZV_OK;
+  if (!zv_watchdog_thread.join(zv_watchdog_thread_result)) return ZV_ERR_THREAD_JOIN;
+  write_codec(card, driver::kRegWatchdogPeriod, 0);
+  u32 reply = 0;
+  return handshake(card, driver::kBoardWatchdogOff, driver::kBoardWatchdogOffReply, reply) ? ZV_OK
+                                                                                           : ZV_ERR_DEVICE;
+}
+
+}  // namespace
+
+}  // namespace zarvo
+
+using namespace zarvo;
+
+int zv_EnableWatchDog(HANDLE handle) {
+  return status_from(handle, enable_watchdog);
+}
+
+int zv_DisableWatchDog(HANDLE handle) {
+  return status_from(handle, disable_watchdog);
+}

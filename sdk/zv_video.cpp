@@ -1,0 +1,94 @@
+/**
+ * @file zv_video.cpp
+ * One channel's encoder settings, from the stored record to the encoder device and back.
+ */
+#include "zv_video.h"
+
+#include <unistd.h>
+
+#include "command.h"
+#include "internal.h"
+#include "interval.h"
+#include "zv_card.h"
+
+namespace zarvo {
+
+namespace {
+
+/// The bounds the encoder can hold its quantiser between.
+bool usable_qp_range(const ZV_VIDEO_CONFIG &config) {
+  constexpr u32 kHighestQp = 29;
+  return config.QPMinMaxEnable != 0 && config.QPMax > config.QPMin && config.QPMin != 0 &&
+         config.QPMax <= kHighestQp;
+}
+
+/// The interval record of a channel. The encoder counts fields: a one-field picture that keeps
+/// frames skips one field more.
+driver::Interval encoder_interval(const ZV_VIDEO_CONFIG &config, u32 channel) {
+  auto [skip, drop] = frame_interval(static_cast<u32>(config.interval));
+  if (!drop && config.twofield == TWOFIELD_DISABLE && config.scale != SCALE_ZV_D1) ++skip;
+  const u32 flag = drop ? 1 : 0;
+  return {channel, skip | flag << driver::kIntervalDropShift, flag};
+}
+
+int get_video_config(ZV_CARD &card, u32 channel) {
+  if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;
+  driver::Interval interval{channel, 0, 0};
+  driver::ChannelValue qp{channel, 0};
+  driver::ChannelValue gop{channel, 0};
+  driver::ChannelValue scale{channel, 0};
+  issue(card.enc_fd, driver::ENC_IOC_GET_INTERVAL, interval);
+  issue(card.enc_fd, driver::ENC_IOC_GET_QP, qp);
+  issue(card.enc_fd, driver::ENC_IOC_GET_GOP, gop);
+  issue(card.enc_fd, driver::ENC_IOC_GET_SCALE, scale);
+
+  const bool d1 = scale.value == driver::kScaleCodeD1;
+  const bool drop = interval.code >> driver::kIntervalDropShift != 0;
+  const u32 count = interval.code & driver::kIntervalSkipMask;
+  // In keep mode a one-field picture has one field more than its table entry; count 0 has no entry.
+  const u32 skip = drop || d1 ? count : count - 1;
+
+  ZV_VIDEO_CONFIG &config = card.config[channel];
+  config.qp = qp.value;
+  config.gop = gop.value;
+  scale_of(config).store(d1 ? SCALE_ZV_D1 : static_cast<ZV_SCALE_VALUE>(scale.value),
+                         std::memory_order_relaxed);
+  config.interval = static_cast<ZV_INTERVAL_VALUE>(interval_value({skip, drop}));
+  config.enable = (scale.value & 0xF) != 0 ? 1 : 0;
+  return ZV_OK;
+}
+
+}  // namespace
+
+int set_video_config(ZV_CARD &card, u32 channel) {
+  constexpr useconds_t kSettle = 500;
+  if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;
+  const ZV_VIDEO_CONFIG &config = card.config[channel];
+  const u32 scale = config.scale == SCALE_ZV_D1 ? driver::kScaleCodeD1 : static_cast<u32>(config.scale);
+  if (usable_qp_range(config))
+    issue(card.enc_fd, driver::ENC_IOC_SET_QP_RANGE, driver::QpRange{channel, config.QPMax, config.QPMin, 1});
+  driver::Interval interval = encoder_interval(config, channel);
+  driver::ChannelValue qp{channel, config.qp};
+  driver::ChannelValue gop{channel, config.gop};
+  if (scale == SCALE_ZV_NO_ENCODE) interval.code = qp.value = gop.value = 0;
+  issue(card.enc_fd, driver::ENC_IOC_SET_SCALE, driver::ChannelValue{channel, scale});
+  issue(card.enc_fd, driver::ENC_IOC_SET_INTERVAL, interval);
+  issue(card.enc_fd, driver::ENC_IOC_SET_QP, qp);
+  issue(card.enc_fd, driver::ENC_IOC_SET_GOP, gop);
+  issue(card.enc_fd, driver::ENC_IOC_SET_CBR,
+        driver::Cbr{channel, static_cast<u32>(config.CBRValue), config.CBREnable != 0 ? 1u : 0u});
+  usleep(kSettle);
+  return ZV_OK;
+}
+
+}  // namespace zarvo
+
+using namespace zarvo;
+
+int zv_set_video_config(HANDLE handle, u32 channel) {
+  return status_from(handle, set_video_config, channel);
+}
+
+int zv_get_video_config(HANDLE handle, u32 channel) {
+  return status_from(handle, get_video_config, channel);
+}
