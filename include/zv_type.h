@@ -41,7 +41,8 @@ typedef void *HANDLE;
  * @param flags    ZV_FLAG_MOTION and ZV_FLAG_VIDEO_LOSS of a video channel; 0 for audio
  *
  * Context: video callbacks run on the video data thread, the audio callback on the audio data
- * thread, both at once. A slow callback delays the frames behind it. It must not call zv_Stop().
+ * thread, both at once. A slow callback delays the frames behind it. It may call what its Context
+ * allows on any thread; zv_Start(), zv_Stop() and zv_Close() belong to the control thread.
  */
 typedef void (*ZV_STREAM_CALLBACK)(u32 channel, u8 *data, i32 length, i32 flags);
 
@@ -56,7 +57,7 @@ enum {
   ZV_ERR_STANDARD = 8,       /**< video standard other than 0 or 1 */
   ZV_ERR_RESOLUTION = 9,     /**< resolution other than 0 or 1 */
   ZV_ERR_CONFIG = 10,        /**< encoder configuration invalid or over the frame-rate budget */
-  ZV_ERR_PARAM = 11,         /**< a value out of its range */
+  ZV_ERR_PARAM = 11,         /**< a value out of its range, a bad handle or a null pointer */
   ZV_ERR_THREAD_CREATE = 12, /**< a thread could not be created */
   ZV_ERR_THREAD_JOIN = 14,   /**< a thread could not be joined */
   ZV_ERR_CLOSE = 15,         /**< closing a device node failed */
