@@ -26,7 +26,6 @@ SHOTS=$RESULTS/screenshots
 CARD=$BUILD/virtual_card/libzarvo_virtual_card.so
 PROGRAM=$BUILD/app/zarvo_demo
 WIDGET_MAP=$BUILD/tests/end_to_end/widget_map
-export XDG_RUNTIME_DIR=${XDG_RUNTIME_DIR:-/tmp}
 
 prepare() {
   install_missing

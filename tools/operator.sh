@@ -15,7 +15,7 @@ open_display() {
   XVFB=$!
   wait_until 20 test -s "$OPERATOR_FOLDER/display" || die "Xvfb did not start: $(cat "$OPERATOR_FOLDER/xvfb.log")"
   DISPLAY=:$(cat "$OPERATOR_FOLDER/display")
-  export DISPLAY QT_QPA_PLATFORM=xcb SDL_VIDEODRIVER=x11
+  export DISPLAY QT_QPA_PLATFORM=xcb SDL_VIDEODRIVER=x11 XDG_RUNTIME_DIR=$OPERATOR_FOLDER
   openbox >"$OPERATOR_FOLDER/openbox.log" 2>&1 &
   OPENBOX=$!
   wait_until 20 xprop -root _NET_SUPPORTING_WM_CHECK || die "openbox did not start"
@@ -64,6 +64,7 @@ click() {
 # choose COMBO INDEX: opens the list and picks the item, as a hand with arrow keys does.
 choose() {
   local keys=(Home) n
+  WINDOWS=$(program_windows)
   for ((n = 0; n < $2; ++n)); do keys+=(Down); done
   click "$1"
   wait_until 5 popup_shown || die "the list of $1 did not open"
@@ -71,10 +72,10 @@ choose() {
   wait_until 5 popup_gone || die "the list of $1 did not close"
 }
 
-# A popup is a second visible window of the dialog's process.
-popup_shown() { [ "$(qt_windows)" -ge 2 ]; }
-popup_gone() { [ "$(qt_windows)" -le 1 ]; }
-qt_windows() { xdotool search --onlyvisible --class zarvo_demo 2>/dev/null | wc -l; }
+# A popup is one more visible window of the program.
+popup_shown() { [ "$(program_windows)" -gt "$WINDOWS" ]; }
+popup_gone() { [ "$(program_windows)" -le "$WINDOWS" ]; }
+program_windows() { xdotool search --onlyvisible --class zarvo_demo 2>/dev/null | wc -l; }
 
 # enter EDIT TEXT: replaces the text of a line edit.
 enter() {
