@@ -64,7 +64,7 @@ Value parse_name(const std::string &option, const std::string &text,
                  const std::map<std::string, Value> &values) {
   if (const auto found = values.find(text); found != values.end()) return found->second;
   std::string possible;
-  for (const auto &[name, value] : values) possible += (possible.empty() ? "" : ", ") + name;
+  for (const auto &[name, value] : values) possible.append(possible.empty() ? "" : ", ").append(name);
   throw UsageError(option + ": '" + text + "' is unknown; possible are " + possible);
 }
 
