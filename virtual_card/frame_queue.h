@@ -31,6 +31,10 @@ class FrameQueue {
   void wake();
   /// Forgets the frames, not the counters.
   void clear();
+  /// Counts a frame that went to the host past the queue.
+  void passed();
+  /// Counts frames that the card came too late to make.
+  void missed(std::uint64_t frames);
   void reset_counters();
   StreamCounters counters() const;
 

@@ -15,6 +15,9 @@
 #include <string>
 #include <vector>
 
+// The library exports these functions and nothing else of its own.
+#pragma GCC visibility push(default)
+
 namespace virtual_card {
 
 // --- Power -------------------------------------------------------------------------------------
@@ -127,7 +130,7 @@ struct Command {
   Device device;
   std::uint32_t code = 0;  ///< ioctl: command code
   std::vector<std::uint8_t>
-      argument;              ///< ioctl: the record as it came in, the motion map's thresholds behind it
+      argument{};            ///< ioctl: the record as it came in, the motion map's thresholds behind it
   std::uintptr_t value = 0;  ///< ioctl: the third argument itself; read: the buffer address
   std::size_t size = 0;      ///< read: count; mmap and munmap: length
   int protection = 0;        ///< mmap
@@ -178,5 +181,7 @@ struct Counters {
 Counters counters();
 
 }  // namespace virtual_card
+
+#pragma GCC visibility pop
 
 #endif

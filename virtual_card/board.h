@@ -1,0 +1,91 @@
+/**
+ * @file board.h
+ * What the device nodes of the card share: the settings, the chips, the streams and the picture side.
+ */
+#ifndef VIRTUAL_CARD_BOARD_H
+#define VIRTUAL_CARD_BOARD_H
+
+#include <atomic>
+#include <optional>
+
+#include "board_controller.h"
+#include "clock.h"
+#include "command_log.h"
+#include "engine.h"
+#include "injector.h"
+#include "options.h"
+#include "region.h"
+#include "register_file.h"
+#include "stream.h"
+
+namespace virtual_card {
+
+/// What commands set and ask, as it is at power-up.
+struct Settings {
+  CardState state;
+  DisplayState batch;     ///< the layout between DISP_IOC_BEGIN_UPDATE and END_UPDATE
+  bool batching = false;  ///< between the two
+  RegisterFile codec = codec_at_power_up();
+  RegisterFile video_input = video_input_at_power_up();
+  DecoderChips decoders;
+  BoardController controller;
+  std::array<u16, kChannels> motion_level{};
+  std::optional<u32> scripted_motion;
+  u32 selected_buffer = 0;
+  nanoseconds encoding_since{0};
+  std::deque<std::pair<u32, long>> scripted_previews;  ///< index and result of the next preview reads
+  Settings();
+};
+
+/// The four preview pictures and which of them is where.
+struct PreviewBuffers {
+  std::optional<u32> newest;  ///< holds the last picture composed
+  std::optional<u32> handed;  ///< last handed to the host, which may still be looking at it
+  std::uint64_t composed = 0;
+
+  /// Where the next picture goes: the next in turn, past the one the host has.
+  u32 next() const;
+};
+
+struct Board {
+  Board();
+
+  /// Everything as built. Only while nothing is open.
+  void reset();
+  /// What the three devices do with a standard. Needs `mutex`.
+  long set_standard(u32 standard);
+  /// A write to a register of the codec chip, with what hangs on it. Needs `mutex`.
+  void write_codec(u32 address, u32 value);
+  void write_video_input(u32 address, u32 value);
+  void write_decoder(unsigned chip, unsigned address, u8 value);
+  /// Back to the card's own encoders.
+  void clear_supply();
+  /// How long a read may wait for its stream.
+  microseconds read_wait() const;
+  /// The card has been pulled out for now.
+  bool vanished() const;
+
+  std::mutex mutex;  ///< guards `settings` and `preview`
+  Settings settings;
+  PreviewBuffers preview;
+  std::atomic<bool> encoding{false};  ///< settings.state.encoding, for the reads
+  std::atomic<bool> supplied{false};  ///< ready-made frames take the encoders' place
+  std::atomic<bool> nowait{false};    ///< reads of an empty stream return at once
+
+  Options options;  ///< constant after power-up, but for reset()
+  Clock clock;
+  Injector injector;
+  CommandLog log;
+  Stream mpeg4;
+  Stream mjpeg;
+  Stream audio;
+  Region stream_region{"zarvo_enc0", driver::kStreamRegionSize};
+  Region preview_region{"zarvo_disp0", driver::kPreviewBuffers *driver::kPreviewBufferSize};
+  Region audio_region{"zarvo_g723_0", 0};
+  Region video_input_region{"zarvo_vin0", 0};
+  Engine engine;
+};
+
+}  // namespace virtual_card
+
+#endif

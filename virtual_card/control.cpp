@@ -1,0 +1,186 @@
+// The control interface: a hand at the machine.
+
+#include <cstdio>
+
+#include "card.h"
+#include "descriptors.h"
+
+namespace virtual_card {
+namespace {
+
+Board &board() {
+  return Card::instance().board();
+}
+
+/// Calls `use` with the settings, while nothing else changes them.
+template <typename Use>
+auto with_settings(Use use) {
+  Board &card = board();
+  const std::lock_guard lock(card.mutex);
+  return use(card.settings);
+}
+
+void refused(const char *what) {
+  std::fprintf(stderr, "virtual card: %s while a device node is open: nothing done\n", what);
+}
+
+void set_bit(u32 &word, unsigned bit, bool on) {
+  word = on ? word | 1u << bit : word & ~(1u << bit);
+}
+
+}  // namespace
+
+void reset() {
+  if (!Card::instance().reset()) refused("reset()");
+}
+
+int open_descriptors() {
+  return descriptors::count();
+}
+
+int open_mappings() {
+  return descriptors::mappings();
+}
+
+void set_clock(ClockMode mode, double speed) {
+  if (!Card::instance().set_clock(mode, speed)) refused("set_clock()");
+}
+
+void advance(std::chrono::microseconds time) {
+  Card::instance().runner().advance(time);
+}
+
+void advance_frames(int frames) {
+  Card::instance().runner().advance_frames(frames);
+}
+
+void unplug_camera(unsigned channel) {
+  with_settings([&](Settings &settings) { settings.state.channel.at(channel).lost = true; });
+}
+
+void plug_camera(unsigned channel) {
+  with_settings([&](Settings &settings) { settings.state.channel.at(channel).lost = false; });
+}
+
+void set_scene(unsigned channel, Scene scene) {
+  with_settings([&](Settings &settings) { settings.state.channel.at(channel).scene = scene; });
+}
+
+bool show_film(unsigned channel, const std::string &path, std::string *error) {
+  return board().engine.show_film(channel, path, error);
+}
+
+void silence_input(unsigned input) {
+  with_settings([&](Settings &settings) { set_bit(settings.state.sound_present, input, false); });
+}
+
+void sound_input(unsigned input) {
+  with_settings([&](Settings &settings) { set_bit(settings.state.sound_present, input, true); });
+}
+
+void queue_mpeg4(ReadyFrame frame) {
+  board().mpeg4.queue.push(std::move(frame));
+}
+
+void queue_mjpeg(ReadyFrame frame) {
+  board().mjpeg.queue.push(std::move(frame));
+}
+
+void queue_audio(ReadyFrame blocks) {
+  board().audio.queue.push(std::move(blocks));
+}
+
+void queue_preview(std::uint32_t index, long result) {
+  with_settings([&](Settings &settings) { settings.scripted_previews.emplace_back(index, result); });
+}
+
+void set_supply(Supply supply) {
+  board().supplied = true;
+  board().mpeg4.supply(std::move(supply.mpeg4), supply.video_rate, supply.limit);
+  board().mjpeg.supply(std::move(supply.mjpeg), supply.video_rate, supply.limit);
+  board().audio.supply(std::move(supply.audio), supply.audio_rate, supply.limit);
+}
+
+void clear_supply() {
+  board().clear_supply();
+}
+
+std::uint32_t codec_register(std::uint32_t address) {
+  return with_settings([&](Settings &settings) { return settings.codec.read(address); });
+}
+
+void set_codec_register(std::uint32_t address, std::uint32_t value) {
+  with_settings([&](Settings &) { board().write_codec(address, value); });
+}
+
+std::uint32_t video_input_register(std::uint32_t address) {
+  return with_settings([&](Settings &settings) { return settings.video_input.read(address); });
+}
+
+void set_video_input_register(std::uint32_t address, std::uint32_t value) {
+  with_settings([&](Settings &) { board().write_video_input(address, value); });
+}
+
+std::uint8_t decoder_register(unsigned chip, unsigned address) {
+  return with_settings(
+      [&](Settings &settings) { return settings.decoders.read(chip, address, settings.state); });
+}
+
+void set_decoder_register(unsigned chip, unsigned address, std::uint8_t value) {
+  with_settings([&](Settings &) { board().write_decoder(chip, address, value); });
+}
+
+void script_board_replies(std::uint32_t command, std::vector<std::uint32_t> replies) {
+  with_settings([&](Settings &settings) { settings.controller.script(command, replies); });
+}
+
+void set_board_version(std::uint32_t reply) {
+  with_settings([&](Settings &settings) { settings.controller.set_version(reply); });
+}
+
+void script_motion(std::uint32_t bits) {
+  with_settings([&](Settings &settings) { settings.scripted_motion = bits; });
+}
+
+void set_motion_level(unsigned channel, std::uint16_t level) {
+  with_settings([&](Settings &settings) {
+    settings.motion_level.at(channel) = level;
+    board().engine.set_threshold(channel, level);
+  });
+}
+
+void record_log(bool on) {
+  board().log.record(on);
+}
+
+std::vector<Command> log() {
+  return board().log.commands();
+}
+
+void inject(Fault fault) {
+  board().injector.set(fault);
+}
+
+void clear_fault() {
+  board().injector.clear();
+}
+
+int fault_hits() {
+  return board().injector.hits();
+}
+
+Counters counters() {
+  Counters counters;
+  counters.mpeg4 = board().mpeg4.queue.counters();
+  counters.mjpeg = board().mjpeg.queue.counters();
+  counters.audio = board().audio.queue.counters();
+  with_settings([&](Settings &settings) {
+    counters.previews = board().preview.composed;
+    counters.watchdog_kicks = settings.controller.kicks();
+    counters.watchdog_resets = settings.controller.resets();
+    counters.watchdog_running = settings.controller.watchdog_running();
+  });
+  return counters;
+}
+
+}  // namespace virtual_card

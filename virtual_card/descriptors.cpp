@@ -1,0 +1,122 @@
+#include "descriptors.h"
+
+#include <algorithm>
+#include <array>
+#include <atomic>
+#include <mutex>
+#include <vector>
+
+namespace virtual_card::descriptors {
+namespace {
+
+constexpr std::size_t kTableSize = 65536;
+constexpr std::uint8_t kForeign = 0;
+constexpr std::uint8_t kOrphan = 0xFF;
+
+std::uint8_t mark_of(Device device) {
+  return static_cast<std::uint8_t>(static_cast<int>(device) + 1);
+}
+
+constinit std::array<std::atomic<std::uint8_t>, kTableSize> marks{};  // device + 1 of each number
+constinit std::atomic<int> open_count{0};                             // marks of devices
+
+struct Mapping {
+  std::uintptr_t start;
+  std::uintptr_t end;
+  Device device;
+};
+constinit std::mutex mapping_mutex;           // guards mapping_list
+constinit std::atomic<int> mapping_count{0};  // its length, read without the lock
+std::vector<Mapping> &mapping_list() {
+  static auto *const list = new std::vector<Mapping>;  // outlives the destructors of the host
+  return *list;
+}
+
+std::atomic<std::uint8_t> *mark(int fd) {
+  return fd >= 0 && static_cast<std::size_t>(fd) < kTableSize ? &marks[static_cast<std::size_t>(fd)]
+                                                              : nullptr;
+}
+
+Owner owner_of(std::uint8_t value) {
+  if (value == kForeign) return {};
+  return {true, value == kOrphan ? Device::none : static_cast<Device>(value - 1)};
+}
+
+constexpr std::uintptr_t kPage = 4096;
+std::uintptr_t end_of(const void *address, std::size_t length) {
+  return (reinterpret_cast<std::uintptr_t>(address) + length + kPage - 1) & ~(kPage - 1);
+}
+
+}  // namespace
+
+Owner owner(int fd) {
+  const auto *entry = mark(fd);
+  return entry == nullptr ? Owner{} : owner_of(entry->load(std::memory_order_relaxed));
+}
+
+bool add(int fd, Device device) {
+  auto *entry = mark(fd);
+  if (entry == nullptr) return false;
+  entry->store(device == Device::none ? kOrphan : mark_of(device), std::memory_order_relaxed);
+  if (device != Device::none) ++open_count;
+  return true;
+}
+
+Owner remove(int fd) {
+  auto *entry = mark(fd);
+  if (entry == nullptr) return {};
+  const Owner was = owner_of(entry->exchange(kForeign, std::memory_order_relaxed));
+  if (was.ours && was.device != Device::none) --open_count;
+  return was;
+}
+
+int count() {
+  return open_count;
+}
+
+void add_mapping(void *address, std::size_t length, Device device) {
+  const std::lock_guard lock(mapping_mutex);
+  mapping_list().push_back({reinterpret_cast<std::uintptr_t>(address), end_of(address, length), device});
+  ++mapping_count;
+}
+
+std::optional<Device> mapping(const void *address, std::size_t length) {
+  if (mapping_count == 0) return {};
+  const auto start = reinterpret_cast<std::uintptr_t>(address);
+  const std::uintptr_t end = end_of(address, length);
+  const std::lock_guard lock(mapping_mutex);
+  for (const Mapping &entry : mapping_list())
+    if (entry.start < end && start < entry.end) return entry.device;
+  return {};
+}
+
+int remove_mappings(const void *address, std::size_t length) {
+  const auto start = reinterpret_cast<std::uintptr_t>(address);
+  const std::uintptr_t end = end_of(address, length);
+  const std::lock_guard lock(mapping_mutex);
+  const auto removed = std::erase_if(
+      mapping_list(), [&](const Mapping &entry) { return start <= entry.start && entry.end <= end; });
+  mapping_count -= static_cast<int>(removed);
+  return static_cast<int>(removed);
+}
+
+int mappings() {
+  return mapping_count;
+}
+
+void before_fork() {
+  mapping_mutex.lock();
+}
+
+void after_fork(bool child) {
+  if (child) {
+    mapping_list().clear();
+    mapping_count = 0;
+    open_count = 0;
+    for (auto &entry : marks)
+      if (entry.load(std::memory_order_relaxed) != kForeign) entry.store(kOrphan, std::memory_order_relaxed);
+  }
+  mapping_mutex.unlock();
+}
+
+}  // namespace virtual_card::descriptors

@@ -1,0 +1,18 @@
+#ifndef VIRTUAL_CARD_DEVICE_AUDIO_H
+#define VIRTUAL_CARD_DEVICE_AUDIO_H
+
+#include "device.h"
+
+namespace virtual_card {
+
+/// /dev/zarvo_g723_0: audio blocks. It takes no commands.
+class AudioDevice : public DeviceNode {
+ public:
+  explicit AudioDevice(Board &board) : DeviceNode(board, Device::audio, board.audio_region) {}
+
+  long read(std::uintptr_t buffer, std::size_t count) override;
+};
+
+}  // namespace virtual_card
+
+#endif

@@ -1,0 +1,76 @@
+#include <algorithm>
+
+#include "clock.h"
+#include "frame_queue.h"
+
+namespace virtual_card {
+
+FrameQueue::FrameQueue(std::size_t capacity) : capacity_(capacity) {}
+
+bool FrameQueue::push(ReadyFrame frame) {
+  {
+    const std::lock_guard lock(mutex_);
+    ++counters_.made;
+    if (bytes_ + frame.area.size() > capacity_) {
+      ++counters_.lost;
+      return false;
+    }
+    bytes_ += frame.area.size();
+    frames_.push_back(std::move(frame));
+  }
+  filled_.notify_one();
+  return true;
+}
+
+std::optional<ReadyFrame> FrameQueue::pop(std::chrono::microseconds wait) {
+  std::unique_lock lock(mutex_);
+  if (frames_.empty() && wait.count() > 0) {
+    const auto wakes = wakes_;
+    const auto until = monotonic_now() + wait;
+    while (frames_.empty() && wakes == wakes_ && monotonic_now() < until) filled_.wait_until(lock, until);
+  }
+  if (frames_.empty()) return {};
+  std::optional<ReadyFrame> frame(std::move(frames_.front()));
+  frames_.pop_front();
+  bytes_ -= frame->area.size();
+  ++counters_.delivered;
+  return frame;
+}
+
+void FrameQueue::wake() {
+  {
+    const std::lock_guard lock(mutex_);
+    ++wakes_;
+  }
+  filled_.notify_all();
+}
+
+void FrameQueue::clear() {
+  const std::lock_guard lock(mutex_);
+  frames_.clear();
+  bytes_ = 0;
+}
+
+void FrameQueue::passed() {
+  const std::lock_guard lock(mutex_);
+  ++counters_.made;
+  ++counters_.delivered;
+}
+
+void FrameQueue::missed(std::uint64_t frames) {
+  const std::lock_guard lock(mutex_);
+  counters_.made += frames;
+  counters_.lost += frames;
+}
+
+void FrameQueue::reset_counters() {
+  const std::lock_guard lock(mutex_);
+  counters_ = {};
+}
+
+StreamCounters FrameQueue::counters() const {
+  const std::lock_guard lock(mutex_);
+  return counters_;
+}
+
+}  // namespace virtual_card

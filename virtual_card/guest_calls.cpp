@@ -1,0 +1,197 @@
+#include "guest_calls.h"
+
+#include <fcntl.h>
+#include <pthread.h>
+#include <sys/mman.h>
+
+#include <cerrno>
+#include <cstring>
+#include <exception>
+#include <new>
+
+#include "card.h"
+#include "descriptors.h"
+#include "preload.h"
+
+namespace virtual_card::guest {
+namespace {
+
+using descriptors::owner;
+using descriptors::Owner;
+
+constexpr char kPrefix[] = "/dev/zarvo_";
+
+bool is_node(const char *path) {
+  return path != nullptr && std::strncmp(path, kPrefix, sizeof kPrefix - 1) == 0;
+}
+
+/// Runs a call of the card, whose results below zero are negated error numbers as a driver's are.
+/// A result below every error number is passed on as it is, as libc does.
+template <typename Call>
+long answer(Call call) {
+  constexpr long kMaxError = 4095;
+  const int before = errno;
+  long result = 0;
+  try {
+    result = call();
+  } catch (const std::bad_alloc &) {
+    result = -ENOMEM;
+  } catch (const std::exception &) {
+    result = -EIO;
+  }
+  if (result < 0 && result >= -kMaxError) {
+    errno = static_cast<int>(-result);
+    return -1;
+  }
+  errno = before;
+  return result;
+}
+
+int open_node(const char *path, int flags) {
+  return static_cast<int>(answer([&]() -> long {
+    const Device device = device_of(path);
+    const long fd = Card::instance().open(device, flags);
+    if (fd < 0) return fd;
+    if (descriptors::add(static_cast<int>(fd), device)) return fd;
+    real::close(static_cast<int>(fd));
+    Card::instance().closed();
+    return -EMFILE;
+  }));
+}
+
+/// The number leaves the table before it leaves the process: from then on it may be someone else's.
+long close_node(int fd) {
+  const Owner was = descriptors::remove(fd);
+  if (was.device == Device::none) return real::close(fd) == 0 ? 0 : -errno;
+  const long result = Card::instance().close(was.device);
+  const bool closed = real::close(fd) == 0;
+  Card::instance().closed();
+  return closed ? result : -errno;
+}
+
+/// A second descriptor of the same node.
+int duplicated(const Owner &source, int fd) {
+  if (fd < 0 || !source.ours) return fd;
+  if (source.device != Device::none) Card::instance().duplicated();
+  if (descriptors::add(fd, source.device)) return fd;
+  real::close(fd);
+  if (source.device != Device::none) Card::instance().closed();
+  errno = EMFILE;
+  return -1;
+}
+
+/// What dup2 and dup3 do to a node's descriptor that they replace.
+void replaced(const Owner &target, int fd, int result) {
+  if (result < 0 || !target.ours) return;
+  descriptors::remove(fd);
+  if (target.device != Device::none) Card::instance().closed();
+}
+
+struct AtLoad {
+  AtLoad() {
+    leave_preload_list();
+    pthread_atfork(
+        [] {
+          Card::before_fork();
+          descriptors::before_fork();
+        },
+        [] {
+          descriptors::after_fork(false);
+          Card::after_fork(false);
+        },
+        [] {
+          descriptors::after_fork(true);
+          Card::after_fork(true);
+        });
+  }
+};
+const AtLoad at_load;
+
+}  // namespace
+
+int open(real::Name spelling, const char *path, int flags, mode_t mode) {
+  return is_node(path) ? open_node(path, flags) : real::open(spelling, path, flags, mode);
+}
+
+int openat(real::Name spelling, int directory, const char *path, int flags, mode_t mode) {
+  return is_node(path) ? open_node(path, flags) : real::openat(spelling, directory, path, flags, mode);
+}
+
+int close(int fd) {
+  if (!owner(fd).ours) return real::close(fd);
+  return static_cast<int>(answer([&] { return close_node(fd); }));
+}
+
+int ioctl(int fd, unsigned long code, void *argument) {
+  const Owner node = owner(fd);
+  if (!node.ours) return real::ioctl(fd, code, argument);
+  return static_cast<int>(answer([&] {
+    return Card::instance().ioctl(node.device, static_cast<u32>(code),
+                                  reinterpret_cast<std::uintptr_t>(argument));
+  }));
+}
+
+ssize_t read(int fd, void *buffer, std::size_t count) {
+  const Owner node = owner(fd);
+  if (!node.ours) return real::read(fd, buffer, count);
+  return answer(
+      [&] { return Card::instance().read(node.device, reinterpret_cast<std::uintptr_t>(buffer), count); });
+}
+
+ssize_t read_chk(int fd, void *buffer, std::size_t count, std::size_t buffer_size) {
+  return owner(fd).ours ? read(fd, buffer, count) : real::read_chk(fd, buffer, count, buffer_size);
+}
+
+void *mmap(real::Name spelling, void *address, std::size_t length, int protection, int flags, int fd,
+           off_t offset) {
+  const Owner node = (flags & MAP_ANONYMOUS) != 0 ? Owner{} : owner(fd);
+  if (!node.ours) return real::mmap(spelling, address, length, protection, flags, fd, offset);
+  void *mapped = MAP_FAILED;
+  answer([&]() -> long {
+    const MapRequest request{address, length, protection, flags, offset};
+    const long result = Card::instance().mmap(node.device, fd, request, mapped);
+    if (result == 0) descriptors::add_mapping(mapped, length, node.device);
+    return result;
+  });
+  return mapped;
+}
+
+int munmap(void *address, std::size_t length) {
+  const auto device = descriptors::mapping(address, length);
+  if (!device) return real::munmap(address, length);
+  return static_cast<int>(answer([&]() -> long {
+    if (const long fault = Card::instance().munmap(*device, length); fault < 0) return fault;
+    if (real::munmap(address, length) != 0) return -errno;
+    Card::instance().unmapped(descriptors::remove_mappings(address, length));
+    return 0;
+  }));
+}
+
+int dup(int fd) {
+  return duplicated(owner(fd), real::dup(fd));
+}
+
+int dup2(int fd, int to) {
+  const Owner source = owner(fd);
+  const Owner target = owner(to);
+  const int result = real::dup2(fd, to);
+  if (fd == to) return result;
+  replaced(target, to, result);
+  return duplicated(source, result);
+}
+
+int dup3(int fd, int to, int flags) {
+  const Owner source = owner(fd);
+  const Owner target = owner(to);
+  const int result = real::dup3(fd, to, flags);
+  replaced(target, to, result);
+  return duplicated(source, result);
+}
+
+int fcntl(real::Name spelling, int fd, int command, void *argument) {
+  const int result = real::fcntl(spelling, fd, command, argument);
+  const bool duplicates = command == F_DUPFD || command == F_DUPFD_CLOEXEC;
+  return duplicates ? duplicated(owner(fd), result) : result;
+}
+
+}  // namespace virtual_card::guest

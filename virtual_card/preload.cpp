@@ -1,0 +1,53 @@
+#include "preload.h"
+
+#include <dlfcn.h>
+#include <unistd.h>
+
+#include <cstring>
+
+namespace virtual_card {
+namespace {
+
+const char *base_name(const char *path) {
+  const char *slash = std::strrchr(path, '/');
+  return slash == nullptr ? path : slash + 1;
+}
+
+/// Removes the entries of a list that end in the file name; true when nothing is left. The list only
+/// gets shorter, so it is rewritten where it stands: a shell may have functions of its own behind
+/// setenv and getenv, and none of them is ready this early.
+bool remove_from_list(char *list, const char *name) {
+  const std::size_t length = std::strlen(name);
+  char *to = list;
+  for (const char *from = list; *from != '\0';) {
+    const std::size_t size = std::strcspn(from, ": ");
+    const char *end = from + size;
+    const bool is_it = size >= length && std::strncmp(end - length, name, length) == 0 &&
+                       (size == length || end[-static_cast<std::ptrdiff_t>(length) - 1] == '/');
+    if (!is_it && size > 0) {
+      if (to != list) *to++ = ':';
+      std::memmove(to, from, size);
+      to += size;
+    }
+    from = *end == '\0' ? end : end + 1;
+  }
+  *to = '\0';
+  return to == list;
+}
+
+}  // namespace
+
+void leave_preload_list() {
+  constexpr char kVariable[] = "LD_PRELOAD=";
+  Dl_info library{};
+  if (dladdr(reinterpret_cast<const void *>(&leave_preload_list), &library) == 0 || environ == nullptr)
+    return;
+  for (char **entry = environ; *entry != nullptr; ++entry) {
+    if (std::strncmp(*entry, kVariable, sizeof kVariable - 1) != 0) continue;
+    if (!remove_from_list(*entry + sizeof kVariable - 1, base_name(library.dli_fname))) continue;
+    for (char **place = entry; *place != nullptr; ++place) *place = place[1];
+    return;
+  }
+}
+
+}  // namespace virtual_card

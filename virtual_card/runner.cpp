@@ -1,0 +1,202 @@
+#include "runner.h"
+
+#include <algorithm>
+#include <cstdio>
+
+#include "encoded_picture.h"
+
+namespace virtual_card {
+namespace {
+
+constexpr nanoseconds kNever = nanoseconds::max();
+
+std::int64_t audio_block_at(nanoseconds time) {
+  return (time + kAudioBlock - nanoseconds{1}) / kAudioBlock;
+}
+
+/// Pictures a channel would have encoded in a range of fields.
+std::uint64_t pictures_between(const EncoderSettings &encoder, std::int64_t first, std::int64_t end) {
+  std::uint64_t pictures = 0;
+  if (encoder.scale_code == 0) return pictures;
+  for (std::int64_t field = first; field < end; ++field)
+    if (picture_due(encoder.interval_code, encoder.scale_code == driver::kScaleCodeD1, field)) ++pictures;
+  return pictures;
+}
+
+}  // namespace
+
+void Runner::start() {
+  stop();
+  if (board_.clock.mode() == ClockMode::manual) return;
+  {
+    const std::lock_guard lock(run_mutex_);
+    const nanoseconds now = board_.clock.now();
+    field_ = std::max(field_, fields_.first_at(now));
+    audio_block_ = std::max(audio_block_, audio_block_at(now));
+  }
+  stopping_ = false;
+  thread_ = std::thread([this] { loop(); });
+}
+
+void Runner::stop() {
+  if (!thread_.joinable()) return;
+  {
+    const std::lock_guard lock(stop_mutex_);
+    stopping_ = true;
+  }
+  stop_signal_.notify_all();
+  thread_.join();
+}
+
+void Runner::power_up() {
+  const std::lock_guard lock(run_mutex_);
+  fields_ = FieldTimes{};
+  field_ = 0;
+  audio_block_ = 0;
+}
+
+void Runner::loop() {
+  std::unique_lock stop_lock(stop_mutex_);
+  while (!stopping_) {
+    stop_lock.unlock();
+    MonotonicTime wake;
+    {
+      const std::lock_guard lock(run_mutex_);
+      const nanoseconds now = board_.clock.now();
+      const Next first = next();
+      if (now - first.due > board_.clock.second()) skip_to(now);
+      if (first.due <= now) run(first);
+      wake = board_.clock.when(next().due);
+    }
+    stop_lock.lock();
+    while (!stopping_ && monotonic_now() < wake) stop_signal_.wait_until(stop_lock, wake);
+  }
+}
+
+void Runner::advance(nanoseconds time) {
+  if (board_.clock.mode() != ClockMode::manual) return;
+  const std::lock_guard lock(run_mutex_);
+  run_until(board_.clock.now() + time);
+}
+
+void Runner::advance_frames(int frames) {
+  if (board_.clock.mode() != ClockMode::manual) return;
+  const std::lock_guard lock(run_mutex_);
+  next();  // takes up a change of the standard
+  run_until(fields_.due(field_ + 2 * std::int64_t{frames}));
+}
+
+void Runner::run_until(nanoseconds time) {
+  for (Next first = next(); first.due < time; first = next()) {
+    board_.clock.move_to(first.due);
+    run(first);
+  }
+  board_.clock.move_to(time);
+  watch(time);
+}
+
+CardState Runner::snapshot() {
+  const std::lock_guard lock(board_.mutex);
+  return board_.settings.state;
+}
+
+Runner::Next Runner::next() {
+  const CardState state = snapshot();
+  if (state.standard != fields_.standard()) fields_.change_standard(state.standard, field_);
+  const Next all[] = {{Event::field, fields_.due(field_)},
+                      {Event::audio, audio_block_ * kAudioBlock},
+                      {Event::video_supply, pace_due(video_pace_, state)},
+                      {Event::audio_supply, pace_due(audio_pace_, state)}};
+  return *std::min_element(std::begin(all), std::end(all),
+                           [](const Next &a, const Next &b) { return a.due < b.due; });
+}
+
+nanoseconds Runner::pace_due(Pace &pace, const CardState &state) {
+  double rate = 0;
+  for (const Stream *stream : pace.streams)
+    if (stream != nullptr) rate = std::max(rate, stream->pace());
+  if (!state.encoding || rate <= 0) return kNever;
+  const nanoseconds since = [&] {
+    const std::lock_guard lock(board_.mutex);
+    return board_.settings.encoding_since;
+  }();
+  if (since != pace.since) pace.count = 0;
+  pace.since = since;
+  return since + nanoseconds{static_cast<std::int64_t>(static_cast<double>(pace.count) * 1e9 / rate)};
+}
+
+void Runner::run(const Next &next) {
+  const auto supply = [](Pace &pace) {
+    ++pace.count;
+    for (Stream *stream : pace.streams)
+      if (stream != nullptr) stream->supply_due();
+  };
+  switch (next.event) {
+    case Event::field:
+      return run_field();
+    case Event::audio:
+      return run_audio_block();
+    case Event::video_supply:
+      return supply(video_pace_);
+    case Event::audio_supply:
+      return supply(audio_pace_);
+  }
+}
+
+void Runner::run_field() {
+  CardState state = snapshot();
+  const bool supplied = board_.supplied;
+  if (supplied) state.encoding = false;
+  const nanoseconds due = fields_.due(field_);
+  board_.engine.field(state, {field_, board_.clock.wall(due)});
+  if (field_ % 2 != 0 && state.display.on) compose(state);
+  ++field_;
+  watch(due);
+}
+
+void Runner::run_audio_block() {
+  const CardState state = snapshot();
+  if (state.encoding && !board_.supplied) board_.engine.audio_block(state, audio_block_);
+  ++audio_block_;
+}
+
+void Runner::compose(const CardState &state) {
+  const u32 buffer = [&] {
+    const std::lock_guard lock(board_.mutex);
+    return board_.preview.next();
+  }();
+  bool composed = false;
+  board_.preview_region.with_bytes([&](std::span<u8> bytes) {
+    const std::size_t size = std::size_t{state.width} * state.lines() * 2;
+    board_.engine.compose(state, bytes.subspan(buffer * driver::kPreviewBufferSize, size));
+    composed = true;
+  });
+  const std::lock_guard lock(board_.mutex);
+  if (!composed || !board_.settings.state.display.on) return;
+  board_.preview.newest = buffer;
+  ++board_.preview.composed;
+}
+
+void Runner::watch(nanoseconds now) {
+  const std::lock_guard lock(board_.mutex);
+  if (board_.settings.controller.expired(now))
+    std::fputs("virtual card: the watchdog would have reset the machine\n", stderr);
+}
+
+void Runner::skip_to(nanoseconds now) {
+  const CardState state = snapshot();
+  const std::int64_t field = fields_.first_at(now);
+  const std::int64_t block = audio_block_at(now);
+  if (state.encoding && !board_.supplied) {
+    std::uint64_t frames = 0;
+    for (const ChannelState &channel : state.channel)
+      frames += pictures_between(channel.encoder, field_, field);
+    board_.mpeg4.queue.missed(frames);
+    board_.mjpeg.queue.missed(frames);
+    if (block > audio_block_) board_.audio.queue.missed(static_cast<std::uint64_t>(block - audio_block_));
+  }
+  field_ = std::max(field_, field);
+  audio_block_ = std::max(audio_block_, block);
+}
+
+}  // namespace virtual_card

@@ -1,0 +1,76 @@
+/**
+ * @file runner.h
+ * Makes the card run: calls the picture side for each field and audio block when it is due, composes
+ * the preview, hands out paced supplies and watches the watchdog.
+ */
+#ifndef VIRTUAL_CARD_RUNNER_H
+#define VIRTUAL_CARD_RUNNER_H
+
+#include <condition_variable>
+#include <thread>
+
+#include "board.h"
+
+namespace virtual_card {
+
+class Runner {
+ public:
+  explicit Runner(Board &board) : board_(board) {}
+  ~Runner() { stop(); }
+  Runner(const Runner &) = delete;
+  Runner &operator=(const Runner &) = delete;
+
+  /// Begins the thread, unless the clock is manual. What was due while it did not run is not made up for.
+  void start();
+  /// Ends and joins it. Calling it twice is harmless.
+  void stop();
+  /// After a power-up of the clock: everything is due from card time 0 again.
+  void power_up();
+
+  /// Manual clock only: runs everything that is due in the time, on the caller's thread.
+  void advance(nanoseconds time);
+  void advance_frames(int frames);
+
+ private:
+  struct Pace {
+    Stream *streams[2];
+    std::int64_t count;  ///< frames that came due since `since`
+    nanoseconds since;   ///< when encoding began
+  };
+  enum class Event { field, audio, video_supply, audio_supply };
+  struct Next {
+    Event event;
+    nanoseconds due;
+  };
+
+  void loop();
+  /// What is due first.
+  Next next();
+  void run(const Next &next);
+  void run_until(nanoseconds time);
+  void run_field();
+  void run_audio_block();
+  void compose(const CardState &state);
+  void watch(nanoseconds now);
+  CardState snapshot();
+  nanoseconds pace_due(Pace &pace, const CardState &state);
+  /// Leaves out what is long overdue and counts what that loses.
+  void skip_to(nanoseconds now);
+
+  Board &board_;
+  std::thread thread_;
+  std::mutex stop_mutex_;  // guards stopping_
+  std::condition_variable stop_signal_;
+  bool stopping_ = false;
+
+  std::mutex run_mutex_;  // guards what follows: the thread and a manual advance() may not mix
+  FieldTimes fields_;
+  std::int64_t field_ = 0;        // next one
+  std::int64_t audio_block_ = 0;  // next one
+  Pace video_pace_{{&board_.mpeg4, &board_.mjpeg}, 0, {}};
+  Pace audio_pace_{{&board_.audio, nullptr}, 0, {}};
+};
+
+}  // namespace virtual_card
+
+#endif

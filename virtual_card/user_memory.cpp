@@ -1,0 +1,40 @@
+#include "user_memory.h"
+
+#include <sys/syscall.h>
+#include <sys/uio.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstring>
+
+namespace virtual_card {
+namespace {
+
+/// The plain system call: libc's wrapper may be a sanitizer's, which would look at the host's address
+/// itself.
+long transfer(long call, void *here, std::uintptr_t there, std::size_t size) {
+  iovec local{here, size};
+  iovec remote{reinterpret_cast<void *>(there), size};
+  const long done = ::syscall(call, ::getpid(), &local, 1ul, &remote, 1ul, 0ul);
+  if (done == static_cast<long>(size)) return 0;
+  // A sandbox may forbid the call even on the own process. Then only null can be told apart.
+  const bool forbidden = done < 0 && (errno == ENOSYS || errno == EPERM);
+  if (!forbidden || there == 0) return -EFAULT;
+  if (call == SYS_process_vm_readv)
+    std::memcpy(here, remote.iov_base, size);
+  else
+    std::memcpy(remote.iov_base, here, size);
+  return 0;
+}
+
+}  // namespace
+
+long copy_from_user(void *to, std::uintptr_t from, std::size_t size) {
+  return transfer(SYS_process_vm_readv, to, from, size);
+}
+
+long copy_to_user(std::uintptr_t to, const void *from, std::size_t size) {
+  return transfer(SYS_process_vm_writev, const_cast<void *>(from), to, size);
+}
+
+}  // namespace virtual_card
