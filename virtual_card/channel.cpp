@@ -1,0 +1,76 @@
+#include "channel.h"
+
+#include <algorithm>
+
+namespace virtual_card {
+
+namespace {
+
+constexpr u32 kOverlayHeight = 20;          ///< lines of a figure in pictures of one field
+constexpr u32 kDescriptorLength = 1 << 20;  ///< frame lengths a descriptor cannot say any more
+constexpr std::size_t kMostMpeg4 =
+    std::min<std::size_t>(kDescriptorLength - 1, driver::kMpeg4AreaSize - driver::kMpeg4DescriptorSize);
+constexpr std::size_t kMostJpeg = driver::kMjpegReadSize - driver::kMjpegDescriptorSize;
+
+}  // namespace
+
+Channel::Work Channel::work(const CardState &state, std::int64_t field) {
+  const ChannelState &channel = state.channel[number_];
+  Work work;
+  const auto size =
+      state.encoding ? encoded_size(channel.encoder.scale_code, state.width, state.lines()) : std::nullopt;
+  if (!size) {
+    mpeg4_.reset();
+  } else if (picture_due(channel.encoder.interval_code, size->interlaced, field)) {
+    work.size = size;
+  }
+  const bool detect = ((state.motion_enable >> number_) & 1) != 0 && !channel.lost;
+  if (detect != detecting_) motion_.forget();
+  detecting_ = detect;
+  work.look = detect && MotionDetector::looks_at(field);
+  return work;
+}
+
+void Channel::adjust(const CardState &state) {
+  // A change of the picture's settings is not motion in front of the camera.
+  if (camera_.adjust(state)) motion_.forget();
+}
+
+void Channel::draw(const CardState &state, const FieldMoment &moment) {
+  adjust(state);
+  camera_.draw(moment);
+}
+
+void Channel::process(const CardState &state, const FieldMoment &moment, const Work &work) {
+  adjust(state);
+  if (work.size && work.size->interlaced) camera_.draw(moment.field_before());
+  camera_.draw(moment);
+  if (work.look) motion_.look(camera_.picture(), moment.number);
+  if (work.size) encode(state, moment.parity(), *work.size);
+}
+
+void Channel::encode(const CardState &state, u32 parity, EncodedSize size) {
+  const EncoderSettings &encoder = state.channel[number_].encoder;
+  scale_picture(camera_.picture(), parity, size, picture_);
+  if (encoder.number_overlay) {
+    const u32 height = size.interlaced ? 2 * kOverlayHeight : kOverlayHeight;
+    if (!overlay_ || overlay_->height() != height) overlay_.emplace(height);
+    burn_number(picture_, number_, *overlay_);
+  }
+
+  const double rate = picture_rate(encoder.interval_code, size.interlaced, state.standard);
+  const Mpeg4Settings settings = mpeg4_settings(encoder, size, rate);
+  if (!mpeg4_ || mpeg4_->settings() != settings) mpeg4_.emplace(settings);
+  output_.size = size;
+  output_.mpeg4 = mpeg4_->encode(picture_);
+  if (output_.mpeg4.bitstream.empty() || output_.mpeg4.bitstream.size() > kMostMpeg4) {
+    // What follows must not build on a frame nobody gets.
+    output_.mpeg4.bitstream.clear();
+    mpeg4_.reset();
+  }
+  if (!jpeg_) jpeg_.emplace();
+  output_.jpeg = jpeg_->encode(picture_, fine_quality(state.mjpeg_quality));
+  if (output_.jpeg.size() > kMostJpeg) output_.jpeg.clear();
+}
+
+}  // namespace virtual_card

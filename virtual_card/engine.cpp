@@ -1,0 +1,184 @@
+#include "engine.h"
+
+#include <algorithm>
+#include <array>
+#include <atomic>
+#include <mutex>
+#include <optional>
+#include <thread>
+
+#include "audio_encoder.h"
+#include "channel.h"
+#include "compositor.h"
+#include "worker_pool.h"
+
+namespace virtual_card {
+
+namespace {
+
+constexpr unsigned kMostThreads = 4;
+
+unsigned thread_count() {
+  return std::clamp(std::thread::hardware_concurrency(), 1u, kMostThreads);
+}
+
+template <std::size_t... I>
+auto make_channels(std::index_sequence<I...>) {
+  return std::array<std::unique_ptr<Channel>, sizeof...(I)>{
+      std::make_unique<Channel>(static_cast<unsigned>(I))...};
+}
+
+template <std::size_t... I>
+auto make_audio(std::index_sequence<I...>) {
+  return std::array<AudioEncoder, sizeof...(I)>{AudioEncoder(static_cast<unsigned>(I))...};
+}
+
+}  // namespace
+
+struct Engine::Parts {
+  Parts(FrameQueue &mpeg4_queue, FrameQueue &mjpeg_queue, FrameQueue &audio_queue)
+      : mpeg4(mpeg4_queue), mjpeg(mjpeg_queue), audio(audio_queue), pool(thread_count()) {}
+
+  void take_films();
+  void queue_output(unsigned channel, std::chrono::microseconds time);
+
+  FrameQueue &mpeg4;
+  FrameQueue &mjpeg;
+  FrameQueue &audio;
+  WorkerPool pool;
+  std::array<std::unique_ptr<Channel>, kChannels> channels =
+      make_channels(std::make_index_sequence<kChannels>());
+  std::array<AudioEncoder, kAudioInputs> inputs = make_audio(std::make_index_sequence<kAudioInputs>());
+  Compositor compositor;
+  FieldTime last{0, std::chrono::microseconds{0}};
+  std::atomic<u32> motion{0};  ///< channel bits, written by field()
+
+  std::mutex films_mutex;  ///< guards the films on their way to their cameras
+  std::array<std::optional<std::shared_ptr<Film>>, kChannels> new_films;
+};
+
+Engine::Engine(FrameQueue &mpeg4, FrameQueue &mjpeg, FrameQueue &audio)
+    : parts_(std::make_unique<Parts>(mpeg4, mjpeg, audio)) {}
+
+Engine::~Engine() = default;
+
+void Engine::Parts::take_films() {
+  const std::lock_guard lock(films_mutex);
+  for (unsigned i = 0; i < kChannels; ++i) {
+    if (!new_films[i]) continue;
+    channels[i]->camera().show_film(std::move(*new_films[i]));
+    new_films[i].reset();
+  }
+}
+
+void Engine::Parts::queue_output(unsigned channel, std::chrono::microseconds time) {
+  const Channel::Output &output = channels[channel]->output();
+  if (!output.mpeg4.bitstream.empty()) {
+    mpeg4.push(mpeg4_frame(channel, output.mpeg4.intra ? 0 : 1, output.mpeg4.bitstream, time));
+  }
+  if (!output.jpeg.empty()) {
+    mjpeg.push(mjpeg_frame(channel, output.size.width, output.size.height, output.jpeg));
+  }
+}
+
+void Engine::field(const CardState &state, FieldTime time) {
+  Parts &parts = *parts_;
+  parts.last = time;
+  parts.take_films();
+
+  std::array<Channel::Work, kChannels> work;
+  std::vector<unsigned> busy;
+  for (unsigned i = 0; i < kChannels; ++i) {
+    work[i] = parts.channels[i]->work(state, time.number);
+    if (work[i].any()) busy.push_back(i);
+  }
+  if (!busy.empty()) {
+    const FieldMoment moment(state.standard, time.number, time.wall_time);
+    parts.pool.run(busy.size(), [&](std::size_t job) {
+      parts.channels[busy[job]]->process(state, moment, work[busy[job]]);
+    });
+  }
+  // Always in the order of the channels, whichever was ready first.
+  for (const unsigned channel : busy) {
+    if (work[channel].size) parts.queue_output(channel, time.wall_time);
+  }
+  u32 motion = 0;
+  for (unsigned i = 0; i < kChannels; ++i) {
+    if (parts.channels[i]->motion().motion(time.number)) motion |= 1u << i;
+  }
+  parts.motion.store(motion, std::memory_order_relaxed);
+}
+
+void Engine::audio_block(const CardState &state, std::int64_t block) {
+  ReadyFrame frame;
+  frame.result = driver::kAudioReadCount;
+  for (unsigned i = 0; i < kAudioInputs; ++i) {
+    const auto bytes = parts_->inputs[i].encode(block, ((state.sound_present >> i) & 1) != 0);
+    frame.area.insert(frame.area.end(), bytes.begin(), bytes.end());
+  }
+  parts_->audio.push(std::move(frame));
+}
+
+void Engine::compose(const CardState &state, std::span<u8> uyvy) {
+  Parts &parts = *parts_;
+  parts.take_films();
+  const std::vector<View> windows = views(state);
+  u32 shown = 0, both_fields = 0;
+  for (const View &view : windows) {
+    if (view.channel >= kChannels) continue;
+    shown |= 1u << view.channel;
+    if (view.both_fields) both_fields |= 1u << view.channel;
+  }
+
+  const FieldMoment moment(state.standard, parts.last.number, parts.last.wall_time);
+  const FieldMoment before = moment.field_before();
+  const FieldMoment &top = moment.parity() == 0 ? moment : before;
+  const FieldMoment &bottom = moment.parity() == 0 ? before : moment;
+  parts.pool.run(kChannels, [&](std::size_t i) {
+    if (((shown >> i) & 1) != 0) parts.channels[i]->draw(state, top);
+    if (((both_fields >> i) & 1) != 0) parts.channels[i]->draw(state, bottom);
+  });
+
+  std::array<ViewSource, kChannels> sources;
+  for (unsigned i = 0; i < kChannels; ++i) {
+    if (((shown >> i) & 1) == 0) continue;
+    MotionDetector &motion = parts.channels[i]->motion();
+    sources[i].picture = &parts.channels[i]->camera().picture();
+    if (state.display.motion_trace && motion.motion(parts.last.number)) sources[i].marks = &motion.blocks();
+  }
+  parts.compositor.compose(state, windows, sources, uyvy);
+}
+
+u32 Engine::motion() const {
+  return parts_->motion.load(std::memory_order_relaxed);
+}
+
+void Engine::set_thresholds(const driver::MotionMap &map) {
+  if (map.channel < kChannels) parts_->channels[map.channel]->motion().set_thresholds(map);
+}
+
+void Engine::set_threshold(unsigned channel, u16 level) {
+  if (channel < kChannels) parts_->channels[channel]->motion().set_threshold(level);
+}
+
+bool Engine::show_film(unsigned channel, const std::string &path, std::string *error) {
+  if (channel >= kChannels) {
+    if (error != nullptr) *error = "no channel " + std::to_string(channel);
+    return false;
+  }
+  std::shared_ptr<Film> film;
+  if (!path.empty()) {
+    film = Film::open(path, error);
+    if (!film) return false;
+  }
+  const std::lock_guard lock(parts_->films_mutex);
+  parts_->new_films[channel] = std::move(film);
+  return true;
+}
+
+void Engine::reset() {
+  Parts &parts = *parts_;
+  parts_ = std::make_unique<Parts>(parts.mpeg4, parts.mjpeg, parts.audio);
+}
+
+}  // namespace virtual_card

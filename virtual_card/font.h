@@ -1,0 +1,42 @@
+/**
+ * @file font.h
+ * The figures the card burns into pictures.
+ */
+#ifndef VIRTUAL_CARD_FONT_H
+#define VIRTUAL_CARD_FONT_H
+
+#include <array>
+#include <string_view>
+
+#include "picture.h"
+
+namespace virtual_card {
+
+/// Digits, colon and full stop at one size, with round corners whatever the size.
+class Font {
+ public:
+  /// `height` of a digit in lines; a glyph is an even number of pixels wide.
+  explicit Font(u32 height);
+
+  u32 height() const { return height_; }
+  u32 advance() const { return advance_; }
+  u32 text_width(std::string_view text) const { return advance_ * static_cast<u32>(text.size()); }
+  /// Characters the font does not have leave a gap.
+  const Coverage *glyph(char character) const;
+
+ private:
+  u32 height_;
+  u32 advance_;
+  std::array<Coverage, 12> glyphs_;
+};
+
+/// Paints a text with its top left corner at an even x.
+void draw_text(Picture &picture, const Font &font, std::string_view text, u32 x, u32 y, Colour colour,
+               Lines lines = kAllLines);
+
+/// A channel as operators count, from 1, in two figures.
+std::string_view channel_text(unsigned channel);
+
+}  // namespace virtual_card
+
+#endif

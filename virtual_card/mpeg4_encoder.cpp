@@ -1,0 +1,128 @@
+#include "mpeg4_encoder.h"
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+
+extern "C" {
+#include <libavcodec/avcodec.h>
+#include <libavutil/opt.h>
+}
+
+namespace virtual_card {
+
+namespace {
+
+constexpr u32 kLeastQuantiser = 1;
+constexpr u32 kMostQuantiser = 31;
+constexpr u32 kMostGop = 600;
+constexpr u32 kLeastBitRate = 16000;
+constexpr u32 kMostBitRate = 50000000;
+
+/// The host's header promises this clock, for PAL too; timestamps count encoded pictures.
+constexpr AVRational kTimeBase{1001, 30000};
+
+struct Option {
+  const char *name;
+  std::int64_t value;
+};
+constexpr std::array<Option, 3> kOptions{{
+    {"mpeg_quant", 1},             // the host's header says so
+    {"motion_est", 0},             // no search: the scenes hardly move, sixteen encoders share the machine
+    {"sc_threshold", 1000000000},  // intra frames where the GOP says, at no cut
+}};
+
+AVCodecContext *open_encoder(const Mpeg4Settings &settings) {
+  const AVCodec *codec = avcodec_find_encoder(AV_CODEC_ID_MPEG4);
+  AVCodecContext *encoder = codec != nullptr ? avcodec_alloc_context3(codec) : nullptr;
+  if (encoder == nullptr) return nullptr;
+  encoder->width = static_cast<int>(settings.size.width);
+  encoder->height = static_cast<int>(settings.size.height);
+  encoder->pix_fmt = AV_PIX_FMT_YUV420P;
+  encoder->time_base = kTimeBase;
+  encoder->gop_size = static_cast<int>(settings.gop);
+  encoder->max_b_frames = 0;
+  encoder->thread_count = 1;
+  encoder->qmin = static_cast<int>(settings.least_quantiser);
+  encoder->qmax = static_cast<int>(settings.most_quantiser);
+  encoder->flags |= AV_CODEC_FLAG_GLOBAL_HEADER | AV_CODEC_FLAG_BITEXACT;
+  if (settings.size.interlaced) encoder->flags |= AV_CODEC_FLAG_INTERLACED_DCT;
+  // Without this every intra frame begins with a GOP header of its own.
+  encoder->workaround_bugs = FF_BUG_MS;
+  if (settings.bit_rate == 0) {
+    encoder->flags |= AV_CODEC_FLAG_QSCALE;
+    encoder->global_quality = static_cast<int>(settings.quantiser) * FF_QP2LAMBDA;
+  } else {
+    // The encoder reckons with 30000/1001 pictures a second.
+    const double bits = settings.bit_rate / (settings.rate * av_q2d(kTimeBase));
+    encoder->bit_rate = std::llround(bits);
+    encoder->rc_max_rate = encoder->bit_rate;
+    encoder->rc_buffer_size = static_cast<int>(bits);
+  }
+  for (const Option &option : kOptions) {
+    av_opt_set_int(encoder, option.name, option.value, AV_OPT_SEARCH_CHILDREN);
+  }
+  if (avcodec_open2(encoder, codec, nullptr) < 0) avcodec_free_context(&encoder);
+  return encoder;
+}
+
+}  // namespace
+
+Mpeg4Settings mpeg4_settings(const EncoderSettings &encoder, EncodedSize size, double rate) {
+  Mpeg4Settings settings;
+  settings.size = size;
+  settings.gop = std::clamp(encoder.gop, 1u, kMostGop);
+  if (encoder.qp_range.enable != 0) {
+    settings.least_quantiser = std::clamp(encoder.qp_range.min, kLeastQuantiser, kMostQuantiser);
+    settings.most_quantiser = std::clamp(encoder.qp_range.max, settings.least_quantiser, kMostQuantiser);
+  }
+  settings.quantiser = std::clamp(encoder.qp, settings.least_quantiser, settings.most_quantiser);
+  if (encoder.cbr.enable != 0) {
+    settings.bit_rate = std::clamp(encoder.cbr.value, kLeastBitRate, kMostBitRate);
+    settings.rate = rate;
+  }
+  return settings;
+}
+
+void Mpeg4Encoder::Closer::operator()(AVCodecContext *encoder) const {
+  avcodec_free_context(&encoder);
+}
+void Mpeg4Encoder::Closer::operator()(AVFrame *frame) const {
+  av_frame_free(&frame);
+}
+void Mpeg4Encoder::Closer::operator()(AVPacket *packet) const {
+  av_packet_free(&packet);
+}
+
+Mpeg4Encoder::Mpeg4Encoder(const Mpeg4Settings &settings)
+    : settings_(settings),
+      encoder_(open_encoder(settings)),
+      frame_(av_frame_alloc()),
+      packet_(av_packet_alloc()) {}
+
+Mpeg4Encoder::~Mpeg4Encoder() = default;
+
+Mpeg4Frame Mpeg4Encoder::encode(const EncodedPicture &picture) {
+  Mpeg4Frame result;
+  if (!encoder_ || !frame_ || !packet_) return result;
+  AVFrame &frame = *frame_;
+  frame.format = AV_PIX_FMT_YUV420P;
+  frame.width = encoder_->width;
+  frame.height = encoder_->height;
+  frame.pts = count_++;
+  frame.interlaced_frame = frame.top_field_first = settings_.size.interlaced ? 1 : 0;
+  frame.quality = encoder_->global_quality;
+  const std::array<const u8 *, 3> planes{picture.y.data(), picture.cb.data(), picture.cr.data()};
+  for (std::size_t i = 0; i < planes.size(); ++i) {
+    frame.data[i] = const_cast<u8 *>(planes[i]);  // read only: the encoder copies it
+    frame.linesize[i] = i == 0 ? frame.width : frame.width / 2;
+  }
+  if (avcodec_send_frame(encoder_.get(), &frame) < 0) return result;
+  if (avcodec_receive_packet(encoder_.get(), packet_.get()) < 0) return result;
+  result.intra = (packet_->flags & AV_PKT_FLAG_KEY) != 0;
+  result.bitstream.assign(packet_->data, packet_->data + packet_->size);
+  av_packet_unref(packet_.get());
+  return result;
+}
+
+}  // namespace virtual_card
