@@ -5,6 +5,7 @@
  */
 #include <signal.h>
 
+#include <algorithm>
 #include <array>
 #include <atomic>
 #include <cerrno>
@@ -28,7 +29,6 @@ struct Stream {
 };
 std::array<Stream, ZV_CHANNELS> video;
 std::array<Stream, ZV_AUDIO_CHANNELS> audio;
-std::atomic<bool> frame_seen{false};
 std::atomic<int> write_error{0};  // errno of a write that failed on an SDK thread
 
 // --- The SDK calls these, on threads of its own
@@ -46,7 +46,6 @@ void on_video(u32 channel, u8 *data, i32 length, i32 flags) {
   append(stream, data, length);
   if (flags & ZV_FLAG_MOTION) ++stream.motion;
   if (flags & ZV_FLAG_VIDEO_LOSS) ++stream.loss;
-  frame_seen = true;
 }
 
 void on_audio(u32 input, u8 *data, i32 length, i32) {
@@ -104,16 +103,9 @@ void configure(HANDLE card, const RecordOptions &options) {
   check(zv_StartMotionDetection(card), "zv_StartMotionDetection");
 }
 
-/// Returns when the time is over, a signal has come or a write has failed. The time counts from the
-/// first frame, so that five seconds are 150 frames. The result is the seconds recorded.
+/// Returns when the time is over, a signal has come or a write has failed; the seconds that have passed.
 double wait_for_end(unsigned seconds, const sigset_t &signals) {
   const timespec pause{.tv_sec = 0, .tv_nsec = 2'000'000};
-  const auto latest_first_frame = Clock::now() + std::chrono::seconds(10);
-  while (!frame_seen) {
-    if (Clock::now() > latest_first_frame)
-      throw std::runtime_error("no frame came from the card in 10 seconds");
-    if (sigtimedwait(&signals, nullptr, &pause) > 0) return 0;
-  }
   const auto start = Clock::now();
   const auto end = start + std::chrono::seconds(seconds);
   while (Clock::now() < end && !write_error && sigtimedwait(&signals, nullptr, &pause) <= 0) {
@@ -148,6 +140,10 @@ void record(const RecordOptions &options) {
   if (write_error) {
     throw std::runtime_error("cannot write to " + options.output.string() + ": " +
                              std::strerror(write_error));
+  }
+  if (seconds >= options.seconds &&
+      std::ranges::all_of(video, [](const Stream &s) { return s.blocks == 0; })) {
+    throw std::runtime_error("no frame came from the card");
   }
 }
 
