@@ -81,6 +81,24 @@ void Board::write_decoder(unsigned chip, unsigned address, u8 value) {
   for (unsigned n = 0; n < kChannels; ++n) settings.state.channel[n].picture = settings.decoders.picture(n);
 }
 
+void Board::stop_encoding() {
+  settings.state.encoding = false;
+  encoding = false;
+  for (Stream *stream : {&mpeg4, &mjpeg, &audio}) {
+    stream->queue.clear();
+    stream->queue.wake();
+  }
+}
+
+void Board::last_close() {
+  const std::lock_guard lock(mutex);
+  if (encoding) stop_encoding();
+  settings.state.display.on = false;
+  settings.batching = false;
+  preview.newest.reset();
+  preview.handed.reset();
+}
+
 void Board::clear_supply() {
   for (Stream *stream : {&mpeg4, &mjpeg, &audio}) stream->clear_supply();
   supplied = false;

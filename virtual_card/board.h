@@ -32,7 +32,8 @@ struct Settings {
   std::array<u16, kChannels> motion_level{};
   std::optional<u32> scripted_motion;
   u32 selected_buffer = 0;
-  nanoseconds encoding_since{0};
+  nanoseconds encoding_since{0};                       ///< card time of ENC_IOC_START
+  nanoseconds supplied_since{0};                       ///< card time at which a supply was set
   std::deque<std::pair<u32, long>> scripted_previews;  ///< index and result of the next preview reads
   Settings();
 };
@@ -40,6 +41,7 @@ struct Settings {
 /// The four preview pictures and which of them is where.
 struct PreviewBuffers {
   std::optional<u32> newest;  ///< holds the last picture composed
+  long size = 0;              ///< its bytes
   std::optional<u32> handed;  ///< last handed to the host, which may still be looking at it
   std::uint64_t composed = 0;
 
@@ -58,6 +60,10 @@ struct Board {
   void write_codec(u32 address, u32 value);
   void write_video_input(u32 address, u32 value);
   void write_decoder(unsigned chip, unsigned address, u8 value);
+  /// What ENC_IOC_STOP does. Needs `mutex`.
+  void stop_encoding();
+  /// What a driver does when its last node is closed: nothing is left running.
+  void last_close();
   /// Back to the card's own encoders.
   void clear_supply();
   /// How long a read may wait for its stream.

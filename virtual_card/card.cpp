@@ -110,7 +110,10 @@ long Card::power_on() {
 }
 
 void Card::power_down_if_unused() {
-  if (open_ == 0) runner_.stop();
+  if (open_ == 0) {
+    runner_.stop();
+    board_.last_close();
+  }
   if (open_ == 0 && mapped_ == 0)
     for (const auto &each : nodes_) each->region().release();
 }

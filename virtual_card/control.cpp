@@ -1,6 +1,7 @@
 // The control interface: a hand at the machine.
 
 #include <cstdio>
+#include <stdexcept>
 
 #include "card.h"
 #include "descriptors.h"
@@ -21,11 +22,15 @@ auto with_settings(Use use) {
 }
 
 void refused(const char *what) {
-  std::fprintf(stderr, "virtual card: %s while a device node is open: nothing done\n", what);
+  std::fprintf(stderr, "virtual card: %s refused: a device node is open or the value is wrong\n", what);
 }
 
-void set_bit(u32 &word, unsigned bit, bool on) {
-  word = on ? word | 1u << bit : word & ~(1u << bit);
+void set_sound(unsigned input, bool on) {
+  if (input >= kAudioInputs) throw std::out_of_range("audio input");
+  with_settings([&](Settings &settings) {
+    u32 &present = settings.state.sound_present;
+    present = on ? present | 1u << input : present & ~(1u << input);
+  });
 }
 
 }  // namespace
@@ -43,7 +48,7 @@ int open_mappings() {
 }
 
 void set_clock(ClockMode mode, double speed) {
-  if (!Card::instance().set_clock(mode, speed)) refused("set_clock()");
+  if (!(speed > 0) || !Card::instance().set_clock(mode, speed)) refused("set_clock()");
 }
 
 void advance(std::chrono::microseconds time) {
@@ -71,11 +76,11 @@ bool show_film(unsigned channel, const std::string &path, std::string *error) {
 }
 
 void silence_input(unsigned input) {
-  with_settings([&](Settings &settings) { set_bit(settings.state.sound_present, input, false); });
+  set_sound(input, false);
 }
 
 void sound_input(unsigned input) {
-  with_settings([&](Settings &settings) { set_bit(settings.state.sound_present, input, true); });
+  set_sound(input, true);
 }
 
 void queue_mpeg4(ReadyFrame frame) {
@@ -95,6 +100,7 @@ void queue_preview(std::uint32_t index, long result) {
 }
 
 void set_supply(Supply supply) {
+  with_settings([&](Settings &settings) { settings.supplied_since = board().clock.now(); });
   board().supplied = true;
   board().mpeg4.supply(std::move(supply.mpeg4), supply.video_rate, supply.limit);
   board().mjpeg.supply(std::move(supply.mjpeg), supply.video_rate, supply.limit);

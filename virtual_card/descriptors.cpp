@@ -9,7 +9,6 @@
 namespace virtual_card::descriptors {
 namespace {
 
-constexpr std::size_t kTableSize = 65536;
 constexpr std::uint8_t kForeign = 0;
 constexpr std::uint8_t kOrphan = 0xFF;
 

@@ -13,6 +13,9 @@
 
 namespace virtual_card::descriptors {
 
+/// Descriptors with higher numbers cannot be the card's.
+inline constexpr std::size_t kTableSize = 65536;
+
 /// What a descriptor number stands for.
 struct Owner {
   bool ours = false;

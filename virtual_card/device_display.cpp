@@ -44,15 +44,14 @@ long DisplayDevice::read(std::uintptr_t buffer, std::size_t count) {
   u32 index = 0;
   if (count < sizeof index) return -EINVAL;
   const std::lock_guard lock(board_.mutex);
-  const CardState &state = board_.settings.state;
   long result = 0;
   auto &scripted = board_.settings.scripted_previews;
   if (!scripted.empty()) {
     std::tie(index, result) = scripted.front();
   } else {
-    if (!state.display.on || !board_.preview.newest) return 0;
+    if (!board_.preview.newest) return 0;
     index = *board_.preview.newest;
-    result = static_cast<long>(state.width * state.lines() * 2);
+    result = board_.preview.size;
   }
   if (const long error = copy_to_user(buffer, &index, sizeof index)) return error;
   if (scripted.empty())

@@ -137,12 +137,7 @@ long EncoderDevice::start() {
 }
 
 long EncoderDevice::stop() {
-  board_.settings.state.encoding = false;
-  board_.encoding = false;
-  for (Stream *stream : {&board_.mpeg4, &board_.mjpeg, &board_.audio}) {
-    stream->queue.clear();
-    stream->queue.wake();
-  }
+  board_.stop_encoding();
   return 0;
 }
 

@@ -65,6 +65,12 @@ EXPORTED int __openat64_2(int directory, const char *path, int flags) {
 EXPORTED int close(int fd) {
   return guest::close(fd);
 }
+EXPORTED int close_range(unsigned first, unsigned last, int flags) noexcept {
+  return guest::close_range(first, last, flags);
+}
+EXPORTED void closefrom(int first) noexcept {
+  guest::closefrom(first);
+}
 EXPORTED int ioctl(int fd, unsigned long code, ...) noexcept {
   return guest::ioctl(fd, code, OPTIONAL(code, void *));
 }

@@ -1,9 +1,11 @@
 #include "guest_calls.h"
 
 #include <fcntl.h>
+#include <linux/close_range.h>
 #include <pthread.h>
 #include <sys/mman.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <exception>
@@ -59,6 +61,12 @@ int open_node(const char *path, int flags) {
   }));
 }
 
+/// A call on a descriptor of a node. One that came through a fork reaches no card.
+template <typename Call>
+long answer_for(const Owner &node, Call call) {
+  return answer([&]() -> long { return node.device == Device::none ? -ENODEV : call(Card::instance()); });
+}
+
 /// The number leaves the table before it leaves the process: from then on it may be someone else's.
 long close_node(int fd) {
   const Owner was = descriptors::remove(fd);
@@ -85,6 +93,12 @@ void replaced(const Owner &target, int fd, int result) {
   if (result < 0 || !target.ours) return;
   descriptors::remove(fd);
   if (target.device != Device::none) Card::instance().closed();
+}
+
+/// Closes the nodes' descriptors of a range that is about to be closed at one stroke.
+void close_nodes(unsigned first, unsigned last) {
+  for (unsigned fd = first; fd <= last && fd < descriptors::kTableSize; ++fd)
+    if (owner(static_cast<int>(fd)).ours) guest::close(static_cast<int>(fd));
 }
 
 struct AtLoad {
@@ -122,20 +136,30 @@ int close(int fd) {
   return static_cast<int>(answer([&] { return close_node(fd); }));
 }
 
+int close_range(unsigned first, unsigned last, int flags) {
+  if ((flags & CLOSE_RANGE_CLOEXEC) == 0) close_nodes(first, last);
+  return real::close_range(first, last, flags);
+}
+
+void closefrom(int first) {
+  close_nodes(static_cast<unsigned>(std::max(first, 0)), descriptors::kTableSize);
+  real::closefrom(first);
+}
+
 int ioctl(int fd, unsigned long code, void *argument) {
   const Owner node = owner(fd);
   if (!node.ours) return real::ioctl(fd, code, argument);
-  return static_cast<int>(answer([&] {
-    return Card::instance().ioctl(node.device, static_cast<u32>(code),
-                                  reinterpret_cast<std::uintptr_t>(argument));
+  return static_cast<int>(answer_for(node, [&](Card &card) {
+    return card.ioctl(node.device, static_cast<u32>(code), reinterpret_cast<std::uintptr_t>(argument));
   }));
 }
 
 ssize_t read(int fd, void *buffer, std::size_t count) {
   const Owner node = owner(fd);
   if (!node.ours) return real::read(fd, buffer, count);
-  return answer(
-      [&] { return Card::instance().read(node.device, reinterpret_cast<std::uintptr_t>(buffer), count); });
+  return answer_for(node, [&](Card &card) {
+    return card.read(node.device, reinterpret_cast<std::uintptr_t>(buffer), count);
+  });
 }
 
 ssize_t read_chk(int fd, void *buffer, std::size_t count, std::size_t buffer_size) {
@@ -147,9 +171,9 @@ void *mmap(real::Name spelling, void *address, std::size_t length, int protectio
   const Owner node = (flags & MAP_ANONYMOUS) != 0 ? Owner{} : owner(fd);
   if (!node.ours) return real::mmap(spelling, address, length, protection, flags, fd, offset);
   void *mapped = MAP_FAILED;
-  answer([&]() -> long {
+  answer_for(node, [&](Card &card) {
     const MapRequest request{address, length, protection, flags, offset};
-    const long result = Card::instance().mmap(node.device, fd, request, mapped);
+    const long result = card.mmap(node.device, fd, request, mapped);
     if (result == 0) descriptors::add_mapping(mapped, length, node.device);
     return result;
   });

@@ -13,6 +13,8 @@ namespace virtual_card::guest {
 int open(real::Name spelling, const char *path, int flags, mode_t mode);
 int openat(real::Name spelling, int directory, const char *path, int flags, mode_t mode);
 int close(int fd);
+int close_range(unsigned first, unsigned last, int flags);
+void closefrom(int first);
 int ioctl(int fd, unsigned long code, void *argument);
 ssize_t read(int fd, void *buffer, std::size_t count);
 ssize_t read_chk(int fd, void *buffer, std::size_t count, std::size_t buffer_size);

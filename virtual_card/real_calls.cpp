@@ -12,9 +12,9 @@ namespace {
 constexpr std::size_t kNames = static_cast<std::size_t>(Name::count);
 
 constexpr std::array<const char *, kNames> kSymbols = {
-    "open",         "open64", "openat", "openat64", "__open_2",   "__open64_2", "__openat_2",
-    "__openat64_2", "close",  "ioctl",  "read",     "__read_chk", "mmap",       "mmap64",
-    "munmap",       "dup",    "dup2",   "dup3",     "fcntl",      "fcntl64"};
+    "open",   "open64",      "openat",    "openat64", "__open_2", "__open64_2", "__openat_2", "__openat64_2",
+    "close",  "close_range", "closefrom", "ioctl",    "read",     "__read_chk", "mmap",       "mmap64",
+    "munmap", "dup",         "dup2",      "dup3",     "fcntl",    "fcntl64"};
 
 constinit std::array<std::atomic<void *>, kNames> addresses{};  // of the next definition of each name
 
@@ -36,7 +36,7 @@ auto call(Name name, Arguments... arguments) -> decltype(next<Function>(name)(ar
   Function *function = next<Function>(name);
   if (function == nullptr) {
     errno = ENOSYS;
-    return decltype(function(arguments...))(-1);
+    return decltype(function(arguments...))(-1);  // also MAP_FAILED
   }
   return function(arguments...);
 }
@@ -57,6 +57,14 @@ int openat(Name spelling, int directory, const char *path, int flags, mode_t mod
 
 int close(int fd) {
   return call<int(int)>(Name::close, fd);
+}
+
+int close_range(unsigned first, unsigned last, int flags) {
+  return call<int(unsigned, unsigned, int)>(Name::close_range, first, last, flags);
+}
+
+void closefrom(int first) {
+  if (auto *function = next<void(int)>(Name::closefrom)) function(first);
 }
 
 int ioctl(int fd, unsigned long code, void *argument) {

@@ -27,6 +27,8 @@ enum class Name : std::uint8_t {
   openat_2,
   openat64_2,
   close,
+  close_range,
+  closefrom,
   ioctl,
   read,
   read_chk,
@@ -44,6 +46,8 @@ enum class Name : std::uint8_t {
 int open(Name spelling, const char *path, int flags, mode_t mode);
 int openat(Name spelling, int directory, const char *path, int flags, mode_t mode);
 int close(int fd);
+int close_range(unsigned first, unsigned last, int flags);
+void closefrom(int first);
 int ioctl(int fd, unsigned long code, void *argument);
 ssize_t read(int fd, void *buffer, std::size_t count);
 ssize_t read_chk(int fd, void *buffer, std::size_t count, std::size_t buffer_size);

@@ -64,8 +64,10 @@ void Runner::loop() {
       const std::lock_guard lock(run_mutex_);
       const nanoseconds now = board_.clock.now();
       const Next first = next();
-      if (now - first.due > board_.clock.second()) skip_to(now);
-      if (first.due <= now) run(first);
+      if (now - first.due > board_.clock.second())
+        skip_to(now);
+      else if (first.due <= now)
+        run(first);
       wake = board_.clock.when(next().due);
     }
     stop_lock.lock();
@@ -118,7 +120,7 @@ nanoseconds Runner::pace_due(Pace &pace, const CardState &state) {
   if (!state.encoding || rate <= 0) return kNever;
   const nanoseconds since = [&] {
     const std::lock_guard lock(board_.mutex);
-    return board_.settings.encoding_since;
+    return std::max(board_.settings.encoding_since, board_.settings.supplied_since);
   }();
   if (since != pace.since) pace.count = 0;
   pace.since = since;
@@ -166,14 +168,15 @@ void Runner::compose(const CardState &state) {
     return board_.preview.next();
   }();
   bool composed = false;
+  const std::size_t size = std::size_t{state.width} * state.lines() * 2;
   board_.preview_region.with_bytes([&](std::span<u8> bytes) {
-    const std::size_t size = std::size_t{state.width} * state.lines() * 2;
     board_.engine.compose(state, bytes.subspan(buffer * driver::kPreviewBufferSize, size));
     composed = true;
   });
   const std::lock_guard lock(board_.mutex);
   if (!composed || !board_.settings.state.display.on) return;
   board_.preview.newest = buffer;
+  board_.preview.size = static_cast<long>(size);
   ++board_.preview.composed;
 }
 
@@ -197,6 +200,13 @@ void Runner::skip_to(nanoseconds now) {
   }
   field_ = std::max(field_, field);
   audio_block_ = std::max(audio_block_, block);
+  for (Pace *pace : {&video_pace_, &audio_pace_}) {
+    while (pace_due(*pace, state) < now) {
+      ++pace->count;
+      for (Stream *stream : pace->streams)
+        if (stream != nullptr && stream->pace() > 0) stream->queue.missed(1);
+    }
+  }
 }
 
 }  // namespace virtual_card
