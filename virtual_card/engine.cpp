@@ -130,13 +130,17 @@ void Engine::compose(const CardState &state, std::span<u8> uyvy) {
     if (view.both_fields) both_fields |= 1u << view.channel;
   }
 
-  const FieldMoment moment(state.standard, parts.last.number, parts.last.wall_time);
-  const FieldMoment before = moment.field_before();
-  const FieldMoment &top = moment.parity() == 0 ? moment : before;
-  const FieldMoment &bottom = moment.parity() == 0 ? before : moment;
+  // The newest top field, and for large windows the newest whole frame.
+  const FieldMoment last(state.standard, parts.last.number, parts.last.wall_time);
+  const FieldMoment before = last.field_before();
+  const bool whole = last.parity() != 0;
+  const FieldMoment &top = whole ? before : last;
+  const FieldMoment &bottom = whole ? last : before;
   parts.pool.run(kChannels, [&](std::size_t i) {
-    if (((shown >> i) & 1) != 0) parts.channels[i]->draw(state, top);
-    if (((both_fields >> i) & 1) != 0) parts.channels[i]->draw(state, bottom);
+    if (((shown >> i) & 1) == 0) return;
+    if (((both_fields >> i) & 1) == 0) return parts.channels[i]->draw(state, top);
+    parts.channels[i]->draw(state, bottom.field_before());
+    parts.channels[i]->draw(state, bottom);
   });
 
   std::array<ViewSource, kChannels> sources;

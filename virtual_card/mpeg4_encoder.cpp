@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <cmath>
 
 extern "C" {
@@ -28,7 +29,7 @@ struct Option {
 };
 constexpr std::array<Option, 3> kOptions{{
     {"mpeg_quant", 1},             // the host's header says so
-    {"motion_est", 0},             // no search: the scenes hardly move, sixteen encoders share the machine
+    {"motion_est", 1},             // no search: the scenes hardly move, sixteen encoders share the machine
     {"sc_threshold", 1000000000},  // intra frames where the GOP says, at no cut
 }};
 
@@ -47,8 +48,6 @@ AVCodecContext *open_encoder(const Mpeg4Settings &settings) {
   encoder->qmax = static_cast<int>(settings.most_quantiser);
   encoder->flags |= AV_CODEC_FLAG_GLOBAL_HEADER | AV_CODEC_FLAG_BITEXACT;
   if (settings.size.interlaced) encoder->flags |= AV_CODEC_FLAG_INTERLACED_DCT;
-  // Without this every intra frame begins with a GOP header of its own.
-  encoder->workaround_bugs = FF_BUG_MS;
   if (settings.bit_rate == 0) {
     encoder->flags |= AV_CODEC_FLAG_QSCALE;
     encoder->global_quality = static_cast<int>(settings.quantiser) * FF_QP2LAMBDA;
@@ -56,14 +55,38 @@ AVCodecContext *open_encoder(const Mpeg4Settings &settings) {
     // The encoder reckons with 30000/1001 pictures a second.
     const double bits = settings.bit_rate / (settings.rate * av_q2d(kTimeBase));
     encoder->bit_rate = std::llround(bits);
-    encoder->rc_max_rate = encoder->bit_rate;
-    encoder->rc_buffer_size = static_cast<int>(bits);
+    encoder->bit_rate_tolerance = static_cast<int>(bits);
   }
   for (const Option &option : kOptions) {
     av_opt_set_int(encoder, option.name, option.value, AV_OPT_SEARCH_CHILDREN);
   }
   if (avcodec_open2(encoder, codec, nullptr) < 0) avcodec_free_context(&encoder);
   return encoder;
+}
+
+std::int64_t whole_seconds(std::int64_t picture) {
+  return picture * kTimeBase.num / kTimeBase.den;
+}
+
+constexpr std::array<u8, 4> kPictureStart{0, 0, 1, 0xB6};
+/// The bit behind start code and type of a picture, where a set bit stands for each second begun.
+constexpr std::size_t kSecondsBit = 34;
+
+/// Says in the header of a picture that a second has begun. The bits behind it move on by one, and
+/// so does the stuffing at the end: a zero and ones to the next whole byte.
+void begin_second(std::vector<u8> &bits) {
+  const std::size_t stuffing = static_cast<std::size_t>(std::countr_one(bits.back())) + 1;
+  const std::size_t used = bits.size() * 8 - stuffing;
+  bits.push_back(0);
+  for (std::size_t i = bits.size() - 1; i > kSecondsBit / 8; --i) {
+    bits[i] = static_cast<u8>(bits[i - 1] << 7 | bits[i] >> 1);
+  }
+  constexpr u8 behind = 0xFF >> kSecondsBit % 8;
+  u8 &byte = bits[kSecondsBit / 8];
+  byte = static_cast<u8>((byte & ~behind) | (byte & behind) >> 1 | (behind + 1) >> 1);
+  bits.resize((used + 1) / 8 + 1);
+  const unsigned last = (used + 1) % 8;  // bits of the last byte that belong to the picture
+  bits.back() = static_cast<u8>((bits.back() & ~(0xFF >> last)) | 0x7F >> last);
 }
 
 }  // namespace
@@ -109,7 +132,7 @@ Mpeg4Frame Mpeg4Encoder::encode(const EncodedPicture &picture) {
   frame.format = AV_PIX_FMT_YUV420P;
   frame.width = encoder_->width;
   frame.height = encoder_->height;
-  frame.pts = count_++;
+  frame.pts = count_;
   frame.interlaced_frame = frame.top_field_first = settings_.size.interlaced ? 1 : 0;
   frame.quality = encoder_->global_quality;
   const std::array<const u8 *, 3> planes{picture.y.data(), picture.cb.data(), picture.cr.data()};
@@ -120,8 +143,14 @@ Mpeg4Frame Mpeg4Encoder::encode(const EncodedPicture &picture) {
   if (avcodec_send_frame(encoder_.get(), &frame) < 0) return result;
   if (avcodec_receive_packet(encoder_.get(), packet_.get()) < 0) return result;
   result.intra = (packet_->flags & AV_PKT_FLAG_KEY) != 0;
-  result.bitstream.assign(packet_->data, packet_->data + packet_->size);
+  const u8 *const end = packet_->data + packet_->size;
+  const u8 *const begin = packet_->data;
+  result.bitstream.assign(std::search(begin, end, kPictureStart.begin(), kPictureStart.end()), end);
   av_packet_unref(packet_.get());
+  // The encoder puts the time of an intra frame into a header in front of it, which has just gone.
+  const bool second_begun = count_ > 0 && whole_seconds(count_) != whole_seconds(count_ - 1);
+  if (result.intra && second_begun && !result.bitstream.empty()) begin_second(result.bitstream);
+  ++count_;
   return result;
 }
 
