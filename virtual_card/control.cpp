@@ -111,6 +111,10 @@ void clear_supply() {
   board().clear_supply();
 }
 
+void answer_reads_at_once(bool on) {
+  board().nowait = on;
+}
+
 std::uint32_t codec_register(std::uint32_t address) {
   return with_settings([&](Settings &settings) { return settings.codec.read(address); });
 }

@@ -102,6 +102,9 @@ void set_supply(Supply supply);
 /// Back to the card's own encoders.
 void clear_supply();
 
+/// Reads of an empty stream return at once, as another driver's might, instead of waiting up to 10 ms.
+void answer_reads_at_once(bool on);
+
 // --- Registers and replies ---------------------------------------------------------------------
 
 std::uint32_t codec_register(std::uint32_t address);
