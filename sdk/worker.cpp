@@ -19,7 +19,7 @@ bool Worker::start(Routine routine, void *argument) {
 
 bool Worker::join(void *&result) {
   if (!joinable_) return true;
-  if (pthread_join(id_, &result) != 0) return false;
+  if (pthread_equal(id_, pthread_self()) != 0 || pthread_join(id_, &result) != 0) return false;
   joinable_ = false;
   return true;
 }

@@ -1,0 +1,208 @@
+#include "sdk_test.h"
+
+#include <malloc.h>
+#include <pthread.h>
+#include <time.h>
+
+#include <cerrno>
+#include <condition_variable>
+#include <filesystem>
+#include <mutex>
+#include <thread>
+
+namespace vc = virtual_card;
+
+namespace {
+
+constexpr std::uint32_t kSetMotionMap = 0x40187602;
+
+/// Of a motion map, whose pointer is of no interest: its five words, the number of thresholds, and
+/// their value if it is the same for all.
+Words words_of(const vc::Command &command) {
+  const Bytes &bytes = command.argument;
+  const bool map = command.code == kSetMotionMap;
+  if (!map && bytes.size() % 4 != 0) return Words(bytes.begin(), bytes.end());
+  Words words;
+  for (std::size_t i = 0; i < (map ? 20 : bytes.size()); i += 4)
+    words.push_back(bytes[i] | bytes[i + 1] << 8 | bytes[i + 2] << 16 | std::uint32_t{bytes[i + 3]} << 24);
+  if (!map) return words;
+  const std::size_t record = sizeof(void *) == 8 ? 32 : 24;
+  bool same = true;
+  for (std::size_t i = record + 2; i < bytes.size(); ++i) same = same && bytes[i] == bytes[i - 2];
+  words.push_back(static_cast<std::uint32_t>((bytes.size() - record) / 2));
+  words.push_back(same ? bytes[record] | std::uint32_t{bytes[record + 1]} << 8 : ~0u);
+  return words;
+}
+
+std::string describe(const vc::Command &command) {
+  static const char *const kDevices[] = {"encoder", "display", "audio", "vin", "none"};
+  static const char *const kOperations[] = {"open", "close", "ioctl", "read", "mmap", "munmap"};
+  if (command.operation == vc::Operation::ioctl) return cmd(command.code, words_of(command));
+  return std::string(kOperations[static_cast<int>(command.operation)]) + " " +
+         kDevices[static_cast<int>(command.device)];
+}
+
+std::mutex delivery_mutex;
+std::condition_variable delivered;
+std::vector<Delivery> delivery_list;
+
+void keep(char stream, const u8 *area, u32 channel, const u8 *data, i32 length, i32 flags) {
+  const Delivery delivery{stream, channel, data - area, Bytes(data, data + length), flags};
+  if (on_delivery) on_delivery(delivery);
+  const std::lock_guard lock(delivery_mutex);
+  delivery_list.push_back(delivery);
+  delivered.notify_all();
+}
+
+bool strikes(int &countdown) {
+  if (countdown == 0 || --countdown > 0) return false;
+  return faults.struck = true;
+}
+
+}  // namespace
+
+std::string cmd(std::uint32_t code, const Words &words) {
+  char text[32];
+  std::snprintf(text, sizeof text, "%08x", code);
+  std::string line = text;
+  for (std::uint32_t word : words) line += " " + std::to_string(word);
+  return line;
+}
+
+Lines issued() {
+  Lines lines;
+  for (const vc::Command &command : vc::log())
+    if (command.operation == vc::Operation::ioctl && command.code != 0x650F && command.code != 0x6509)
+      lines.push_back(describe(command));
+  vc::record_log(true);
+  return lines;
+}
+
+Lines operations() {
+  Lines lines;
+  for (const vc::Command &command : vc::log()) lines.push_back(describe(command));
+  return lines;
+}
+
+std::size_t count(const Lines &lines, const std::string &line) {
+  return static_cast<std::size_t>(std::count(lines.begin(), lines.end(), line));
+}
+
+bool eventually(const std::function<bool()> &condition) {
+  const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(30);
+  while (!condition()) {
+    if (std::chrono::steady_clock::now() > end) return false;
+    std::this_thread::sleep_for(std::chrono::milliseconds(1));
+  }
+  return true;
+}
+
+std::size_t process_descriptors() {
+  const std::filesystem::directory_iterator list("/proc/self/fd");
+  return static_cast<std::size_t>(std::distance(begin(list), end(list)));
+}
+
+std::string printed(const std::function<void()> &action) {
+  testing::internal::CaptureStdout();
+  action();
+  return testing::internal::GetCapturedStdout();
+}
+
+Faults faults;
+
+void Faults::reset() {
+  malloc_countdown = thread_countdown = live_allocations = 0;
+  struck = false;
+}
+
+extern "C" {
+void *__real_malloc(std::size_t size);
+void *__real_memalign(std::size_t alignment, std::size_t size);
+void __real_free(void *memory);
+int __real_pthread_create(pthread_t *, const pthread_attr_t *, void *(*)(void *), void *);
+int __real_clock_gettime(clockid_t clock, timespec *now);
+
+void *__wrap_malloc(std::size_t size) {
+  if (strikes(faults.malloc_countdown)) return nullptr;
+  ++faults.live_allocations;
+  return __real_malloc(size);
+}
+void *__wrap_memalign(std::size_t alignment, std::size_t size) {
+  if (strikes(faults.malloc_countdown)) return nullptr;
+  ++faults.live_allocations;
+  return __real_memalign(alignment, size);
+}
+void __wrap_free(void *memory) {
+  if (memory != nullptr) --faults.live_allocations;
+  __real_free(memory);
+}
+int __wrap_pthread_create(pthread_t *thread, const pthread_attr_t *attributes, void *(*routine)(void *),
+                          void *argument) {
+  return strikes(faults.thread_countdown) ? EAGAIN
+                                          : __real_pthread_create(thread, attributes, routine, argument);
+}
+int __wrap_clock_gettime(clockid_t clock, timespec *now) {
+  const int result = __real_clock_gettime(clock, now);
+  now->tv_sec += faults.clock_ahead_ms / 1000;
+  return result;
+}
+}
+
+std::function<void(const Delivery &)> on_delivery;
+
+std::vector<Delivery> deliveries() {
+  const std::lock_guard lock(delivery_mutex);
+  return delivery_list;
+}
+
+bool wait_for_deliveries(std::size_t number) {
+  std::unique_lock lock(delivery_mutex);
+  return delivered.wait_for(lock, std::chrono::seconds(30), [&] { return delivery_list.size() >= number; });
+}
+
+void mpeg4_callback(u32 channel, u8 *data, i32 length, i32 flags) {
+  keep('m', zarvo::mpeg4_buf, channel, data, length, flags);
+}
+void mjpeg_callback(u32 channel, u8 *data, i32 length, i32 flags) {
+  keep('j', zarvo::mjpeg_buf, channel, data, length, flags);
+}
+void audio_callback(u32 channel, u8 *data, i32 length, i32 flags) {
+  keep('a', zarvo::audio_buf, channel, data, length, flags);
+}
+
+void CardTest::SetUp() {
+  vc::reset();
+  vc::set_clock(vc::ClockMode::manual);
+  faults.reset();
+  on_delivery = nullptr;
+  delivery_list.clear();
+  descriptors_before = process_descriptors();
+  ASSERT_EQ(zv_Open(&handle), ZV_OK);
+  ASSERT_EQ(zv_RegisterCallBack(handle, mpeg4_callback, mjpeg_callback, audio_callback), ZV_OK);
+  vc::record_log(true);
+}
+
+void CardTest::TearDown() {
+  vc::clear_fault();
+  EXPECT_EQ(zv_Stop(handle), ZV_OK);
+  if (zarvo::card_of(handle) != nullptr) {
+    EXPECT_EQ(zv_DisableWatchDog(handle), ZV_OK);
+  }
+  EXPECT_EQ(zv_Close(handle), ZV_OK);
+  EXPECT_EQ(vc::open_descriptors(), 0);
+  EXPECT_EQ(vc::open_mappings(), 0);
+  EXPECT_EQ(process_descriptors(), descriptors_before);
+}
+
+void CardTest::enable(u32 mask, ZV_SCALE_VALUE scale) {
+  ZV_VIDEO_CONFIG config{};
+  config.scale = scale;
+  config.gop = 30;
+  config.qp = 4;
+  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel)
+    if ((mask >> channel & 1) != 0) {
+      EXPECT_EQ(zv_SetVideoEncodeConfig(handle, channel, &config), ZV_OK);
+    }
+  EXPECT_EQ(zv_EnableVideoRecordChannels(handle, mask), ZV_OK);
+  vc::record_log(true);
+}

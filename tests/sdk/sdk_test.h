@@ -1,0 +1,79 @@
+/**
+ * @file sdk_test.h
+ * The world of the SDK's tests: a card as built, with a clock that stands still, and the SDK open on
+ * it; what was sent to the card as readable lines; what came out of the callbacks.
+ */
+#ifndef SDK_TEST_H
+#define SDK_TEST_H
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <functional>
+#include <string>
+#include <vector>
+
+#include "virtual_card.h"
+#include "zv_card.h"
+#include "zv_lib.h"
+
+using Words = std::vector<std::uint32_t>;
+using Lines = std::vector<std::string>;
+using Bytes = std::vector<std::uint8_t>;
+
+/// A command as issued() tells it: the code as it must be on the wire, and the record's
+/// little-endian words, or its bytes when it is not made of words.
+std::string cmd(std::uint32_t code, const Words &words = {});
+/// The commands since the last call, without those the data threads repeat all the time.
+Lines issued();
+/// Everything done to the device nodes since the log was started.
+Lines operations();
+std::size_t count(const Lines &lines, const std::string &line);
+
+/// Waits for a condition, half a minute at most.
+bool eventually(const std::function<bool()> &condition);
+std::size_t process_descriptors();
+/// What `action` prints.
+std::string printed(const std::function<void()> &action);
+
+// Faults between the SDK and libc. A fault strikes the `countdown`-th call from now, once.
+struct Faults {
+  int malloc_countdown = 0;
+  int thread_countdown = 0;
+  bool struck = false;
+  int live_allocations = 0;  ///< since reset()
+  std::atomic<std::int64_t> clock_ahead_ms{0};
+  void reset();
+};
+extern Faults faults;
+
+/// A frame or block that a callback got.
+struct Delivery {
+  char stream;  ///< 'm' MPEG-4, 'j' Motion JPEG, 'a' audio
+  u32 channel;
+  std::ptrdiff_t offset;  ///< in the stream's area
+  Bytes data;
+  i32 flags;
+};
+/// The callbacks, and what they got. `on_delivery` runs inside the callback.
+std::vector<Delivery> deliveries();
+bool wait_for_deliveries(std::size_t number);
+extern std::function<void(const Delivery &)> on_delivery;
+void mpeg4_callback(u32 channel, u8 *data, i32 length, i32 flags);
+void mjpeg_callback(u32 channel, u8 *data, i32 length, i32 flags);
+void audio_callback(u32 channel, u8 *data, i32 length, i32 flags);
+
+class CardTest : public testing::Test {
+ protected:
+  void SetUp() override;
+  void TearDown() override;
+  /// Stores settings for the channels of `mask`, enables them, and forgets the log.
+  void enable(u32 mask, ZV_SCALE_VALUE scale = SCALE_ZV_CIF);
+  zarvo::ZV_CARD &card() { return *zarvo::card_of(handle); }
+
+  HANDLE handle = nullptr;
+  std::size_t descriptors_before = 0;
+};
+
+#endif

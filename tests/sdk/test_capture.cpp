@@ -1,0 +1,230 @@
+#include <future>
+
+#include "sdk_test.h"
+
+namespace vc = virtual_card;
+using testing::ElementsAreArray;
+using namespace std::chrono_literals;
+
+namespace {
+
+class Capture : public CardTest {
+ protected:
+  /// Frames without end, as fast as they are read.
+  static void supply_endlessly() {
+    vc::Supply supply;
+    supply.mpeg4 = {vc::mpeg4_frame(2, 1, Bytes(500, 0x55))};
+    supply.mjpeg = {vc::mjpeg_frame(2, 352, 240, {1, 2, 0xFF, 0xD9})};
+    supply.audio = {{Bytes(192, 7), 4}};
+    vc::set_supply(supply);
+  }
+};
+
+Bytes at(const Bytes &data, std::size_t from) {
+  return Bytes(data.begin() + static_cast<long>(from), data.end());
+}
+
+TEST_F(Capture, FramesArriveWithHeaderFlagsAndPlace) {
+  enable(0xFFFF & ~(1u << 9));
+  const Bytes stream(1000, 0xAB);
+  Bytes scan(5000, 0x11);
+  scan[4996] = 0xFF;
+  scan[4997] = 0xD9;  // and two bytes of padding
+  scan[1234] = 0xD9;  // inside the data, to be left alone
+  vc::queue_mpeg4(vc::mpeg4_frame(3, 0, stream, 1s));
+  vc::queue_mpeg4(vc::mpeg4_frame(9, 0, stream, 1s));  // channel 9 has no scale: no header can be made
+  vc::queue_mpeg4(vc::mpeg4_frame(9, 1, stream, 1s));
+  vc::queue_mpeg4(vc::mpeg4_frame(3, 2, stream, 1s));
+  vc::queue_mjpeg(vc::mjpeg_frame(4, 352, 240, scan));
+  vc::script_motion(1u << 3);
+  vc::set_decoder_register(0, 0x5A, 0xF7);
+  ASSERT_EQ(zv_Start(handle), ZV_OK);
+  ASSERT_TRUE(wait_for_deliveries(4));
+  ASSERT_EQ(zv_Stop(handle), ZV_OK);
+  for (const Delivery &got : deliveries()) {
+    if (got.stream == 'j') {
+      EXPECT_EQ(got.channel, 4u);
+      EXPECT_EQ(got.offset, 447);
+      ASSERT_EQ(got.data.size(), 5591u);
+      EXPECT_EQ(got.data[0] << 8 | got.data[1], 0xFFD8);
+      EXPECT_EQ(Bytes(got.data.begin() + 565, got.data.begin() + 569), (Bytes{0, 240, 352 >> 8, 352 & 0xFF}));
+      EXPECT_EQ(at(got.data, 593), Bytes(scan.begin(), scan.end() - 2));
+      EXPECT_EQ(got.flags, 0);
+      continue;
+    }
+    const bool intra = got.offset == 44;
+    EXPECT_EQ(got.offset, intra ? 44 : 64);
+    EXPECT_EQ(got.data.size(), intra ? 1020u : 1000u);
+    EXPECT_EQ(at(got.data, intra ? 20 : 0), stream);
+    EXPECT_EQ(got.flags, got.channel == 3 ? 0x10001 : 0);
+    if (intra) {
+      EXPECT_EQ(got.channel, 3u);
+    }
+  }
+  ZV_VIDEO_CONFIG config;
+  EXPECT_EQ(zv_GetVideoEncodeConfig(handle, 3, &config), ZV_OK);
+  EXPECT_EQ(config.scale, SCALE_ZV_NO_ENCODE);
+}
+
+/// A card polled at every frame, or flags that are never refreshed.
+TEST_F(Capture, StatusIsPolledEachTenthOfASecondOfCaptureTime) {
+  enable(1);
+  for (const auto time : {5000000us, 5050000us, 5099999us, 5100000us})
+    vc::queue_mpeg4(vc::mpeg4_frame(0, 1, Bytes(10, 1), time));
+  vc::script_motion(1);
+  on_delivery = [](const Delivery &) { vc::script_motion(0); };
+  ASSERT_EQ(zv_Start(handle), ZV_OK);
+  ASSERT_TRUE(wait_for_deliveries(4));
+  std::vector<i32> flags;
+  for (const Delivery &got : deliveries()) flags.push_back(got.flags);
+  EXPECT_THAT(flags, ElementsAreArray({0x10000, 0x10000, 0x10000, 0}));
+  EXPECT_EQ(count(issued(), cmd(0x80046412, {0})), 1u);  // the second asks with the bits it had
+}
+
+TEST_F(Capture, StartAndStopSendTheirCommands) {
+  enable(1u << 2);
+  vc::set_codec_register(0x310, 0x5);
+  ASSERT_EQ(zv_Start(handle), ZV_OK);
+  ASSERT_EQ(zv_Start(handle), ZV_OK);
+  ASSERT_TRUE(eventually([] { return count(operations(), cmd(0x6512)) > 0; }));
+  ASSERT_EQ(zv_Stop(handle), ZV_OK);
+  ASSERT_EQ(zv_Stop(handle), ZV_OK);
+  const auto log = vc::log();
+  const Lines lines = issued();
+  EXPECT_EQ(lines[0], cmd(0xC008640E, {0x310, 0}));
+  EXPECT_EQ(lines[1], cmd(0xC008640F, {0x310, 0x80000005}));
+  EXPECT_EQ(lines[2], cmd(0x6512));
+  ASSERT_EQ(lines.size(), 3 + 16 * 5 + 1u);
+  EXPECT_EQ(lines[3 + 2 * 5], cmd(0x40086500, {2, 0}));
+  EXPECT_EQ(lines.back(), cmd(0x6510));
+  // Every pass: request, read, done, read; and no audio read without an enabled input.
+  std::size_t requests = 0, dones = 0, audio = 0;
+  for (const vc::Command &command : log) {
+    requests += command.code == 0x650F;
+    dones += command.code == 0x6509;
+    audio += command.device == vc::Device::audio;
+    if (command.code == 0x6510) {
+      EXPECT_EQ(command.value, 0u);
+    }
+    if (command.operation == vc::Operation::read) {
+      EXPECT_EQ(command.value, 0u);
+    }
+  }
+  EXPECT_EQ(requests, dones);
+  EXPECT_EQ(audio, 0u);
+}
+
+TEST_F(Capture, StartRefusesAndRecovers) {
+  ZV_VIDEO_CONFIG config{};
+  config.scale = SCALE_ZV_D1;
+  for (u32 channel = 0; channel < 5; ++channel) zv_SetVideoEncodeConfig(handle, channel, &config);
+  int status = -1;
+  EXPECT_NE(printed([&] { status = zv_Start(handle); }), "");
+  EXPECT_EQ(status, ZV_ERR_CONFIG);
+  EXPECT_EQ(zarvo::start_flag, 0);
+  for (int thread : {1, 2}) {
+    enable(1);
+    faults.thread_countdown = thread;
+    EXPECT_EQ(printed([&] { status = zv_Start(handle); }), "Zarvo SDK: Start Error! Error Code = 12.\n");
+    EXPECT_EQ(status, ZV_ERR_THREAD_CREATE);
+    EXPECT_EQ(card().config[0].scale, SCALE_ZV_NO_ENCODE);
+    EXPECT_EQ(count(issued(), cmd(0x6510)), 1u);
+  }
+  enable(1);
+  EXPECT_EQ(zv_Start(handle), ZV_OK);
+}
+
+TEST_F(Capture, AudioBlocksOfTheMaskOnly) {
+  Bytes blocks;
+  for (u8 n = 0; n < 4; ++n) blocks.insert(blocks.end(), 48, n);
+  EXPECT_EQ(zv_EnableAudioChannels(handle, 0x5), ZV_OK);
+  vc::queue_audio({blocks, 0});  // no data yet: tried again
+  vc::queue_audio({blocks, 4});
+  vc::queue_audio({blocks, 192});
+  ASSERT_EQ(zv_Start(handle), ZV_OK);
+  ASSERT_TRUE(wait_for_deliveries(4));
+  ASSERT_EQ(zv_Stop(handle), ZV_OK);
+  ASSERT_EQ(deliveries().size(), 4u);
+  u32 expected = 0;
+  for (const Delivery &got : deliveries()) {
+    EXPECT_EQ(got.stream, 'a');
+    EXPECT_EQ(got.channel, expected);
+    EXPECT_EQ(got.offset, 48 * static_cast<long>(expected));
+    EXPECT_EQ(got.data, Bytes(48, static_cast<u8>(expected)));
+    EXPECT_EQ(got.flags, 0);
+    expected = 2 - expected;
+  }
+}
+
+/// A callback after zv_Stop() has returned writes into files that are closed.
+TEST_F(Capture, NothingArrivesAfterStop) {
+  supply_endlessly();
+  for (int round = 0; round < 3; ++round) {
+    enable(1u << 2);
+    EXPECT_EQ(zv_EnableAudioChannels(handle, 0xF), ZV_OK);
+    std::promise<void> inside;
+    std::atomic<bool> stopping{false};
+    std::atomic<bool> first{true};
+    on_delivery = [&](const Delivery &got) {
+      if (got.stream != 'm' || !first.exchange(false)) return;
+      inside.set_value();
+      EXPECT_TRUE(eventually([&] { return stopping && zarvo::start_flag == 0; }));
+    };
+    ASSERT_EQ(zv_Start(handle), ZV_OK);
+    inside.get_future().wait();
+    std::thread stopper([&] {
+      stopping = true;
+      EXPECT_EQ(zv_Stop(handle), ZV_OK);
+    });
+    stopper.join();
+    const std::size_t number = deliveries().size();
+    EXPECT_EQ(zv_Stop(handle), ZV_OK);
+    EXPECT_EQ(deliveries().size(), number);
+    on_delivery = nullptr;
+  }
+}
+
+/// A stop from inside a callback that waits for itself for ever, or leaves a thread behind.
+TEST_F(Capture, StopFromACallbackEndsCapture) {
+  supply_endlessly();
+  for (char stream : {'m', 'j', 'a'}) {
+    enable(1u << 2);
+    EXPECT_EQ(zv_EnableAudioChannels(handle, 0xF), ZV_OK);
+    std::atomic<int> status{-1};
+    on_delivery = [&](const Delivery &got) {
+      if (got.stream == stream && status == -1) status = zv_Stop(handle);
+    };
+    ASSERT_EQ(zv_Start(handle), ZV_OK);
+    EXPECT_TRUE(eventually([&] { return status != -1; }));
+    EXPECT_EQ(status, ZV_ERR_THREAD_JOIN);
+    EXPECT_EQ(zarvo::start_flag, 0);
+  }
+  EXPECT_EQ(zv_Close(handle), ZV_OK);  // joins the last of them
+  on_delivery = nullptr;
+  EXPECT_EQ(zv_Open(&handle), ZV_OK);
+}
+
+/// Control calls and callbacks changed under a running capture: a race, or a callback through a
+/// torn pointer.
+TEST_F(Capture, ControlWhileCapturing) {
+  supply_endlessly();
+  enable(1u << 2);
+  EXPECT_EQ(zv_EnableAudioChannels(handle, 0xF), ZV_OK);
+  ASSERT_EQ(zv_Start(handle), ZV_OK);
+  std::thread preview([&] {
+    u8 *picture = nullptr;
+    for (int i = 0; i < 20; ++i) zv_GetPreviewScreen(handle, &picture);
+  });
+  for (u32 i = 0; i < 50; ++i) {
+    zv_RegisterCallBack(handle, i % 2 == 0 ? nullptr : mpeg4_callback, nullptr, audio_callback);
+    zv_EnableAudioChannels(handle, i % 16);
+    zv_SetVideoStandard(handle, i % 2);
+    zv_GetMotionStatus(handle);
+    u8 *picture = nullptr;
+    if (i % 10 == 0) zv_GetPreviewScreen(handle, &picture);
+  }
+  preview.join();
+  EXPECT_TRUE(wait_for_deliveries(10));
+}
+
+}  // namespace

@@ -1,0 +1,206 @@
+#include <tuple>
+
+#include "sdk_test.h"
+#include "zv_video.h"
+
+namespace vc = virtual_card;
+using testing::ElementsAreArray;
+
+namespace {
+
+class Encode : public CardTest {
+ protected:
+  static ZV_VIDEO_CONFIG settings(ZV_SCALE_VALUE scale, u32 interval,
+                                  ZV_TWOFIELD_MODE two = TWOFIELD_DISABLE) {
+    ZV_VIDEO_CONFIG config{};
+    config.scale = scale;
+    config.interval = static_cast<ZV_INTERVAL_VALUE>(interval);
+    config.twofield = two;
+    config.gop = 25;
+    config.qp = 6;
+    return config;
+  }
+};
+
+const std::string kExceeded = "Error: zv_CheckVideoEncodeConfig--Exceed maximum total frame rate!!\n";
+
+/// A budget that counts fractions, the wrong weight, or refuses at exactly the limit.
+TEST_F(Encode, BudgetCountsWholeFrames) {
+  struct Load {
+    u32 channels;
+    ZV_VIDEO_CONFIG config;
+  };
+  struct Case {
+    const char *name;
+    u32 standard;
+    std::vector<Load> loads;
+    int status;
+    std::string output;
+  };
+  const auto cif = [](u32 interval) { return settings(SCALE_ZV_CIF, interval); };
+  const auto d1 = [](u32 interval) { return settings(SCALE_ZV_D1, interval); };
+  const auto both = [](ZV_SCALE_VALUE scale, u32 interval) {
+    return settings(scale, interval, TWOFIELD_ENABLE);
+  };
+  const Case cases[] = {
+      {"four D1 are the limit", 0, {{4, d1(0)}}, ZV_OK, ""},
+      {"one frame more is too much", 0, {{4, d1(0)}, {1, cif(15)}}, ZV_ERR_CONFIG, kExceeded},
+      {"sixteen CIF in PAL", 1, {{16, cif(0)}}, ZV_OK, ""},
+      {"22.5 count as 22", 0, {{5, d1(4)}, {1, d1(9)}, {1, cif(6)}, {1, cif(15)}}, ZV_OK, ""},
+      {"5 x 88 + 24 + 15 + 2 = 481",
+       0,
+       {{5, d1(4)}, {1, d1(9)}, {1, cif(6)}, {1, cif(13)}},
+       ZV_ERR_CONFIG,
+       kExceeded},
+      {"half D1, both fields: 120", 0, {{4, both(SCALE_ZV_HALF_D1, 0)}}, ZV_OK, ""},
+      {"CIF, both fields: 60", 0, {{8, both(SCALE_ZV_CIF, 0)}, {1, cif(15)}}, ZV_ERR_CONFIG, kExceeded},
+      {"both fields at a lower rate", 0, {{1, both(SCALE_ZV_HALF_D1, 6)}}, ZV_ERR_CONFIG, ""},
+      {"both fields of D1", 0, {{1, both(SCALE_ZV_D1, 0)}}, ZV_ERR_CONFIG, ""},
+      {"PAL has no interval 15", 1, {{4, d1(0)}, {12, cif(15)}}, ZV_OK, ""},
+      {"PAL interval 14 counts", 1, {{4, d1(0)}, {1, cif(14)}}, ZV_ERR_CONFIG, kExceeded},
+      {"unknown interval counts full", 0, {{4, d1(99)}, {1, cif(15)}}, ZV_ERR_CONFIG, kExceeded},
+      {"unknown scale weighs nothing",
+       0,
+       {{1, settings(SCALE_ZV_INVALID, 0)}, {4, d1(0)}},
+       ZV_OK,
+       "Error: invalid scale value, channel = 0, scale = 4.\n"},
+  };
+  for (const Case &test : cases) {
+    SCOPED_TRACE(test.name);
+    EXPECT_EQ(zv_EnableVideoRecordChannels(handle, 0), ZV_OK);
+    EXPECT_EQ(zv_SetVideoStandard(handle, test.standard), ZV_OK);
+    u32 channel = 0;
+    for (const Load &load : test.loads)
+      for (u32 i = 0; i < load.channels; ++i) zv_SetVideoEncodeConfig(handle, channel++, &load.config);
+    int status = -1;
+    EXPECT_EQ(printed([&] { status = zv_CheckVideoEncodeConfig(handle); }), test.output);
+    EXPECT_EQ(status, test.status);
+  }
+}
+
+TEST_F(Encode, RefusedSettingsAreStored) {
+  ZV_VIDEO_CONFIG config = settings(SCALE_ZV_NO_ENCODE, 0);
+  config.enable = 1;
+  int status = -1;
+  EXPECT_EQ(printed([&] { status = zv_SetVideoEncodeConfig(handle, 2, &config); }),
+            "Error: zv_SetVideoEncodeConfig--invalid scale value.\n");
+  EXPECT_EQ(status, ZV_ERR_CONFIG);
+  config = settings(SCALE_ZV_CIF, 6, TWOFIELD_ENABLE);
+  config.CBRValue = -5;
+  EXPECT_EQ(printed([&] { status = zv_SetVideoEncodeConfig(handle, 2, &config); }), "");
+  EXPECT_EQ(status, ZV_ERR_CONFIG);
+  ZV_VIDEO_CONFIG stored{};
+  EXPECT_EQ(zv_GetVideoEncodeConfig(handle, 2, &stored), ZV_OK);
+  EXPECT_EQ(std::tie(stored.scale, stored.interval, stored.twofield, stored.CBRValue),
+            std::tie(config.scale, config.interval, config.twofield, config.CBRValue));
+  EXPECT_EQ(zv_SetVideoEncodeConfig(handle, 16, &config), ZV_ERR_CHANNEL);
+  EXPECT_EQ(zv_GetVideoEncodeConfig(handle, 16, &stored), ZV_ERR_CHANNEL);
+}
+
+/// Settings that reach the encoder with the wrong code, in the wrong order, or do not come back.
+TEST_F(Encode, TransferToTheEncoderAndBack) {
+  struct Case {
+    ZV_SCALE_VALUE scale;
+    u32 interval;
+    ZV_TWOFIELD_MODE two;
+    u32 scale_code, code, flag;
+    u32 back;
+  };
+  const Case cases[] = {
+      {SCALE_ZV_D1, 6, TWOFIELD_DISABLE, 9, 1, 0, 6},
+      {SCALE_ZV_CIF, 6, TWOFIELD_DISABLE, 2, 2, 0, 6},
+      {SCALE_ZV_CIF, 6, TWOFIELD_ENABLE, 2, 1, 0, 0},
+      {SCALE_ZV_CIF, 0, TWOFIELD_ENABLE, 2, 0, 0, 16},
+      {SCALE_ZV_HALF_D1, 1, TWOFIELD_DISABLE, 1, 0x209, 1, 1},
+      {SCALE_ZV_D1, 1, TWOFIELD_ENABLE, 9, 0x209, 1, 1},
+      {SCALE_ZV_CIF, 15, TWOFIELD_DISABLE, 2, 30, 0, 15},
+      {SCALE_ZV_D1, 13, TWOFIELD_DISABLE, 9, 14, 0, 13},
+      {SCALE_ZV_CIF, 77, TWOFIELD_DISABLE, 2, 1, 0, 0},
+  };
+  for (const Case &test : cases) {
+    SCOPED_TRACE(test.interval);
+    card().config[5] = settings(test.scale, test.interval, test.two);
+    card().config[5].CBRValue = 500000;
+    card().config[5].CBREnable = 7;
+    EXPECT_EQ(zv_set_video_config(handle, 5), ZV_OK);
+    EXPECT_THAT(issued(),
+                ElementsAreArray({cmd(0x40086500, {5, test.scale_code}),
+                                  cmd(0x400C6501, {5, test.code, test.flag}), cmd(0x40086503, {5, 6}),
+                                  cmd(0x40086502, {5, 25}), cmd(0x400C6513 | 0xC0000000, {5, 500000, 1})}));
+    card().config[5] = {};
+    EXPECT_EQ(zv_get_video_config(handle, 5), ZV_OK);
+    EXPECT_THAT(issued(), ElementsAreArray({cmd(0xC00C6505, {5, 0, 0}), cmd(0xC0086507, {5, 0}),
+                                            cmd(0xC0086506, {5, 0}), cmd(0xC0086504, {5, 0})}));
+    const ZV_VIDEO_CONFIG &back = card().config[5];
+    EXPECT_EQ(back.scale, test.scale);
+    EXPECT_EQ(static_cast<u32>(back.interval), test.back);
+    EXPECT_EQ(std::tie(back.gop, back.qp, back.enable), std::make_tuple(25u, 6u, 1u));
+  }
+  // Nothing but the rate control of a channel that is not encoded; a drop flag keeps standing.
+  card().config[5] = settings(SCALE_ZV_NO_ENCODE, 3);
+  EXPECT_EQ(zv_set_video_config(handle, 5), ZV_OK);
+  EXPECT_THAT(issued(),
+              ElementsAreArray({cmd(0x40086500, {5, 0}), cmd(0x400C6501, {5, 0, 1}), cmd(0x40086503, {5, 0}),
+                                cmd(0x40086502, {5, 0}), cmd(0xC00C6513, {5, 0, 0})}));
+  EXPECT_EQ(zv_set_video_config(handle, 16), ZV_ERR_CHANNEL);
+  EXPECT_EQ(zv_get_video_config(handle, 16), ZV_ERR_CHANNEL);
+}
+
+TEST_F(Encode, QuantiserRangeIsSentOnlyWhenUsable) {
+  struct Case {
+    u32 enable, max, min;
+    bool sent;
+  };
+  for (const Case &test : {Case{1, 29, 1, true}, Case{1, 30, 1, false}, Case{1, 20, 0, false},
+                           Case{1, 9, 9, false}, Case{0, 15, 2, false}}) {
+    ZV_VIDEO_CONFIG &config = card().config[1] = settings(SCALE_ZV_CIF, 0);
+    config.QPMinMaxEnable = test.enable;
+    config.QPMax = test.max;
+    config.QPMin = test.min;
+    EXPECT_EQ(zv_set_video_config(handle, 1), ZV_OK);
+    const Lines lines = issued();
+    EXPECT_EQ(lines.size(), test.sent ? 6u : 5u) << test.max;
+    if (test.sent) {
+      EXPECT_EQ(lines.front(), cmd(0xC0106514, {1, test.max, test.min, 1}));
+    }
+  }
+}
+
+TEST_F(Encode, EnablingSendsQualityThenEveryChannel) {
+  ZV_VIDEO_CONFIG config = settings(SCALE_ZV_CIF, 0);
+  config.mjpeg = VIDEO_CODEC_ZV_MJPEG;
+  for (u32 channel : {3u, 9u, 12u}) {
+    const ZV_JPEG_QUALITY quality[] = {JPEG_QP_ZV_LOW, JPEG_QP_ZV_HIGH, JPEG_QP_ZV_UNSUPPORT};
+    config.jpeg_qp = quality[channel / 4 - (channel == 3 ? 0 : 1)];
+    EXPECT_EQ(zv_SetVideoEncodeConfig(handle, channel, &config), ZV_OK);
+  }
+  EXPECT_EQ(zv_EnableVideoRecordChannels(handle, 0x1208), ZV_OK);
+  const Lines lines = issued();
+  ASSERT_EQ(lines.size(), 3 + 16 * 5u);
+  EXPECT_EQ(lines[0], cmd(0xC008650E, {0x670, 0x02020202}));
+  EXPECT_EQ(lines[1], cmd(0xC008650E, {0x670, 0x02000102}));
+  EXPECT_EQ(lines[2], cmd(0xC008650E, {0x670, 0x02000102}));
+  EXPECT_EQ(lines[3], cmd(0x40086500, {0, 0}));
+  EXPECT_EQ(lines[3 + 9 * 5], cmd(0x40086500, {9, 2}));
+  EXPECT_EQ(card().config[9].enable, 1u);
+  EXPECT_EQ(card().record_mask, 0x1208u);
+
+  // A channel without a scale stops the call; the channels before it are wiped already.
+  int status = -1;
+  EXPECT_EQ(
+      printed([&] { status = zv_EnableVideoRecordChannels(handle, 0x0210); }),
+      "ZarvoSDK: Error: zv_EnableVideoRecordChannels--invalid scale value of Channel4. Please confirm  video "
+      "config first.\n");
+  EXPECT_EQ(status, ZV_ERR_CONFIG);
+  EXPECT_EQ(card().config[3].scale, SCALE_ZV_NO_ENCODE);
+  EXPECT_EQ(card().config[12].scale, SCALE_ZV_CIF);
+  EXPECT_THAT(issued(), testing::IsEmpty());
+  EXPECT_EQ(zv_EnableVideoRecordChannels(handle, 0x10000), ZV_ERR_CHANNEL);
+  EXPECT_EQ(zv_EnableAudioChannels(handle, 0x5), ZV_OK);
+  EXPECT_EQ(zv_EnableAudioChannels(handle, 0x10), ZV_ERR_CHANNEL);
+  EXPECT_EQ(card().audio_mask, 5u);
+  EXPECT_EQ(zv_GetAudioStream(handle, 3), ZV_OK);
+  EXPECT_EQ(zv_GetAudioStream(handle, 4), ZV_ERR_CHANNEL);
+}
+
+}  // namespace

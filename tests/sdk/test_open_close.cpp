@@ -1,0 +1,178 @@
+#include <fcntl.h>
+
+#include "sdk_test.h"
+
+namespace vc = virtual_card;
+using testing::ElementsAreArray;
+
+namespace {
+
+class Opening : public CardTest {};
+
+/// A command issued with another code, record or order than the driver matches.
+TEST_F(Opening, SendsTheCommandsOfOpenAndCloseInOrder) {
+  ASSERT_EQ(zv_Close(handle), ZV_OK);
+  vc::set_codec_register(0x260, 0xFFFF1234);
+  vc::set_motion_level(15, 0x1234);
+  vc::record_log(true);
+  ASSERT_EQ(zv_Open(&handle), ZV_OK);
+  Lines expected = {"open encoder", "open display", "open audio", "open vin", "mmap encoder"};
+  for (std::uint32_t n = 0; n < 4; ++n)
+    expected.insert(expected.end(), {cmd(0xC0046413, {n}), "mmap display"});
+  expected.insert(expected.end(), {cmd(0xC002760B, {0, 0, 0, 0, 0, 0, 0, 0}),
+                                   cmd(0xC0037608, {0, 0x72, 0x00}), cmd(0xC0037608, {0, 0x73, 0x11}),
+                                   cmd(0xC0037608, {0, 0x74, 0x11}), cmd(0xC008640E, {0x260, 0}),
+                                   cmd(0xC008640F, {0x260, 0x1234}), cmd(0xC008640F, {0x268, 0xFFFF})});
+  EXPECT_THAT(operations(), ElementsAreArray(expected));
+  EXPECT_EQ(vc::log()[0].flags & O_ACCMODE, O_RDWR);
+  EXPECT_EQ(vc::log()[4].size, 0x200000u);
+  EXPECT_EQ(vc::log()[6].size, 0x240000u);
+
+  u32 level = 0;
+  EXPECT_EQ(zv_GetMotionSensitivity(handle, 15, &level), ZV_OK);
+  EXPECT_EQ(level, 0x1234u);
+  EXPECT_EQ(card().property[7].saturation, 100);
+  EXPECT_EQ(card().property[7].contrast, 100);
+  EXPECT_EQ(zv_GetResolution(handle), 0u);
+  EXPECT_EQ(zv_GetVideoStandard(handle), 0u);
+
+  vc::record_log(true);
+  ASSERT_EQ(zv_Close(handle), ZV_OK);
+  expected = {cmd(0x6411),
+              cmd(0xC008640E, {0x260, 0}),
+              cmd(0xC008640F, {0x260, 0x1234}),
+              cmd(0x640A),
+              cmd(0xC008640F, {0x268, 0xFFFF}),
+              "close encoder",
+              "close display",
+              "close audio",
+              "close vin",
+              "munmap encoder"};
+  expected.insert(expected.end(), 4, "munmap display");
+  EXPECT_THAT(operations(), ElementsAreArray(expected));
+}
+
+TEST_F(Opening, SecondCardIsRefusedAndReopeningWorks) {
+  HANDLE second = nullptr;
+  EXPECT_EQ(zv_Open(&second), ZV_ERR_ALREADY_OPEN);
+  EXPECT_EQ(second, nullptr);
+  EXPECT_EQ(zv_GetVideoStatus(handle), 0u);
+  for (int i = 0; i < 10; ++i) {
+    EXPECT_EQ(zv_Close(handle), ZV_OK);
+    EXPECT_EQ(zv_Close(handle), ZV_OK);
+    ASSERT_EQ(zv_Open(&handle), ZV_OK);
+  }
+}
+
+/// Runs zv_Open() with the 1st, 2nd, 3rd ... call of a kind failing until none is hit.
+void fail_each(HANDLE &handle, int status, const std::function<void(int)> &arm,
+               const std::function<bool()> &hit, int expected_hits) {
+  const std::size_t descriptors = process_descriptors();
+  int hits = 0;
+  for (int countdown = 1;; ++countdown) {
+    faults.reset();
+    vc::clear_fault();
+    arm(countdown);
+    handle = nullptr;
+    int result = -1;
+    const std::string output = printed([&] { result = zv_Open(&handle); });
+    if (!hit()) {
+      EXPECT_EQ(result, ZV_OK);
+      break;
+    }
+    ++hits;
+    EXPECT_EQ(result, status) << countdown;
+    EXPECT_EQ(output, status == ZV_ERR_NO_MEMORY ? "Zarvo SDK: Open Error! Error Code = 3.\n" : "");
+    EXPECT_EQ(handle == nullptr, status != ZV_OK);
+    if (status == ZV_OK) {
+      EXPECT_EQ(zv_Close(handle), ZV_OK);
+    }
+    EXPECT_EQ(faults.live_allocations, 0) << countdown;
+    EXPECT_EQ(process_descriptors(), descriptors) << countdown;
+    EXPECT_EQ(vc::open_mappings(), 0) << countdown;
+  }
+  EXPECT_EQ(hits, expected_hits);
+}
+
+/// A failure half way through opening that leaks, crashes, or leaves the SDK unable to open again.
+TEST_F(Opening, EveryFailureIsUndone) {
+  ASSERT_EQ(zv_Close(handle), ZV_OK);
+  const auto device_fault = [](vc::Operation operation) {
+    return [operation](int countdown) { vc::inject({.operation = operation, .countdown = countdown}); };
+  };
+  const auto device_hit = [] { return vc::fault_hits() > 0; };
+  fail_each(handle, ZV_ERR_OPEN, device_fault(vc::Operation::open), device_hit, 4);
+  ASSERT_EQ(zv_Close(handle), ZV_OK);
+  fail_each(handle, ZV_ERR_NO_MEMORY, device_fault(vc::Operation::mmap), device_hit, 5);
+  ASSERT_EQ(zv_Close(handle), ZV_OK);
+  fail_each(
+      handle, ZV_ERR_NO_MEMORY, [](int countdown) { faults.malloc_countdown = countdown; },
+      [] { return faults.struck; }, 4);
+  ASSERT_EQ(zv_Close(handle), ZV_OK);
+  // Commands may fail; levels that cannot be read are 0.
+  fail_each(
+      handle, ZV_OK,
+      [](int countdown) {
+        vc::inject(
+            {.operation = vc::Operation::ioctl, .countdown = 1, .code = countdown == 1 ? 0xC002760B : 1u});
+      },
+      device_hit, 1);
+}
+
+/// A failed close that closes a number twice later: it may be somebody else's by then.
+TEST_F(Opening, CloseGoesOnAfterAFailure) {
+  for (int failing = 1; failing <= 4; ++failing) {
+    vc::inject({.operation = vc::Operation::close, .countdown = failing});
+    EXPECT_EQ(zv_Close(handle), ZV_ERR_CLOSE);
+    HANDLE second = nullptr;
+    EXPECT_EQ(zv_Open(&second), ZV_ERR_ALREADY_OPEN);
+    const int stranger = open("/dev/null", O_RDONLY);
+    EXPECT_EQ(zv_Close(handle), ZV_OK);
+    EXPECT_EQ(fcntl(stranger, F_GETFD) >= 0, true) << failing;
+    close(stranger);
+    EXPECT_EQ(vc::open_descriptors(), 0) << failing;
+    ASSERT_EQ(zv_Open(&handle), ZV_OK);
+  }
+}
+
+/// A null, dead or foreign handle, or a null record, that is followed.
+TEST_F(Opening, BadHandlesAndPointersAreRefused) {
+  HANDLE dead = handle;
+  ASSERT_EQ(zv_Close(handle), ZV_OK);
+  EXPECT_EQ(zv_Open(nullptr), ZV_ERR_PARAM);
+  int foreign = 0;
+  u8 *picture = nullptr;
+  ASSERT_EQ(zv_Open(&handle), ZV_OK);
+  for (HANDLE bad : {HANDLE{nullptr}, HANDLE{&foreign}, dead == handle ? HANDLE{&foreign} : dead}) {
+    EXPECT_EQ(zv_Start(bad), ZV_ERR_PARAM);
+    EXPECT_EQ(zv_Close(bad), ZV_ERR_PARAM);
+    EXPECT_EQ(zv_SetVideoStandard(bad, 0), ZV_ERR_PARAM);
+    EXPECT_EQ(zv_GetPreviewScreen(bad, &picture), -1);
+    EXPECT_EQ(zv_GetVideoStatus(bad), 0xFFFFu);
+    EXPECT_EQ(zv_GetHardwareVersion(bad), 3u);
+  }
+  EXPECT_EQ(zv_GetPreviewScreen(handle, nullptr), -1);
+  EXPECT_EQ(zv_SetVideoEncodeConfig(handle, 0, nullptr), ZV_ERR_PARAM);
+  EXPECT_EQ(zv_GetVideoProperty(handle, 0, nullptr), ZV_ERR_PARAM);
+  EXPECT_EQ(zv_MarkMotionArea(handle, 0, nullptr, 1), ZV_ERR_PARAM);
+  EXPECT_EQ(zv_GetTW2815RegisterValue(handle, 0, 0, nullptr), ZV_ERR_PARAM);
+}
+
+/// A picture taken from an index or a result the driver got wrong.
+TEST_F(Opening, PreviewScreenBelievesOnlyWhatFits) {
+  struct Case {
+    std::uint32_t index;
+    long result;
+    int picture;  ///< index of the buffer handed out, -1 none
+  };
+  for (const Case &test : {Case{0, 691200, 0}, Case{3, 0x240000, 3}, Case{4, 691200, -1}, Case{~0u, 10, -1},
+                           Case{1, 0, -1}, Case{1, 0x240001, -1}, Case{2, -1, -1}}) {
+    u8 *picture = nullptr;
+    vc::queue_preview(test.index, test.result);
+    EXPECT_EQ(zv_GetPreviewScreen(handle, &picture), test.result);
+    EXPECT_EQ(picture, test.picture < 0 ? nullptr : zarvo::preview_buf[test.picture]) << test.index;
+  }
+  EXPECT_EQ(vc::log().front().size, 0x240000u);
+}
+
+}  // namespace

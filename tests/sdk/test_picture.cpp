@@ -1,0 +1,156 @@
+#include "internal.h"
+#include "sdk_test.h"
+
+namespace vc = virtual_card;
+using testing::ElementsAre;
+using testing::ElementsAreArray;
+
+namespace {
+
+class Picture : public CardTest {};
+
+bool same(const ZV_VIDEO_PROPERTY &a, const ZV_VIDEO_PROPERTY &b) {
+  return a.hue == b.hue && a.saturation == b.saturation && a.contrast == b.contrast &&
+         a.brightness == b.brightness;
+}
+
+TEST_F(Picture, PropertiesGoToTheChannelsRegisters) {
+  ZV_VIDEO_PROPERTY property{7, 200, 0, -25};
+  ASSERT_EQ(zv_SetVideoProperty(handle, 5, &property), ZV_OK);
+  EXPECT_THAT(issued(), ElementsAre(cmd(0xC0037608, {1, 0x17, 132}), cmd(0xC0037608, {1, 0x18, 255}),
+                                    cmd(0xC0037608, {1, 0x19, 0}), cmd(0xC0037608, {1, 0x1A, 0})));
+  EXPECT_EQ(property.hue, 6);
+  EXPECT_TRUE(same(card().property[5], property));
+  ASSERT_EQ(zv_GetVideoProperty(handle, 15, &property), ZV_OK);
+  EXPECT_THAT(issued(), ElementsAre(cmd(0xC0037607, {3, 0x37, 0}), cmd(0xC0037607, {3, 0x38, 0}),
+                                    cmd(0xC0037607, {3, 0x39, 0}), cmd(0xC0037607, {3, 0x3A, 0})));
+  const ZV_VIDEO_PROPERTY refused[] = {{181, 0, 0, 0}, {-181, 0, 0, 0}, {0, -1, 0, 0},  {0, 201, 0, 0},
+                                       {0, 0, 201, 0}, {0, 0, 0, 26},   {0, 0, 0, -26}, {7, 0, -1, 0}};
+  for (ZV_VIDEO_PROPERTY bad : refused) {
+    const ZV_VIDEO_PROPERTY before = bad;
+    EXPECT_EQ(zv_SetVideoProperty(handle, 5, &bad), ZV_ERR_PARAM);
+    EXPECT_TRUE(same(bad, before));
+  }
+  EXPECT_EQ(zv_SetVideoProperty(handle, 16, &property), ZV_ERR_CHANNEL);
+  EXPECT_EQ(zv_GetVideoProperty(handle, 16, &property), ZV_ERR_CHANNEL);
+  EXPECT_THAT(issued(), testing::IsEmpty());
+}
+
+/// Rounding that drifts: a slider that moves by itself when the panel reads the value back.
+TEST_F(Picture, PropertiesSurviveARoundTrip) {
+  for (i32 step = 0; step <= 200; ++step) {
+    ZV_VIDEO_PROPERTY user{0, step, 200 - step, step / 4 - 25};
+    const ZV_VIDEO_PROPERTY before = user;
+    ZV_VIDEO_PROPERTY reg{};
+    zarvo::translate_video_property(reg, user);
+    ZV_VIDEO_PROPERTY back{};
+    zarvo::inverse_translate_video_property(back, reg);
+    EXPECT_TRUE(same(back, before)) << step;
+  }
+  struct Hue {
+    i32 user, kept, reg, back;
+  };
+  for (const Hue &hue : {Hue{-178, -178, 1, -176}, Hue{-7, -6, 123, -6}, Hue{90, 90, 192, 90},
+                         Hue{180, 180, 255, 180}, Hue{-180, -180, 0, -180}, Hue{179, 178, 254, 178}}) {
+    ZV_VIDEO_PROPERTY user{hue.user, 0, 0, 0};
+    ZV_VIDEO_PROPERTY reg{};
+    zarvo::translate_video_property(reg, user);
+    ZV_VIDEO_PROPERTY back{};
+    zarvo::inverse_translate_video_property(back, reg);
+    EXPECT_EQ(user.hue, hue.kept);
+    EXPECT_EQ(reg.hue, hue.reg) << hue.user;
+    EXPECT_EQ(back.hue, hue.back) << hue.user;
+  }
+}
+
+TEST_F(Picture, MotionThresholdsAndAreas) {
+  ASSERT_EQ(zv_SetMotionSensitivity(handle, 3, 0x1234), ZV_OK);
+  EXPECT_THAT(issued(), ElementsAre(cmd(0x40187602, {3, 0, 0, 64, 64, 4096, 0x1234}),
+                                    cmd(0xC008640F, {0x268, 0xFFFF})));
+  EXPECT_EQ(zv_SetMotionSensitivity(handle, 3, 0x10000), ZV_ERR_PARAM);
+  EXPECT_EQ(zv_SetMotionSensitivity(handle, 16, 1), ZV_ERR_CHANNEL);
+
+  struct Area {
+    ZV_RECT rect;
+    u32 mark;
+    Words map;  ///< column, row, columns, rows, value; none when nothing is sent
+    int status;
+  };
+  const Area areas[] = {{{0, 0, 720, 480}, 1, {0, 0, 45, 30, 0xFFFF}, ZV_OK},
+                        {{16, 32, 40, 40}, 0, {1, 2, 2, 1, 0x1234}, ZV_OK},
+                        {{8, 0, 24, 16}, 2, {0, 0, 1, 1, 0xFFFF}, ZV_OK},
+                        {{8, 8, 8, 20}, 1, {}, ZV_OK},
+                        {{0, 0, 721, 480}, 1, {}, ZV_ERR_PARAM},
+                        {{0, 0, 16, 500}, 1, {}, ZV_ERR_PARAM},
+                        {{20, 0, 10, 16}, 1, {}, ZV_ERR_PARAM},
+                        {{0, 20, 16, 10}, 1, {}, ZV_ERR_PARAM},
+                        {{~0u, 0, ~0u, 16}, 1, {}, ZV_ERR_PARAM}};
+  for (const Area &area : areas) {
+    EXPECT_EQ(zv_MarkMotionArea(handle, 3, &area.rect, area.mark), area.status);
+    Lines expected;
+    if (!area.map.empty()) {
+      const Words &m = area.map;
+      expected = {cmd(0x40187602, {3, m[0], m[1], m[2], m[3], m[2] * m[3], m[4]})};
+    }
+    EXPECT_THAT(issued(), ElementsAreArray(expected));
+  }
+  EXPECT_EQ(zv_SetVideoStandard(handle, 1), ZV_OK);
+  EXPECT_EQ(zv_MarkMotionArea(handle, 3, &areas[5].rect, 1), ZV_OK);  // 500 lines are there in PAL
+  EXPECT_EQ(zv_MarkMotionArea(handle, 16, &areas[0].rect, 1), ZV_ERR_CHANNEL);
+
+  // A refused map: the number is stored all the same.
+  vc::inject({.operation = vc::Operation::ioctl, .code = 0x40187602});
+  EXPECT_EQ(zv_SetMotionSensitivity(handle, 4, 77), ZV_ERR_DEVICE);
+  vc::inject({.operation = vc::Operation::ioctl, .code = 0x40187602});
+  EXPECT_EQ(zv_MarkMotionArea(handle, 4, &areas[0].rect, 1), ZV_ERR_DEVICE);
+  u32 sensitivity = 0;
+  EXPECT_EQ(zv_GetMotionSensitivity(handle, 4, &sensitivity), ZV_OK);
+  EXPECT_EQ(sensitivity, 77u);
+  EXPECT_EQ(zv_GetMotionSensitivity(handle, 16, &sensitivity), ZV_ERR_CHANNEL);
+  u16 *map = std::exchange(card().motion_map, nullptr);
+  EXPECT_EQ(zv_SetMotionSensitivity(handle, 4, 78), ZV_ERR_NO_MEMORY);
+  card().motion_map = map;
+}
+
+TEST_F(Picture, MotionOnOffAndStatus) {
+  vc::set_codec_register(0x260, 0x00AA0055);
+  ASSERT_EQ(zv_StartMotionDetection(handle), ZV_OK);
+  EXPECT_THAT(issued(), ElementsAre(cmd(0xC008640F, {0x268, 0xFFFF}), cmd(0xC008640E, {0x260, 0}),
+                                    cmd(0xC008640F, {0x260, 0xFFFF0055}), cmd(0x6409)));
+  ASSERT_EQ(zv_StopMotionDetection(handle), ZV_OK);
+  EXPECT_THAT(issued(), ElementsAre(cmd(0xC008640E, {0x260, 0}), cmd(0xC008640F, {0x260, 0x55}), cmd(0x640A),
+                                    cmd(0xC008640F, {0x268, 0xFFFF})));
+  vc::script_motion(0xABCD0005);
+  vc::set_decoder_register(0, 0x5A, 0xFB);
+  EXPECT_EQ(zv_GetMotionStatus(handle), 1u);
+  EXPECT_EQ(card().motion_status, 1u);
+}
+
+TEST_F(Picture, PrivacyMask) {
+  struct Case {
+    u32 resolution;
+    ZV_RECT rect;
+    int status;
+  };
+  for (const Case &test : {Case{0, {0, 0, 720, 480}, ZV_OK}, Case{0, {0, 0, 721, 480}, ZV_ERR_PARAM},
+                           Case{0, {0, 0, 720, 481}, ZV_ERR_PARAM},
+                           Case{0, {100, 100, 50, 200}, ZV_ERR_PARAM}, Case{0, {0, 0, 0, 0}, ZV_OK},
+                           Case{1, {0, 0, 720, 480}, ZV_ERR_PARAM}, Case{1, {80, 40, 240, 160}, ZV_OK}}) {
+    zv_SetResolution(handle, test.resolution);
+    issued();
+    EXPECT_EQ(zv_SetShieldRect(handle, 9, &test.rect), test.status);
+    const ZV_RECT &r = test.rect;
+    const Lines sent = {cmd(0x40147601, {9, r.x_start, r.x_end, r.y_start, r.y_end})};
+    EXPECT_EQ(issued(), test.status == ZV_OK ? sent : Lines{});
+  }
+  EXPECT_EQ(card().shield[9].x_end, 240u);
+  ZV_RECT rect{};
+  vc::set_video_input_register(0x140, 0x0A1E0514);
+  ASSERT_EQ(zv_GetShieldRect(handle, 0, &rect), ZV_OK);
+  EXPECT_THAT((std::array{rect.x_start, rect.x_end, rect.y_start, rect.y_end}),
+              ElementsAre(80, 240, 40, 160));
+  EXPECT_EQ(zv_SetShieldRect(handle, 16, &rect), ZV_ERR_CHANNEL);
+  EXPECT_EQ(zv_GetShieldRect(handle, 16, &rect), ZV_ERR_CHANNEL);
+}
+
+}  // namespace
