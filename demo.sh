@@ -73,7 +73,8 @@ run_record() {
 # shot NAME [WINDOW]: a screenshot of the window (or the whole screen), and one frame of the tour.
 shot() {
   picture "${2:-root}" "$SHOTS/$1.png"
-  import -silent -window root -resize 50% "$SHOTS/tour-$(printf '%02d' $((++TOUR))).png"
+  TOUR=$((TOUR + 1))
+  import -silent -window root -crop 1530x890+0+0 +repage -resize 60% "$SHOTS/tour-$(printf '%02d' "$TOUR").png"
 }
 
 tour_preview() {
@@ -173,7 +174,7 @@ run_tour() {
   say "Picture-in-picture and zoom, with the example zarvo_motion"
   "${ON_CARD[@]}" "$BUILD/examples/zarvo_motion" "$RESULTS/zoom" || fail "zarvo_motion failed"
   mogrify -format png "$RESULTS"/zoom/*.ppm
-  convert -delay 120 -loop 0 "$SHOTS"/tour-*.png -layers optimize -colors 64 "$SHOTS/tour.gif"
+  convert -delay 120 -loop 0 "$SHOTS"/tour-*.png -layers optimize -colors 128 "$SHOTS/tour.gif"
   rm "$SHOTS"/tour-*.png
 }
 

@@ -91,15 +91,13 @@ void save_ppm(const u8 *picture, const std::filesystem::path &path) {
   std::printf("saved %s\n", path.c_str());
 }
 
-/// Saves the preview as it looks now: some pictures are passed over, since the card may have composed
-/// them before the last change.
+/// Saves the preview as it looks now. Pictures that the card composed before the last change are let pass:
+/// a fifth of a second is six of them.
 void save_preview(HANDLE card, const std::filesystem::path &path) {
+  std::this_thread::sleep_for(std::chrono::milliseconds(200));
   u8 *picture = nullptr;
-  int passed = 0;
-  wait_for("preview picture", [&] {
-    const int length = zv_GetPreviewScreen(card, &picture);
-    return length == static_cast<int>(kWidth * kHeight * 2) && ++passed > 5;
-  });
+  wait_for("preview picture",
+           [&] { return zv_GetPreviewScreen(card, &picture) == static_cast<int>(kWidth * kHeight * 2); });
   save_ppm(picture, path);
 }
 

@@ -91,7 +91,7 @@ lines() { grep -c -- "$1" "$LOG"; }
 # wait_preview: until the preview window is there and its caption tells a rate; PREVIEW is the window.
 wait_preview() {
   wait_until 20 preview_shown || die "no preview window appeared: $(tail -n 5 "$LOG")"
-  xdotool windowmove "$PREVIEW" 920 40 2>/dev/null
+  xdotool windowmove "$PREVIEW" 780 40 2>/dev/null
   wait_until 20 preview_runs || die "the preview shows no pictures"
 }
 preview_shown() { PREVIEW=$(xdotool search --onlyvisible --name '^Preview' | head -n 1) && [ -n "$PREVIEW" ]; }
