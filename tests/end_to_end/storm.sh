@@ -4,10 +4,15 @@
 . "$(dirname "$0")/common.sh"
 
 open_program
+storm=()
 for ((n = 0; n < 50; ++n)); do
-  click btnPreviewStart
-  click btnPreviewStop
+  for button in btnPreviewStart btnPreviewStop; do
+    # shellcheck disable=SC2206 # two numbers
+    storm+=(mousemove --window "$DIALOG" ${WIDGET[$button]} click 1)
+  done
 done
+xdotool "${storm[@]}"
+click btnPreviewStop # the last click may have come while the button was disabled
 expect "a preview window is left" wait_until 30 preview_gone
 click btnPreviewStart
 wait_preview
