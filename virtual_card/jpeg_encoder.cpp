@@ -7,8 +7,6 @@
 #include <jerror.h>
 #include <jpeglib.h>
 
-#include "pixel_ops.h"
-
 namespace virtual_card {
 
 namespace {
@@ -16,6 +14,8 @@ namespace {
 /// The tables of the host's header are those of this quality.
 constexpr int kQuality = 25;
 constexpr u32 kCoarseWord = 0x02020202;
+/// Sum of horizontal and vertical frequency from which a coarse picture has nothing.
+constexpr int kCoarseFrequencies = 4;
 constexpr u32 kStripLines = 2 * DCTSIZE;
 
 struct Failure {};
@@ -58,18 +58,10 @@ std::size_t scan_start(const std::vector<u8> &bytes, std::size_t size) {
   return size;
 }
 
-/// Smooths a plane along its lines, and across them within a field.
-void smooth_plane(const std::vector<u8> &in, std::vector<u8> &out, u32 width, u32 height, u32 fields) {
-  std::vector<u8> row(std::size_t{width} + 2);
-  out.resize(in.size());
-  for (u32 line = 0; line < height; ++line) {
-    const u32 above = line >= fields ? line - fields : line;
-    const u32 below = line + fields < height ? line + fields : line;
-    smooth_rows(in.data() + std::size_t{above} * width, in.data() + std::size_t{line} * width,
-                in.data() + std::size_t{below} * width, row.data() + 1, width);
-    row.front() = row[1];
-    row.back() = row[width];
-    smooth_rows(row.data(), row.data() + 1, row.data() + 2, out.data() + std::size_t{line} * width, width);
+/// Takes the fine detail out of an 8 x 8 block of coefficients.
+void coarsen(JCOEF *block) {
+  for (int v = 0; v < DCTSIZE; ++v) {
+    for (int u = std::max(0, kCoarseFrequencies - v); u < DCTSIZE; ++u) block[v * DCTSIZE + u] = 0;
   }
 }
 
@@ -77,6 +69,8 @@ void smooth_plane(const std::vector<u8> &in, std::vector<u8> &out, u32 width, u3
 
 struct JpegEncoder::Compressor {
   jpeg_compress_struct jpeg{};
+  jpeg_decompress_struct fine_jpeg{};
+  std::vector<u8> fine_bytes;
   jpeg_error_mgr errors{};
   Sink sink;
 
@@ -84,10 +78,19 @@ struct JpegEncoder::Compressor {
     jpeg.err = jpeg_std_error(&errors);
     errors.error_exit = fail;
     errors.output_message = say_nothing;
+    fine_jpeg.err = &errors;
     jpeg_create_compress(&jpeg);
+    jpeg_create_decompress(&fine_jpeg);
     jpeg.dest = &sink;
   }
-  ~Compressor() { jpeg_destroy_compress(&jpeg); }
+  ~Compressor() {
+    jpeg_destroy_compress(&jpeg);
+    jpeg_destroy_decompress(&fine_jpeg);
+  }
+  void abort() {
+    jpeg_abort_compress(&jpeg);
+    jpeg_abort_decompress(&fine_jpeg);
+  }
 
   void compress(const EncodedPicture &picture) {
     sink.used = 0;
@@ -102,6 +105,27 @@ struct JpegEncoder::Compressor {
     jpeg_start_compress(&jpeg, TRUE);
     while (jpeg.next_scanline < jpeg.image_height) write_strip(picture);
     jpeg_finish_compress(&jpeg);
+  }
+
+  /// Writes the picture just made once more, with fewer coefficients and the same tables.
+  void coarsen_result() {
+    fine_bytes.swap(sink.bytes);
+    jpeg_mem_src(&fine_jpeg, fine_bytes.data(), sink.used);
+    jpeg_read_header(&fine_jpeg, TRUE);
+    jvirt_barray_ptr *const coefficients = jpeg_read_coefficients(&fine_jpeg);
+    auto *const common = reinterpret_cast<j_common_ptr>(&fine_jpeg);
+    for (int i = 0; i < fine_jpeg.num_components; ++i) {
+      const jpeg_component_info &component = fine_jpeg.comp_info[i];
+      for (JDIMENSION row = 0; row < component.height_in_blocks; ++row) {
+        JBLOCKROW blocks = *fine_jpeg.mem->access_virt_barray(common, coefficients[i], row, 1, TRUE);
+        for (JDIMENSION column = 0; column < component.width_in_blocks; ++column) coarsen(blocks[column]);
+      }
+    }
+    sink.used = 0;
+    jpeg_copy_critical_parameters(&fine_jpeg, &jpeg);
+    jpeg_write_coefficients(&jpeg, coefficients);
+    jpeg_finish_compress(&jpeg);
+    jpeg_finish_decompress(&fine_jpeg);
   }
 
   void write_strip(const EncodedPicture &picture) {
@@ -126,20 +150,11 @@ JpegEncoder::JpegEncoder() : compressor_(std::make_unique<Compressor>()) {}
 JpegEncoder::~JpegEncoder() = default;
 
 std::vector<u8> JpegEncoder::encode(const EncodedPicture &picture, bool fine) {
-  const EncodedPicture *source = &picture;
-  if (!fine) {
-    const EncodedSize size = picture.size;
-    const u32 fields = size.interlaced ? 2 : 1;
-    smooth_.size = size;
-    smooth_plane(picture.y, smooth_.y, size.width, size.height, fields);
-    smooth_plane(picture.cb, smooth_.cb, size.width / 2, size.height / 2, fields);
-    smooth_plane(picture.cr, smooth_.cr, size.width / 2, size.height / 2, fields);
-    source = &smooth_;
-  }
   try {
-    compressor_->compress(*source);
+    compressor_->compress(picture);
+    if (!fine) compressor_->coarsen_result();
   } catch (const Failure &) {
-    jpeg_abort_compress(&compressor_->jpeg);
+    compressor_->abort();
     return {};
   }
   const Sink &sink = compressor_->sink;

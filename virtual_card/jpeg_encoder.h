@@ -19,13 +19,12 @@ class JpegEncoder {
   ~JpegEncoder();
 
   /// The entropy-coded scan and its EOI; empty when encoding failed. The tables being fixed, `fine`
-  /// false saves bytes by smoothing the picture first.
+  /// false saves bytes by leaving fine detail out.
   std::vector<u8> encode(const EncodedPicture &picture, bool fine);
 
  private:
   struct Compressor;
   std::unique_ptr<Compressor> compressor_;
-  EncodedPicture smooth_;
 };
 
 /// Whether the quality register asks for all detail.

@@ -22,11 +22,6 @@ void blend_rows(const u8 *__restrict a, const u8 *__restrict b, unsigned weight,
   }
 }
 
-void smooth_rows(const u8 *__restrict a, const u8 *__restrict b, const u8 *__restrict c, u8 *__restrict out,
-                 std::size_t count) {
-  for (std::size_t i = 0; i < count; ++i) out[i] = static_cast<u8>((a[i] + 2 * b[i] + c[i] + 2) >> 2);
-}
-
 void resample_row(const u8 *__restrict in, const Tap *__restrict taps, u8 *__restrict out,
                   std::size_t count) {
   for (std::size_t i = 0; i < count; ++i) {

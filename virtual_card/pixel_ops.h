@@ -19,8 +19,6 @@ void halve_row(const u8 *in, u8 *out, std::size_t count);
 void average_rows(const u8 *a, const u8 *b, u8 *out, std::size_t count);
 /// (a * (256 - weight) + b * weight) / 256, weight below 256.
 void blend_rows(const u8 *a, const u8 *b, unsigned weight, u8 *out, std::size_t count);
-/// (a + 2 b + c) / 4.
-void smooth_rows(const u8 *a, const u8 *b, const u8 *c, u8 *out, std::size_t count);
 
 /// Where an output sample lies between two input samples.
 struct Tap {
