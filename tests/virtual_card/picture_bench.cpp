@@ -1,0 +1,166 @@
+#include "picture_bench.h"
+
+#include <gtest/gtest.h>
+
+#include <cstring>
+
+#include "zv_lib/stream_headers.h"
+
+extern "C" {
+#include <libavcodec/avcodec.h>
+}
+
+namespace virtual_card {
+
+namespace {
+
+u32 word(const std::vector<u8> &bytes, std::size_t at) {
+  u32 value = 0;
+  std::memcpy(&value, bytes.data() + at, sizeof(value));
+  return value;
+}
+
+std::vector<u8> mpeg4_header(u32 width, u32 height, bool interlaced) {
+  std::vector<u8> header{0,    0,    1,    0,    0,    0,    1,    0x20, 2,    0x48,
+                         0x0D, 0x8B, 0xA9, 0x85, 0x16, 0x04, 0x3C, 0x1C, 0x46, 0x0F};
+  header[14] = static_cast<u8>(width >> 5);
+  header[15] = static_cast<u8>((width & 0x1F) << 3 | height >> 11 | 4);
+  header[16] = static_cast<u8>(height >> 3);
+  header[17] = static_cast<u8>((height & 7) << 5 | (interlaced ? 0x1C : 0x14));
+  return header;
+}
+
+/// A libavcodec decoder that takes no error for a trifle.
+class Decoder {
+ public:
+  explicit Decoder(AVCodecID id) : context_(avcodec_alloc_context3(avcodec_find_decoder(id))) {
+    context_->err_recognition = AV_EF_EXPLODE | AV_EF_BITSTREAM | AV_EF_BUFFER | AV_EF_CRCCHECK;
+    context_->thread_count = 1;
+    context_->flags |= AV_CODEC_FLAG_LOW_DELAY;
+  }
+  ~Decoder() {
+    avcodec_free_context(&context_);
+    av_frame_free(&frame_);
+    av_packet_free(&packet_);
+  }
+  AVCodecContext *context() { return context_; }
+  void open() { ASSERT_EQ(avcodec_open2(context_, nullptr, nullptr), 0); }
+  /// Null when the bytes do not decode.
+  const AVFrame *decode(const std::vector<u8> &bytes) {
+    av_packet_unref(packet_);
+    if (av_new_packet(packet_, static_cast<int>(bytes.size())) != 0) return nullptr;
+    std::memcpy(packet_->data, bytes.data(), bytes.size());
+    if (avcodec_send_packet(context_, packet_) != 0) return nullptr;
+    return avcodec_receive_frame(context_, frame_) == 0 ? frame_ : nullptr;
+  }
+
+ private:
+  AVCodecContext *context_;
+  AVFrame *frame_ = av_frame_alloc();
+  AVPacket *packet_ = av_packet_alloc();
+};
+
+std::vector<u8> plane(const AVFrame &frame, int index) {
+  const int shift = index == 0 ? 0 : 1;
+  std::vector<u8> samples;
+  for (int line = 0; line < frame.height >> shift; ++line) {
+    const u8 *const row = frame.data[index] + std::ptrdiff_t{line} * frame.linesize[index];
+    samples.insert(samples.end(), row, row + (frame.width >> shift));
+  }
+  return samples;
+}
+
+Decoded to_decoded(const AVFrame *frame) {
+  if (frame == nullptr) {
+    ADD_FAILURE() << "a frame does not decode";
+    return {};
+  }
+  return {static_cast<u32>(frame->width),
+          static_cast<u32>(frame->height),
+          frame->pict_type == AV_PICTURE_TYPE_I,
+          frame->interlaced_frame != 0,
+          plane(*frame, 0),
+          plane(*frame, 1),
+          plane(*frame, 2)};
+}
+
+}  // namespace
+
+std::vector<Decoded> decode_mpeg4(const std::vector<Encoded> &frames, u32 width, u32 height,
+                                  bool interlaced) {
+  Decoder decoder(AV_CODEC_ID_MPEG4);
+  decoder.open();
+  std::vector<Decoded> pictures;
+  for (const Encoded &frame : frames) {
+    std::vector<u8> bytes = frame.intra ? mpeg4_header(width, height, interlaced) : std::vector<u8>{};
+    bytes.insert(bytes.end(), frame.bytes.begin(), frame.bytes.end());
+    pictures.push_back(to_decoded(decoder.decode(bytes)));
+  }
+  return pictures;
+}
+
+Decoded decode_jpeg(const Encoded &frame) {
+  Decoder decoder(AV_CODEC_ID_MJPEG);
+  decoder.open();
+  zarvo::JpegHeader header = zarvo::jpeg_header_template();
+  zarvo::jpeg_set_sof(header, frame.width, frame.height);
+  std::vector<u8> bytes(header.begin(), header.end());
+  bytes.insert(bytes.end(), frame.bytes.begin(), frame.bytes.end());
+  return to_decoded(decoder.decode(bytes));
+}
+
+std::vector<std::int16_t> decode_g726(const std::vector<u8> &bytes) {
+  Decoder decoder(AV_CODEC_ID_ADPCM_G726);
+  decoder.context()->sample_rate = 8000;
+  decoder.context()->bits_per_coded_sample = 3;
+  decoder.context()->ch_layout.nb_channels = 1;
+  decoder.open();
+  const AVFrame *frame = decoder.decode(bytes);
+  if (frame == nullptr) return {};
+  const auto *samples = reinterpret_cast<const std::int16_t *>(frame->data[0]);
+  return {samples, samples + frame->nb_samples};
+}
+
+std::vector<Encoded> PictureBench::take_mpeg4() {
+  std::vector<Encoded> frames;
+  while (const auto ready = mpeg4.pop(std::chrono::microseconds{0})) {
+    const std::vector<u8> &area = ready->area;
+    const u32 first = word(area, 0);
+    EXPECT_EQ(first & 0xFFFFF, area.size() - driver::kMpeg4DescriptorSize);
+    const auto time = std::int64_t{word(area, driver::kMpeg4TimeSeconds)} * 1'000'000 +
+                      word(area, driver::kMpeg4TimeMicroseconds);
+    frames.push_back({first >> 24 & 0xF,
+                      (first >> 22 & 3) == 0,
+                      0,
+                      0,
+                      time,
+                      {area.begin() + driver::kMpeg4DescriptorSize, area.end()}});
+  }
+  return frames;
+}
+
+std::vector<Encoded> PictureBench::take_jpeg() {
+  std::vector<Encoded> frames;
+  while (const auto ready = mjpeg.pop(std::chrono::microseconds{0})) {
+    const std::vector<u8> &area = ready->area;
+    frames.push_back({word(area, 0),
+                      true,
+                      word(area, 4),
+                      word(area, 8),
+                      0,
+                      {area.begin() + driver::kMjpegDescriptorSize, area.end()}});
+  }
+  return frames;
+}
+
+Decoded PictureBench::look(unsigned channel) {
+  fields(next % 2 == 0 ? 2 : 1);
+  std::optional<Encoded> newest;
+  for (Encoded &frame : take_jpeg()) {
+    if (frame.channel == channel) newest = std::move(frame);
+  }
+  take_mpeg4();
+  return newest ? decode_jpeg(*newest) : Decoded{};
+}
+
+}  // namespace virtual_card

@@ -1,0 +1,180 @@
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <ctime>
+
+#include "camera.h"
+#include "picture_bench.h"
+
+namespace virtual_card {
+namespace {
+
+constexpr u32 kCif = 2, kD1 = 9;
+constexpr u32 kBackdropX = 85, kBackdropY = 50;  ///< hundredths: nothing but the backdrop, most of the time
+constexpr u32 kBarX = 18, kBarY = 5;             ///< hundredths: the yellow bar
+
+TEST(Cameras, NoTwoOfSixteenLookAlike) {
+  PictureBench bench;
+  for (unsigned i = 0; i < kChannels; ++i) {
+    bench.encode(i, kCif, 1);
+    bench.state.channel[i].scene = Scene::still;
+  }
+  bench.fields(2);
+  std::vector<Decoded> pictures;
+  for (const Encoded &frame : bench.take_jpeg()) pictures.push_back(decode_jpeg(frame));
+  ASSERT_EQ(pictures.size(), kChannels);
+  for (unsigned i = 0; i < kChannels; ++i) {
+    EXPECT_EQ(pictures[i].mark()->channel, i);
+    for (unsigned other = 0; other < i; ++other) {
+      std::size_t different = 0;
+      for (std::size_t at = 0; at < pictures[i].cb.size(); ++at) {
+        if (std::abs(pictures[i].cb[at] - pictures[other].cb[at]) > 8 ||
+            std::abs(pictures[i].cr[at] - pictures[other].cr[at]) > 8) {
+          ++different;
+        }
+      }
+      EXPECT_GT(different, pictures[i].cb.size() / 4) << "channels " << i << " and " << other;
+    }
+  }
+}
+
+// A camera whose fields are copies of each other, or that moves when it should stand still.
+TEST(Cameras, FieldsAreDrawnAtTheirOwnTimes) {
+  constexpr struct {
+    Scene scene;
+    bool moves;
+  } kCases[] = {{Scene::moving, true}, {Scene::still, false}, {Scene::black, false}};
+  for (const auto &expected : kCases) {
+    Camera camera(6);
+    CardState state;
+    state.channel[6].scene = expected.scene;
+    camera.adjust(state);
+    const auto at = [&](std::int64_t field) {
+      camera.draw(FieldMoment(0, field, std::chrono::microseconds(field * 16683)));
+      return camera.picture().y;
+    };
+    const auto first = at(100);
+    const auto both = at(101);
+    const auto later = at(102);
+    u32 lines_changed[2] = {};
+    for (u32 line = 80; line < 380; ++line) {  // where the ball is, without clock and mark
+      const auto begin = static_cast<std::ptrdiff_t>(line * 720);
+      if (!std::equal(first.begin() + begin, first.begin() + begin + 720, both.begin() + begin)) {
+        ++lines_changed[line % 2];
+      }
+    }
+    EXPECT_EQ(lines_changed[1] > 0, expected.moves);
+    EXPECT_EQ(lines_changed[0], 0u) << "the bottom field touched the top field's lines";
+    EXPECT_EQ(later != both, expected.moves);
+  }
+}
+
+// What is left of an object where it was two fields ago: a picture must not tell its past.
+TEST(Cameras, PictureIsAFunctionOfTheMoment) {
+  Camera walked(3), jumped(3);
+  CardState state;
+  walked.adjust(state);
+  jumped.adjust(state);
+  const auto moment = [](std::int64_t field) {
+    return FieldMoment(0, field, std::chrono::microseconds(field * 16683));
+  };
+  for (std::int64_t field = 0; field < 200; ++field) walked.draw(moment(field));
+  jumped.draw(moment(198));
+  jumped.draw(moment(199));
+  EXPECT_EQ(walked.picture().y, jumped.picture().y);
+  EXPECT_EQ(walked.picture().cb, jumped.picture().cb);
+}
+
+TEST(Cameras, ClockShowsLocalTimeOfTheFrame) {
+  const char *const old = std::getenv("TZ");
+  const std::string zone = old != nullptr ? old : "";
+  setenv("TZ", "XXX-5:30", 1);
+  tzset();
+  const std::chrono::microseconds time{(23 * 3600 + 59 * 60 + 58) * 1'000'000LL + 999'000};
+  EXPECT_EQ(FieldMoment(1, 0, time).clock(), "05:29:58.24");
+  EXPECT_EQ(FieldMoment(0, 1, time + std::chrono::microseconds(16683)).clock(), "05:29:58.29");
+  old != nullptr ? setenv("TZ", zone.c_str(), 1) : unsetenv("TZ");
+  tzset();
+}
+
+struct Property {
+  const char *name;
+  PictureSettings settings;
+  Colour yellow;  ///< what becomes of the yellow bar (162, 44, 142)
+};
+
+class EveryProperty : public testing::TestWithParam<Property> {};
+
+// A property that works the wrong way round, touches another channel, or the blue of a lost camera.
+TEST_P(EveryProperty, IsSeenInItsChannelOnly) {
+  PictureBench bench;
+  for (const unsigned channel : {8u, 9u, 10u}) bench.encode(channel, kD1, 0);
+  for (const unsigned channel : {9u, 10u}) bench.state.channel[channel].picture = GetParam().settings;
+  bench.state.channel[10].lost = true;
+  bench.window(9, {0, 0, 720, 480});
+  bench.window(10, {480, 320, 720, 480});
+  const Decoded changed = bench.look(9), neighbour = bench.look(8), lost = bench.look(10);
+  EXPECT_TRUE(near(changed.at(kBarX, kBarY), GetParam().yellow));
+  EXPECT_TRUE(near(neighbour.at(kBarX, kBarY), {162, 44, 142}));
+  EXPECT_TRUE(near(lost.at(kBarX, kBarY), kLostBlue));
+  bench.compose();
+  EXPECT_TRUE(near(bench.pixel(720 * kBarX / 100, 480 * kBarY / 100), GetParam().yellow, 4));
+  EXPECT_TRUE(near(bench.pixel(600, 400), kLostBlue, 2));
+}
+
+INSTANTIATE_TEST_SUITE_P(Properties, EveryProperty,
+                         testing::Values(Property{"HuePlus90", {192, 128, 128, 128}, {162, 114, 44}},
+                                         Property{"HueMinus180", {0, 128, 128, 128}, {162, 212, 114}},
+                                         Property{"NoSaturation", {128, 0, 128, 128}, {162, 128, 128}},
+                                         Property{"HalfSaturation", {128, 64, 128, 128}, {162, 86, 135}},
+                                         Property{"HalfContrast", {128, 128, 64, 128}, {144, 44, 142}},
+                                         Property{"NoContrast", {128, 128, 0, 128}, {126, 44, 142}},
+                                         Property{"Brighter", {128, 128, 128, 255}, {216, 44, 142}},
+                                         Property{"Darker", {128, 128, 128, 0}, {107, 44, 142}}),
+                         [](const auto &test) { return test.param.name; });
+
+// A mask that what moves paints over, that is off at one scale, or lies in the wrong place.
+TEST(Masks, BlankTheirRectangleInEveryPicture) {
+  for (const u32 scale : {1u, kCif, kD1}) {
+    PictureBench bench;
+    bench.encode(1, scale, scale == kD1 ? 0 : 1);
+    bench.state.channel[1].mask = {1, 144, 432, 120, 464};
+    bench.window(1, {0, 0, 360, 240});
+    for (int i = 0; i < 40; ++i) {
+      const Decoded picture = bench.look(1);
+      bench.compose();
+      for (const u32 x : {22u, 40u, 58u}) {
+        for (const u32 y : {28u, 60u, 90u, 94u}) {
+          ASSERT_TRUE(near(picture.at(x, y), kMaskGrey)) << "scale " << scale << " at " << x << ", " << y;
+          ASSERT_TRUE(near(bench.pixel(360 * x / 100, 240 * y / 100), kMaskGrey, 1));
+        }
+      }
+      ASSERT_FALSE(near(picture.at(18, 94), kMaskGrey));
+      ASSERT_FALSE(near(picture.at(40, 22), kMaskGrey));
+      ASSERT_FALSE(near(picture.at(62, 94), kMaskGrey));
+    }
+    bench.state.channel[1].mask = {};
+    EXPECT_FALSE(near(bench.look(1).at(22, 28), kMaskGrey));
+  }
+}
+
+// A change that waits for the next restart.
+TEST(Cameras, PlugsScenesAndStandardsChangeAtOnce) {
+  PictureBench bench;
+  bench.encode(0, kCif, 1);
+  EXPECT_TRUE(bench.look(0).mark());
+  bench.state.channel[0].lost = true;
+  EXPECT_TRUE(near(bench.look(0).at(kBackdropX, kBackdropY), kLostBlue));
+  bench.state.channel[0].lost = false;
+  bench.state.channel[0].scene = Scene::black;
+  EXPECT_TRUE(near(bench.look(0).at(kBackdropX, kBackdropY), kBlack));
+  bench.state.channel[0].scene = Scene::moving;
+  bench.state.standard = VIDEO_STANDARD_ZV_PAL;
+  bench.state.width = 704;
+  const Decoded pal = bench.look(0);
+  EXPECT_EQ(pal.height, 288u);
+  EXPECT_TRUE(pal.mark());
+}
+
+}  // namespace
+}  // namespace virtual_card

@@ -1,0 +1,252 @@
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <map>
+
+#include "encoded_picture.h"
+#include "mpeg4_encoder.h"
+#include "picture_bench.h"
+
+namespace virtual_card {
+namespace {
+
+constexpr u32 kHalfD1 = 1, kCif = 2, kD1 = 9, kDropMode = 0x200;
+
+struct Format {
+  u32 scale_code, standard, input_width;
+  u32 width, height;
+};
+
+class EveryFormat : public testing::TestWithParam<Format> {
+ protected:
+  EveryFormat() {
+    bench_.state.standard = GetParam().standard;
+    bench_.state.width = GetParam().input_width;
+    interval_ = interlaced() ? 0 : 1;
+  }
+  bool interlaced() const { return GetParam().scale_code == kD1; }
+
+  PictureBench bench_;
+  u32 interval_;
+};
+
+double psnr(const Decoded &a, const Decoded &b) {
+  double squares = 0;
+  for (std::size_t i = 0; i < a.y.size(); ++i) squares += (a.y[i] - b.y[i]) * (a.y[i] - b.y[i]);
+  return 10 * std::log10(255.0 * 255.0 * static_cast<double>(a.y.size()) / std::max(squares, 1.0));
+}
+
+// A header that does not match the stream, a frame out of order or of another channel, a drifting
+// prediction, fields the wrong way up.
+TEST_P(EveryFormat, BothStreamsDecodeBehindTheHostsHeaders) {
+  const Format &format = GetParam();
+  bench_.encode(11, format.scale_code, interval_, 7, 3);
+  bench_.fields(60);
+  const auto mpeg4 = bench_.take_mpeg4();
+  const auto jpeg = bench_.take_jpeg();
+  ASSERT_EQ(mpeg4.size(), 30u);
+  ASSERT_EQ(jpeg.size(), 30u);
+  const auto pictures = decode_mpeg4(mpeg4, format.width, format.height, interlaced());
+  for (u32 i = 0; i < 30; ++i) {
+    const Decoded still = decode_jpeg(jpeg[i]);
+    for (const Decoded *picture : {&pictures[i], &still}) {
+      ASSERT_EQ(picture->width, format.width);
+      ASSERT_EQ(picture->height, format.height);
+      ASSERT_EQ(picture->mark(), (FrameMark{11, i, false})) << "frame " << i;
+    }
+    EXPECT_EQ(pictures[i].intra, i % 7 == 0);
+    EXPECT_EQ(mpeg4[i].intra, i % 7 == 0);
+    EXPECT_EQ(pictures[i].interlaced, interlaced());
+    EXPECT_GT(psnr(pictures[i], still), 30.0);
+  }
+}
+
+// A mark, or a picture, that only good settings bring through.
+TEST_P(EveryFormat, CoarseStreamsAreSmallerAndKeepTheMark) {
+  const Format &format = GetParam();
+  const auto sizes = [&](u32 qp, u32 quality_word) {
+    bench_.state.mjpeg_quality = quality_word;
+    bench_.encode(2, format.scale_code, interval_, 5, qp);
+    bench_.fields(10);
+    const auto mpeg4 = bench_.take_mpeg4();
+    const auto jpeg = bench_.take_jpeg();
+    EXPECT_TRUE(mpeg4.at(0).intra);
+    const u32 frame = static_cast<u32>(bench_.next / 2 - 5);
+    EXPECT_EQ(decode_mpeg4(mpeg4, format.width, format.height, interlaced()).at(0).mark(),
+              (FrameMark{2, frame, false}));
+    EXPECT_EQ(decode_jpeg(jpeg.at(0)).mark(), (FrameMark{2, frame, false}));
+    return std::pair(mpeg4[0].bytes.size(), jpeg[0].bytes.size());
+  };
+  const auto fine = sizes(2, 0x02000102);
+  const auto coarse = sizes(31, 0x02020202);
+  EXPECT_LT(coarse.first * 2, fine.first);
+  EXPECT_LT(coarse.second * 10, fine.second * 9);
+}
+
+INSTANTIATE_TEST_SUITE_P(Formats, EveryFormat,
+                         testing::Values(Format{kHalfD1, 0, 720, 720, 240}, Format{kCif, 0, 720, 352, 240},
+                                         Format{kD1, 0, 720, 720, 480}, Format{kHalfD1, 1, 720, 720, 288},
+                                         Format{kCif, 1, 720, 352, 288}, Format{kD1, 1, 720, 720, 576},
+                                         Format{kHalfD1, 0, 704, 704, 240}, Format{kCif, 0, 704, 352, 240},
+                                         Format{kD1, 0, 704, 704, 480}, Format{kCif, 1, 704, 352, 288},
+                                         Format{kD1, 1, 704, 704, 576}),
+                         [](const auto &test) {
+                           const Format &f = test.param;
+                           return "Scale" + std::to_string(f.scale_code) +
+                                  (f.standard == 0 ? "Ntsc" : "Pal") + std::to_string(f.input_width);
+                         });
+
+struct Interval {
+  u32 code;
+  int one_field, interlaced;  ///< pictures in 600 frames
+};
+
+// A rate that is off by one, or counts frames where it should count fields.
+TEST(Intervals, PicturesIn600Frames) {
+  constexpr Interval kIntervals[] = {{0, 1200, 600},
+                                     {1, 600, 300},
+                                     {2, 400, 200},
+                                     {5, 200, 100},
+                                     {29, 40, 20},
+                                     {30, 39, 20},
+                                     {kDropMode | 0, 0, 0},
+                                     {kDropMode | 2, 400, 400},
+                                     {kDropMode | 9, 540, 540}};
+  for (const Interval &interval : kIntervals) {
+    int one_field = 0, interlaced = 0;
+    for (std::int64_t field = 0; field < 1200; ++field) {
+      if (picture_due(interval.code, false, field)) ++one_field;
+      if (picture_due(interval.code, true, field)) ++interlaced;
+    }
+    EXPECT_NEAR(one_field, interval.one_field, 1) << "code " << interval.code;
+    EXPECT_EQ(interlaced, interval.interlaced) << "code " << interval.code;
+    EXPECT_NEAR(picture_rate(interval.code, false, 1), interval.one_field / 24.0, 0.1);
+  }
+}
+
+// Two-field streams that hold one field twice, and times that are not the fields' own.
+TEST(Intervals, TwoFieldStreamHoldsBothFieldsInOrder) {
+  PictureBench bench;
+  bench.encode(0, kCif, 0);
+  bench.fields(8);
+  const auto frames = bench.take_mpeg4();
+  const auto pictures = decode_mpeg4(frames, 352, 240, false);
+  ASSERT_EQ(pictures.size(), 8u);
+  for (u32 i = 0; i < 8; ++i) {
+    EXPECT_EQ(pictures[i].mark(), (FrameMark{0, i / 2, i % 2 != 0}));
+    EXPECT_NEAR(static_cast<double>(frames[i].microseconds - frames[0].microseconds), i * 1001e6 / 60000, 2);
+  }
+}
+
+std::int64_t stream_seconds(const std::vector<u8> &bytes) {
+  std::int64_t seconds = 0;
+  for (std::size_t bit = 34; (bytes[bit / 8] >> (7 - bit % 8)) & 1; ++bit) ++seconds;
+  return seconds;
+}
+
+// Picture times that run backwards where a second begins with an intra frame.
+TEST(Mpeg4, EachSecondIsCountedOnceWhereverItBegins) {
+  for (const u32 gop : {1u, 10u, 30u}) {
+    PictureBench bench;
+    bench.encode(3, kCif, 1, gop);
+    bench.fields(2 * 150);
+    const auto frames = bench.take_mpeg4();
+    std::int64_t seconds = 0;
+    for (std::size_t i = 0; i < frames.size(); ++i) {
+      ASSERT_EQ((std::vector<u8>(frames[i].bytes.begin(), frames[i].bytes.begin() + 4)),
+                (std::vector<u8>{0, 0, 1, 0xB6}));
+      seconds += stream_seconds(frames[i].bytes);
+      ASSERT_EQ(seconds, static_cast<std::int64_t>(i) * 1001 / 30000) << "frame " << i << ", GOP " << gop;
+    }
+    decode_mpeg4(frames, 352, 240, false);
+  }
+}
+
+// Settings that take effect late, or leave the host with frames that build on another stream.
+TEST(Mpeg4, ChangedSettingsAndRestartsBeginWithAnIntraFrame) {
+  PictureBench bench;
+  bench.encode(0, kCif, 1, 100, 8);
+  const auto first_intra = [&] {
+    bench.fields(4);
+    const auto frames = bench.take_mpeg4();
+    EXPECT_EQ(frames.size(), 2u);
+    EXPECT_FALSE(frames.at(1).intra);
+    return frames.at(0).intra;
+  };
+  EXPECT_TRUE(first_intra());
+  EXPECT_FALSE(first_intra());
+  bench.state.channel[0].encoder.qp = 20;
+  EXPECT_TRUE(first_intra());
+  bench.state.encoding = false;
+  bench.fields(2);
+  EXPECT_TRUE(bench.take_mpeg4().empty());
+  bench.state.encoding = true;
+  EXPECT_TRUE(first_intra());
+  bench.engine.reset();
+  EXPECT_TRUE(first_intra());
+}
+
+TEST(Mpeg4, SettingsAreBroughtIntoTheRangeOfTheEncoder) {
+  EncoderSettings encoder;
+  encoder.gop = 0;
+  encoder.qp = 40;
+  const EncodedSize size{352, 240, false};
+  EXPECT_EQ(mpeg4_settings(encoder, size, 30).gop, 1u);
+  EXPECT_EQ(mpeg4_settings(encoder, size, 30).quantiser, 31u);
+  encoder.qp_range = {0, 12, 6, 1};
+  EXPECT_EQ(mpeg4_settings(encoder, size, 30).quantiser, 12u);
+  encoder.qp = 0;
+  EXPECT_EQ(mpeg4_settings(encoder, size, 30).quantiser, 6u);
+}
+
+// A bit rate that ignores the channel's own frame rate, and a range that constant bit rate ignores.
+TEST(Mpeg4, ConstantBitRateHoldsAtAnyFrameRate) {
+  const auto bits_a_second = [](u32 interval, u32 rate, u32 least_quantiser) {
+    PictureBench bench;
+    bench.encode(0, kCif, interval, 15);
+    bench.state.channel[0].encoder.cbr = {0, rate, 1};
+    if (least_quantiser != 0) bench.state.channel[0].encoder.qp_range = {0, 29, least_quantiser, 1};
+    bench.fields(600);
+    double bits = 0;
+    for (const Encoded &frame : bench.take_mpeg4()) bits += 8.0 * static_cast<double>(frame.bytes.size());
+    return bits / (600 * bench.field_seconds());
+  };
+  EXPECT_NEAR(bits_a_second(1, 262144, 0), 262144, 262144 * 0.2);
+  EXPECT_NEAR(bits_a_second(3, 262144, 0), 262144, 262144 * 0.2);
+  EXPECT_LT(bits_a_second(1, 1048576, 20) * 2, bits_a_second(1, 1048576, 0));
+}
+
+// Results that depend on which worker was first.
+TEST(Streams, TwoEnginesMakeTheSameBytes) {
+  const auto run = [] {
+    PictureBench bench;
+    for (unsigned i = 0; i < kChannels; ++i) bench.encode(i, i % 4 == 0 ? kD1 : kCif, i % 3, 4);
+    bench.fields(24);
+    std::vector<std::vector<u8>> bytes;
+    for (const auto &stream : {bench.take_mpeg4(), bench.take_jpeg()}) {
+      for (const Encoded &frame : stream) bytes.push_back(frame.bytes);
+    }
+    return bytes;
+  };
+  const auto once = run();
+  EXPECT_GT(once.size(), 200u);
+  EXPECT_EQ(once, run());
+}
+
+// A burnt-in number that shows up in the preview or at a neighbour.
+TEST(Streams, NumberOverlayIsInTheEncodedPicturesOnly) {
+  PictureBench bench;
+  for (const unsigned channel : {4u, 5u}) bench.encode(channel, kHalfD1, 1);
+  bench.state.channel[4].encoder.number_overlay = true;
+  bench.window(4, {0, 0, 720, 480});
+  const Decoded with = bench.look(4), without = bench.look(5);
+  bench.compose();
+  constexpr u32 kOverlayX = 2, kOverlayY = 4;  // in hundredths: in its black box, left of the figures
+  EXPECT_TRUE(near(with.at(kOverlayX, kOverlayY), kBlack));
+  EXPECT_FALSE(near(without.at(kOverlayX, kOverlayY), kBlack));
+  EXPECT_TRUE(
+      near(bench.pixel(720 * kOverlayX / 100, 480 * kOverlayY / 100), without.at(kOverlayX, kOverlayY)));
+}
+
+}  // namespace
+}  // namespace virtual_card

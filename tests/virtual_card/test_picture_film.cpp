@@ -1,0 +1,116 @@
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <fstream>
+
+#include "film.h"
+#include "picture_bench.h"
+
+namespace virtual_card {
+namespace {
+
+constexpr u32 kCif = 2;
+
+/// Luma of frame n of the clip.
+constexpr u8 level(int frame) {
+  return static_cast<u8>(40 + 30 * frame);
+}
+
+class Films : public testing::Test {
+ protected:
+  Films() : folder_(std::filesystem::temp_directory_path() / ("films" + std::to_string(getpid()))) {
+    std::filesystem::create_directories(folder_);
+  }
+  ~Films() override { std::filesystem::remove_all(folder_); }
+
+  std::string file(const std::string &name, const std::string &bytes) {
+    const auto path = folder_ / name;
+    std::ofstream(path, std::ios::binary) << bytes;
+    return path.string();
+  }
+  /// A clip of plain frames, each lighter than the one before.
+  std::string clip(int frames, int rate) {
+    std::string bytes = "YUV4MPEG2 W64 H48 F" + std::to_string(rate) + ":1 Ip A1:1 C420mpeg2\n";
+    for (int i = 0; i < frames; ++i) {
+      bytes += "FRAME\n" + std::string(64 * 48, static_cast<char>(level(i))) + std::string(32 * 24, '\x60') +
+               std::string(32 * 24, '\x90');
+    }
+    return file("clip.y4m", bytes);
+  }
+
+  std::filesystem::path folder_;
+  PictureBench bench_;
+};
+
+// A film at the card's speed instead of its own, a loop with a gap or a frame twice, and a card that
+// was busy elsewhere for hours.
+TEST_F(Films, RunAtTheirOwnSpeedAndLoopWithoutASeam) {
+  const auto film = Film::open(clip(6, 10), nullptr);
+  ASSERT_TRUE(film);
+  Picture picture;
+  picture.resize(720, 480);
+  const auto shown = [&](double seconds) {
+    film->seek(seconds);
+    film->copy_to(picture);
+    return picture.y_line(200)[300];
+  };
+  constexpr double kStart = 100.0;  // of card time: the film begins when it is first seen
+  for (int i = 0; i < 200; ++i) {
+    const double passed = i / 29.97;
+    ASSERT_NEAR(shown(kStart + passed), level(static_cast<int>(passed * 10 + 1e-6) % 6), 1) << passed << " s";
+  }
+  for (const double passed : {7200.05, 7200.15, 86400.35, 86401.15}) {
+    ASSERT_NEAR(shown(kStart + passed), level(static_cast<int>(passed * 10) % 6), 1) << passed << " s";
+  }
+  EXPECT_NEAR(picture.cb_line(10)[10], 0x60, 1);
+}
+
+// A film that the drawn camera shines through, that escapes mask and properties, or comes and goes late.
+TEST_F(Films, StandInFrontOfTheirCameraOnly) {
+  for (const unsigned channel : {2u, 3u}) bench_.encode(channel, kCif, 1);
+  bench_.state.channel[2].mask = {2, 0, 360, 0, 240};
+  bench_.state.channel[2].picture.saturation = 0;
+  std::string error;
+  ASSERT_TRUE(bench_.engine.show_film(2, clip(1, 25), &error)) << error;
+  const Decoded film = bench_.look(2);
+  EXPECT_TRUE(near(film.at(75, 75), {level(0), 128, 128}));
+  EXPECT_TRUE(near(film.at(75, 2), {level(0), 128, 128}));
+  EXPECT_TRUE(near(film.at(25, 25), kMaskGrey));
+  EXPECT_FALSE(film.mark());
+  EXPECT_EQ(bench_.look(3).mark()->channel, 3u);
+  bench_.state.channel[2].lost = true;
+  EXPECT_TRUE(near(bench_.look(2).at(75, 75), kLostBlue));
+  bench_.state.channel[2].lost = false;
+  EXPECT_TRUE(near(bench_.look(2).at(75, 75), {level(0), 128, 128}));
+  ASSERT_TRUE(bench_.engine.show_film(2, "", &error));
+  bench_.state.channel[2].mask = {};
+  EXPECT_EQ(bench_.look(2).mark()->channel, 2u);
+}
+
+TEST_F(Films, MovementInAFilmIsMotion) {
+  bench_.state.motion_enable = 0x30;
+  ASSERT_TRUE(bench_.engine.show_film(4, clip(6, 10), nullptr));
+  bench_.fields(18);
+  EXPECT_EQ(bench_.engine.motion() & 0x10, 0x10u);
+  ASSERT_TRUE(bench_.engine.show_film(5, clip(1, 25), nullptr));
+  bench_.fields(60);
+  EXPECT_EQ(bench_.engine.motion() & 0x20, 0u);
+}
+
+TEST_F(Films, BadFilesAreRefusedWithAReasonAndTheCameraStays) {
+  bench_.encode(0, kCif, 1);
+  const std::string files[] = {(folder_ / "missing.mp4").string(), folder_.string(), file("empty.avi", ""),
+                               file("text.mp4", "no film, but words"),
+                               file("short.y4m", "YUV4MPEG2 W64 H48 F10:1 Ip A1:1 C420\nFRAME\nabc")};
+  for (const std::string &path : files) {
+    std::string error;
+    EXPECT_FALSE(bench_.engine.show_film(0, path, &error)) << path;
+    EXPECT_EQ(error.rfind(path + ": ", 0), 0u) << error;
+    EXPECT_GT(error.size(), path.size() + 4);
+  }
+  EXPECT_FALSE(bench_.engine.show_film(16, clip(2, 25), nullptr));
+  EXPECT_TRUE(bench_.look(0).mark());
+}
+
+}  // namespace
+}  // namespace virtual_card

@@ -1,0 +1,120 @@
+#include <gtest/gtest.h>
+
+#include "motion_detector.h"
+#include "picture_bench.h"
+
+namespace virtual_card {
+namespace {
+
+constexpr unsigned kChannel = 5;
+constexpr u32 kBit = 1u << kChannel;
+constexpr int kLook = 6;  ///< fields from one look of the detector to the next
+
+class Motion : public testing::Test {
+ protected:
+  Motion() { bench_.state.motion_enable = 0xFFFF; }
+  u32 motion_after(int fields) {
+    bench_.fields(fields);
+    return bench_.engine.motion();
+  }
+  void set_area(u32 column, u32 row, u32 columns, u32 rows, u16 level) {
+    const std::vector<u16> levels(std::size_t{columns} * rows, level);
+    bench_.engine.set_thresholds({kChannel, column, row, columns, rows, levels.data()});
+  }
+  PictureBench bench_;
+};
+
+TEST_F(Motion, MovingCamerasAreReportedAndNoOthers) {
+  bench_.state.channel[0].scene = Scene::still;
+  bench_.state.channel[1].scene = Scene::black;
+  bench_.state.channel[2].lost = true;
+  bench_.state.motion_enable = 0xFFFF & ~8u;
+  for (int look = 0; look < 50; ++look) {
+    const u32 motion = motion_after(kLook);
+    ASSERT_EQ(motion & 0xF, 0u);
+    if (look > 1) {
+      ASSERT_EQ(motion, 0xFFF0u);
+    }
+  }
+}
+
+// Settings of the card that would look like a burglar.
+TEST_F(Motion, ChangesOfSettingsAreNoMotion) {
+  bench_.state.channel[kChannel].scene = Scene::still;
+  const auto expect_quiet = [&] {
+    for (int look = 0; look < 4; ++look) ASSERT_EQ(motion_after(kLook) & kBit, 0u);
+  };
+  expect_quiet();
+  bench_.state.channel[kChannel].picture.brightness = 255;
+  expect_quiet();
+  bench_.state.channel[kChannel].mask = {kChannel, 0, 720, 0, 240};
+  expect_quiet();
+  bench_.state.channel[kChannel].lost = true;
+  expect_quiet();
+  bench_.state.channel[kChannel].lost = false;
+  expect_quiet();
+}
+
+// Levels that work the wrong way round, and areas beside the place they were set for.
+TEST_F(Motion, LevelsAndAreasDecideBlockByBlock) {
+  EXPECT_EQ(motion_after(3 * kLook) & kBit, kBit);
+  bench_.engine.set_threshold(kChannel, 250);
+  EXPECT_EQ(motion_after(5 * kLook) & kBit, 0u);
+  bench_.engine.set_threshold(kChannel, 0);
+  EXPECT_EQ(motion_after(3 * kLook) & kBit, kBit);
+  bench_.engine.set_threshold(kChannel, 0xFFFF);
+  EXPECT_EQ(motion_after(5 * kLook) & kBit, 0u);
+  set_area(0, 0, 45, 4, 0);  // the bars: nothing ever moves there
+  EXPECT_EQ(motion_after(50 * kLook) & kBit, 0u);
+  set_area(40, 28, 64, 64, 0);  // the end of the mark, and far over the map's edge
+  EXPECT_EQ(motion_after(3 * kLook) & kBit, kBit);
+}
+
+TEST_F(Motion, MaskedPartsDoNotMove) {
+  bench_.state.channel[kChannel].mask = {kChannel, 0, 720, 0, 480};
+  EXPECT_EQ(motion_after(5 * kLook) & kBit, 0u);
+  bench_.state.channel[kChannel].mask = {};
+  EXPECT_EQ(motion_after(3 * kLook) & kBit, kBit);
+}
+
+// A report that flickers between looks, never ends, or survives a restart.
+TEST_F(Motion, ReportIsHeldThenEndsAndStartsAfresh) {
+  motion_after(5 * kLook);
+  for (int field = 0; field < 3 * kLook; ++field) ASSERT_EQ(motion_after(1) & kBit, kBit);
+  bench_.engine.set_threshold(kChannel, 0xFFFF);
+  int held = 0;
+  while (held < 100 && (motion_after(1) & kBit) != 0) ++held;
+  EXPECT_GE(held, 2 * kLook - 1);
+  EXPECT_LE(held, 3 * kLook);
+  bench_.engine.set_threshold(kChannel, kDefaultMotionLevel);
+  motion_after(5 * kLook);
+  bench_.state.motion_enable = 0;
+  EXPECT_EQ(motion_after(1), 0u);
+  bench_.state.motion_enable = 0xFFFF;
+  while (!MotionDetector::looks_at(bench_.next)) bench_.fields(1);
+  EXPECT_EQ(motion_after(1), 0u) << "one look compares with nothing";
+}
+
+// Marks on the wrong block, or shown while the trace is off.
+TEST_F(Motion, MarksFrameTheMovingBlocksOfThePreview) {
+  bench_.window(kChannel, {0, 0, 720, 480});
+  bench_.engine.set_threshold(kChannel, 0xFFFF);
+  set_area(38, 28, 6, 2, 0);  // the frame number's last figures
+  const auto red = [&](Area area) {
+    bench_.compose();
+    int count = 0;
+    for (u32 y = area.y_start; y < area.y_end; ++y) {
+      for (u32 x = area.x_start; x < area.x_end; ++x) count += near(bench_.pixel(x, y), {106, 100, 212}, 0);
+    }
+    return count;
+  };
+  bench_.fields(3 * kLook);
+  EXPECT_EQ(red({0, 0, 720, 480}), 0);
+  bench_.state.display.motion_trace = true;
+  const int in_area = red({38 * 16, 28 * 16, 44 * 16, 30 * 16});
+  EXPECT_GT(in_area, 50);
+  EXPECT_EQ(red({0, 64, 720, 480}), in_area);
+}
+
+}  // namespace
+}  // namespace virtual_card
