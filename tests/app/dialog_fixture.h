@@ -1,0 +1,111 @@
+/**
+ * @file dialog_fixture.h
+ * The dialog on the virtual card, offscreen. Each test starts with the card and the module state as
+ * built, and leaves no descriptor and no mapping behind.
+ */
+#ifndef DIALOG_FIXTURE_H
+#define DIALOG_FIXTURE_H
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <cstring>
+#include <memory>
+#include <string>
+#include <thread>
+
+#include "app_state.h"
+#include "demodialog.h"
+#include "virtual_card.h"
+
+/// Waits for a condition, half a minute at most.
+template <typename Condition>
+bool wait_until(Condition condition) {
+  const auto limit = std::chrono::steady_clock::now() + std::chrono::seconds(30);
+  while (!condition()) {
+    if (std::chrono::steady_clock::now() > limit) return false;
+    std::this_thread::sleep_for(std::chrono::milliseconds(1));
+  }
+  return true;
+}
+
+/// The dialog with its protected functions in reach.
+class OpenDialog : public DemoDialog {
+ public:
+  using DemoDialog::CheckCheckBox;
+  using DemoDialog::CheckDiskSpace;
+  using DemoDialog::CloseFile;
+  using DemoDialog::languageChange;
+  using DemoDialog::OpenFile;
+  using DemoDialog::UpdateUI;
+  using DemoDialog::WriteEnableCh;
+  using DemoDialog::WriteVideoRecordConfig;
+};
+
+inline void reset_module_state() {
+  zv_format = VIDEO_STANDARD_ZV_NTSC;
+  zv_resolution = RESOLUTION_ZV_720;
+  zv_mode = MUX_MODE_ZV_1CH;
+  zv_record_mode = VIDEO_CODEC_ZV_MPEG4;
+  g_finish_preview = g_finish_record = 1;
+  g_width = 720;
+  g_height = 480;
+  g_preview_ch = 0xFFFF;
+  g_record_ch = g_audio_ch = g_video_ch = g_motion_ch = 0;
+  g_valid_record_ch = 0;
+  g_channel_mode = ENABLE_PREVIEW;
+  zv_config = {};
+  g_record_width = 720;
+  g_record_height = 480;
+  std::strcpy(g_filepath, "./Data");
+  g_min_diskspace = 10;
+  g_time_interval = 10000;
+  ttt = lenlen = 0;
+}
+
+template <typename Dialog>
+class DialogTestOf : public testing::Test {
+ protected:
+  void SetUp() override {
+    virtual_card::reset();
+    reset_module_state();
+    dialog = std::make_unique<Dialog>();
+    dialog->show();
+  }
+  void TearDown() override {
+    dialog.reset();
+    EXPECT_EQ(virtual_card::open_descriptors(), 0);
+    EXPECT_EQ(virtual_card::open_mappings(), 0);
+  }
+
+  std::unique_ptr<Dialog> dialog;
+};
+
+using DialogTest = DialogTestOf<OpenDialog>;
+
+/// Chooses an item as the operator does; setting the index by program sends no signal.
+inline void choose(QComboBox *combo, int index) {
+  combo->setCurrentIndex(index);
+  emit combo->activated(index);
+}
+
+/// Texts an operator may type where a number belongs, and the number they count as.
+struct TypedNumber {
+  const char *text;
+  int value;
+};
+inline constexpr TypedNumber kTypedNumbers[] = {
+    {"", 0},           {"text", 0},        {"   ", 0},
+    {"-", 0},          {"-1", -1},         {" 5 ", 5},
+    {"2147483648", 0}, {"99999999999", 0}, {"-2147483648", -2147483647 - 1}};
+
+/// What `action` and the threads that end within it print.
+template <typename Action>
+std::string printed_by(Action action) {
+  testing::internal::CaptureStdout();
+  action();
+  return testing::internal::GetCapturedStdout();
+}
+
+#endif
