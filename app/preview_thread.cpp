@@ -52,17 +52,17 @@ bool prepare_card() {
   return same(zv_GetResolution(zv_handle), zv_resolution, "ERROR:resolution does not match!");
 }
 
-// False when the card has no picture any more.
-bool show_picture() {
+// The number of pictures shown, negative when the card has failed.
+int show_picture() {
   u8 *picture = nullptr;
   const int length = zv_GetPreviewScreen(zv_handle, &picture);
   if (length < 0) {
     sdk_ok(length, "ERROR:zv_GetPreviewScreen Error!");
-    return false;
+    return -1;
   }
-  // A card that names a buffer it does not have leaves the pointer alone: the old picture stays.
-  if (picture != nullptr) UpDataYUVScreen(picture, length);
-  return true;
+  if (picture == nullptr) return 0;  // nothing new, or a buffer the card does not have
+  UpDataYUVScreen(picture, length);
+  return 1;
 }
 
 // Pictures follow each other in steady steps; after each caption the steps start from that moment.
@@ -82,8 +82,9 @@ void show_pictures(u32 period) {
     }
     if (next_due > now) continue;
     next_due = (pictures != 0 ? next_due : now) + period;
-    if (!show_picture()) return;
-    ++pictures;
+    const int shown = show_picture();
+    if (shown < 0) return;
+    pictures += static_cast<u32>(shown);
   }
 }
 

@@ -3,10 +3,12 @@
 #include <SDL.h>
 
 #include <algorithm>
+#include <csignal>
 #include <cstddef>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <iterator>
 
 namespace {
 
@@ -36,6 +38,17 @@ void copy_into_overlay(const unsigned char *picture, std::size_t length) {
   }
 }
 
+// SDL turns the signals that end a program into events, and nobody reads its events here: Ctrl-C would
+// do nothing while the preview runs.
+int init_without_signals() {
+  constexpr int kSignals[] = {SIGINT, SIGTERM};
+  struct sigaction before[std::size(kSignals)];
+  for (std::size_t n = 0; n < std::size(kSignals); ++n) sigaction(kSignals[n], nullptr, &before[n]);
+  const int status = SDL_Init(SDL_INIT_VIDEO | SDL_INIT_NOPARACHUTE);
+  for (std::size_t n = 0; n < std::size(kSignals); ++n) sigaction(kSignals[n], &before[n], nullptr);
+  return status;
+}
+
 }  // namespace
 
 int InitialSDL(int width, int height) {
@@ -44,8 +57,7 @@ int InitialSDL(int width, int height) {
   static char accelerated[] = "SDL_VIDEO_YUV_HWACCEL=1";
   putenv(direct);
   putenv(accelerated);
-  // Signals stay the program's own: without the parachute a crash is not hidden by SDL's handlers.
-  if (SDL_Init(SDL_INIT_VIDEO | SDL_INIT_NOPARACHUTE) != 0) {
+  if (init_without_signals() != 0) {
     std::printf("Initial SDL error: %s\n", SDL_GetError());
     return -1;
   }

@@ -57,6 +57,7 @@ void DemoDialog::UpdateUI(UI_STATUS status) {
       {{btnMotionStart}, "      -+"},
       {{btnMotionStop}, "      +-"},
   };
-  if (status < PREVIEW_START || status > MOTION_STOP) return;
-  for (const Row &row : table) apply(row, row.effect[status]);
+  const auto column = static_cast<unsigned int>(status);
+  if (column > MOTION_STOP) return;
+  for (const Row &row : table) apply(row, row.effect[column]);
 }
