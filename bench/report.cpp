@@ -1,0 +1,68 @@
+#include "report.h"
+
+#include <algorithm>
+#include <cstdio>
+
+namespace bench {
+namespace {
+
+struct Line {
+  std::string name;
+  double value;
+  double limit;
+  std::string unit;
+  std::string detail;
+};
+
+std::vector<Line> lines;
+
+std::string format(const char *pattern, double a, double b, double c, double d) {
+  char text[160];
+  std::snprintf(text, sizeof text, pattern, a, b, c, d);
+  return text;
+}
+
+}  // namespace
+
+double median(std::vector<double> values) {
+  std::sort(values.begin(), values.end());
+  const std::size_t middle = values.size() / 2;
+  return values.size() % 2 != 0 ? values[middle] : (values[middle - 1] + values[middle]) / 2;
+}
+
+void compare(const std::string &name, int rounds, double limit, const std::function<double()> &ours,
+             const std::function<double()> &theirs) {
+  std::vector<double> our_costs;
+  std::vector<double> their_costs;
+  std::vector<double> ratios;
+  ours();
+  theirs();
+  for (int round = 0; round < rounds; ++round) {
+    our_costs.push_back(ours());
+    their_costs.push_back(theirs());
+    ratios.push_back(our_costs.back() / their_costs.back());
+  }
+  const auto [low, high] = std::minmax_element(ratios.begin(), ratios.end());
+  lines.push_back({name, median(ratios), limit, "x",
+                   format("%.0f ns against %.0f ns, ratios %.2f to %.2f", median(our_costs),
+                          median(their_costs), *low, *high)});
+}
+
+void figure(const std::string &name, double value, double limit, const std::string &unit) {
+  lines.push_back({name, value, limit, unit, ""});
+}
+
+bool print_report() {
+  bool all_hold = true;
+  std::printf("\n%-62s %10s %10s\n", "what", "measured", "limit");
+  for (const Line &line : lines) {
+    const bool holds = line.value <= line.limit;
+    all_hold = all_hold && holds;
+    std::printf("%-62s %8.2f %-2s %7.2f %-2s %s%s%s\n", line.name.c_str(), line.value, line.unit.c_str(),
+                line.limit, line.unit.c_str(), holds ? "holds" : "EXCEEDED", line.detail.empty() ? "" : "  ",
+                line.detail.c_str());
+  }
+  return all_hold;
+}
+
+}  // namespace bench

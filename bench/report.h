@@ -1,0 +1,24 @@
+/// Ratios of the benchmarks: collected while they run, printed as one table at the end, with the limit
+/// each has to keep.
+#pragma once
+
+#include <functional>
+#include <string>
+#include <vector>
+
+namespace bench {
+
+/// Runs `ours` and `theirs` in turn, `rounds` times, and reports the ratio of their results pair by pair.
+/// Both return a cost, e.g. processor nanoseconds a frame. The first pair only warms up.
+void compare(const std::string &name, int rounds, double limit, const std::function<double()> &ours,
+             const std::function<double()> &theirs);
+
+/// Reports a figure that has to stay at or below a limit.
+void figure(const std::string &name, double value, double limit, const std::string &unit);
+
+/// Prints the table. False when a limit is exceeded.
+bool print_report();
+
+double median(std::vector<double> values);
+
+}  // namespace bench
