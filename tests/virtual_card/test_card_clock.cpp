@@ -1,0 +1,131 @@
+// Card time: fields that never drift, the three clocks, the watchdog.
+
+#include "card_fixture.h"
+#include "clock.h"
+
+namespace {
+
+using card::FieldTimes;
+
+TEST(FieldTimes, StayExactOverYears) {
+  FieldTimes times;
+  for (const std::int64_t round : {1, 90, 24 * 3600, 300000}) {
+    EXPECT_EQ(times.due(60000 * round), 1001s * round);
+    EXPECT_EQ(times.first_at(1001s * round), 60000 * round);
+  }
+  for (std::int64_t field = 0; field < 7; ++field) {
+    EXPECT_EQ(times.first_at(times.due(field)), field);
+    EXPECT_EQ(times.first_at(times.due(field) + 1ns), field + 1);
+  }
+}
+
+TEST(FieldTimes, AStandardChangeKeepsTheNextFieldsTime) {
+  FieldTimes times;
+  const auto due = times.due(31);
+  times.change_standard(VIDEO_STANDARD_ZV_PAL, 31);
+  EXPECT_EQ(times.due(31), due);
+  EXPECT_EQ(times.due(31 + 50), due + 1s);
+  times.change_standard(VIDEO_STANDARD_ZV_NTSC, 81);
+  EXPECT_EQ(times.due(81 + 60000), due + 1s + 1001s);
+}
+
+class ManualClock : public CardTest {
+ protected:
+  void start(u32 standard) {
+    EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_STANDARD, standard), 0);
+    encode_channel(3);
+    EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+  }
+};
+
+// Advancing in pieces must give the same frames as advancing at once, whatever the pieces.
+TEST_F(ManualClock, FramesAndBlocksComeAtTheirTimes) {
+  start(VIDEO_STANDARD_ZV_NTSC);
+  card::advance(1001ms);
+  EXPECT_EQ(card::counters().mpeg4.made, 30u);
+  EXPECT_EQ(card::counters().audio.made, 63u);  // at 0, 16, ... 992 ms
+  for (int piece = 0; piece < 1001; ++piece) card::advance(1ms);
+  EXPECT_EQ(card::counters().mpeg4.made, 60u);
+  EXPECT_EQ(card::counters().audio.made, 126u);
+  card::advance_frames(15);
+  EXPECT_EQ(card::counters().mjpeg.made, 75u);
+
+  EXPECT_EQ(send(display, driver::DISP_IOC_SET_STANDARD, u32{VIDEO_STANDARD_ZV_PAL}), 0);
+  card::advance(2s);
+  EXPECT_EQ(card::counters().mpeg4.made, 75u + 50u);
+  EXPECT_EQ(card::counters().mpeg4.lost, 0u);
+}
+
+TEST_F(ManualClock, NothingMovesOnItsOwn) {
+  start(VIDEO_STANDARD_ZV_PAL);
+  EXPECT_EQ(read_mpeg4(), 0);
+  EXPECT_EQ(card::counters().mpeg4.made, 0u);
+  card::advance_frames(1);
+  EXPECT_GT(read_mpeg4(), 0);
+  EXPECT_EQ(read_mpeg4(), 0);
+}
+
+TEST_F(ManualClock, TheWatchdogCountsDownUnlessFed) {
+  using ::testing::internal::CaptureStderr;
+  using ::testing::internal::GetCapturedStderr;
+  EXPECT_EQ(board_command(driver::kBoardWatchdogOn), driver::kBoardWatchdogOnReply);
+  for (int feed = 0; feed < 3; ++feed) {
+    card::advance(59s);
+    EXPECT_EQ(board_command(driver::kBoardWatchdogOn), driver::kBoardWatchdogOnReply);
+  }
+  EXPECT_TRUE(card::counters().watchdog_running);
+  EXPECT_EQ(card::counters().watchdog_kicks, 4u);
+  EXPECT_EQ(card::counters().watchdog_resets, 0u);
+
+  CaptureStderr();
+  card::advance(60s);
+  card::advance(60s);
+  EXPECT_EQ(GetCapturedStderr(), "virtual card: the watchdog would have reset the machine\n");
+  EXPECT_EQ(card::counters().watchdog_resets, 1u);
+  EXPECT_FALSE(card::counters().watchdog_running);
+
+  EXPECT_EQ(board_command(driver::kBoardWatchdogOn), driver::kBoardWatchdogOnReply);
+  EXPECT_EQ(board_command(driver::kBoardWatchdogOff), driver::kBoardWatchdogOffReply);
+  card::advance(120s);
+  EXPECT_EQ(card::counters().watchdog_resets, 1u);
+}
+
+/// A card whose time runs by itself.
+class RunningClock : public CardTest {
+ protected:
+  void run(card::ClockMode mode, double speed) {
+    close_nodes();
+    card::set_clock(mode, speed);
+    open_nodes();
+  }
+};
+
+TEST_F(RunningClock, FramesComeByThemselvesAndEndWithTheLastClose) {
+  for (const auto mode : {card::ClockMode::real_time, card::ClockMode::fast}) {
+    run(mode, 4.0);
+    encode_channel(0);
+    const auto made = card::counters().mpeg4.made;
+    EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+    EXPECT_TRUE(wait_for([&] { return card::counters().mpeg4.made >= made + 10; }));
+    close_nodes();
+    const auto at_close = card::counters().mpeg4.made;
+    open_nodes();
+    EXPECT_FALSE(card::counters().mpeg4.made > at_close)
+        << "an open card encodes without having been started";
+  }
+}
+
+// A card that cannot keep up must lose frames and count them, not fall further and further behind.
+TEST_F(RunningClock, WhatComesTooLateIsLostAndCounted) {
+  run(card::ClockMode::fast, 1000);
+  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) encode_channel(channel);
+  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+  EXPECT_TRUE(wait_for([&] {
+    read_mpeg4();
+    read_mjpeg();
+    return card::counters().mpeg4.lost > 10000;
+  }));
+  EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0);
+}
+
+}  // namespace

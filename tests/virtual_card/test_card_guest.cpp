@@ -1,0 +1,234 @@
+// The library as a guest in a program: which calls it takes, which it leaves alone, and how.
+
+#include <sys/stat.h>
+#include <sys/wait.h>
+
+#include <cstring>
+#include <functional>
+
+#include "card_fixture.h"
+
+extern "C" {
+int __open_2(const char *path, int flags);
+int __open64_2(const char *path, int flags);
+int __openat_2(int directory, const char *path, int flags);
+int __openat64_2(int directory, const char *path, int flags);
+ssize_t __read_chk(int fd, void *buffer, size_t count, size_t buffer_size);
+}
+
+namespace {
+
+constexpr int kUntouched = 4242;  // no call sets errno to this
+
+struct Spelling {
+  const char *name;
+  std::function<int(const char *path, int flags)> open;
+};
+const Spelling kSpellings[] = {
+    {"open", [](const char *path, int flags) { return open(path, flags, 0640); }},
+    {"open64", [](const char *path, int flags) { return open64(path, flags, 0640); }},
+    {"openat", [](const char *path, int flags) { return openat(AT_FDCWD, path, flags, 0640); }},
+    {"openat64", [](const char *path, int flags) { return openat64(AT_FDCWD, path, flags, 0640); }},
+    {"__open_2", [](const char *path, int flags) { return __open_2(path, flags); }},
+    {"__open64_2", [](const char *path, int flags) { return __open64_2(path, flags); }},
+    {"__openat_2", [](const char *path, int flags) { return __openat_2(AT_FDCWD, path, flags); }},
+    {"__openat64_2", [](const char *path, int flags) { return __openat64_2(AT_FDCWD, path, flags); }},
+};
+
+class Guest : public CardTest {
+ protected:
+  void SetUp() override {
+    CardTest::SetUp();
+    path_ = ::testing::TempDir() + "card_guest_" + std::to_string(getpid());
+    file = open(path_.c_str(), O_RDWR | O_CREAT | O_TRUNC, 0640);
+    ASSERT_EQ(write(file, "ordinary", 8), 8);
+  }
+  void TearDown() override {
+    close(file);
+    unlink(path_.c_str());
+    CardTest::TearDown();
+  }
+  static std::string content(int fd) {
+    char text[8] = {};
+    lseek(fd, 0, SEEK_SET);
+    return std::string(text, static_cast<std::size_t>(std::max<ssize_t>(0, read(fd, text, sizeof text))));
+  }
+
+  int file = -1;
+  std::string path_;
+};
+
+// A spelling that is not taken would open a real node; one that is not passed on breaks the host.
+TEST_F(Guest, EverySpellingOfOpenReachesTheCardOrTheFile) {
+  for (const Spelling &spelling : kSpellings) {
+    SCOPED_TRACE(spelling.name);
+    errno = kUntouched;
+    const int node = spelling.open(driver::kEncoderNode, O_RDWR);
+    EXPECT_EQ(card::open_descriptors(), 5);
+    EXPECT_EQ(close(node), 0);
+    EXPECT_EQ(card::open_descriptors(), 4);
+    const int ordinary = spelling.open(path_.c_str(), O_RDONLY);
+    EXPECT_EQ(content(ordinary), "ordinary");
+    EXPECT_EQ(close(ordinary), 0);
+    EXPECT_EQ(errno, kUntouched);
+    EXPECT_EQ(answer(spelling.open("/nowhere/at/all", O_RDONLY)), -ENOENT);
+    for (const char *absent : {driver::kDecoderNode, "/dev/zarvo_enc1", "/dev/zarvo_"})
+      EXPECT_EQ(answer(spelling.open(absent, O_RDWR)), -ENOENT) << absent;
+  }
+}
+
+TEST_F(Guest, OtherCallsPassThroughUntouched) {
+  struct stat status {};
+  ASSERT_EQ(fstat(file, &status), 0);
+  EXPECT_EQ(status.st_mode & 0777, 0640u) << "the mode of open() got lost";
+
+  char text[8];
+  lseek(file, 0, SEEK_SET);
+  errno = kUntouched;
+  EXPECT_EQ(__read_chk(file, text, sizeof text, sizeof text), 8);
+  void *mapped = mmap64(nullptr, 8, PROT_READ, MAP_SHARED, file, 0);
+  EXPECT_EQ(std::memcmp(mapped, "ordinary", 8), 0);
+  EXPECT_EQ(munmap(mapped, 8), 0);
+  EXPECT_EQ(errno, kUntouched);
+  EXPECT_EQ(card::open_mappings(), 0);
+
+  int bytes = 0;
+  int ends[2];
+  ASSERT_EQ(pipe(ends), 0);
+  EXPECT_EQ(ioctl(ends[0], FIONREAD, &bytes), 0);
+  EXPECT_EQ(close(ends[0]) + close(ends[1]), 0);
+  EXPECT_EQ(answer(close(-1)), -EBADF);
+  EXPECT_EQ(answer(read(-1, text, 1)), -EBADF);
+  EXPECT_EQ(answer(ioctl(-1, FIONREAD, &bytes)), -EBADF);
+  EXPECT_EQ(answer(dup(-1)), -EBADF);
+  EXPECT_EQ(answer(fcntl(-1, F_GETFD)), -EBADF);
+}
+
+TEST_F(Guest, ErrnoChangesOnlyOnFailureAndCodesAreCutTo32Bits) {
+  u32 width = 0;
+  errno = kUntouched;
+  EXPECT_EQ(ioctl(display, 0xFFFFFFFF00000000ul | driver::DISP_IOC_GET_WIDTH, &width), 0);
+  EXPECT_EQ(width, 720u);
+  EXPECT_EQ(read_mpeg4(), 0);
+  void *region = mmap(nullptr, driver::kStreamRegionSize, PROT_READ, MAP_SHARED, encoder, 0);
+  EXPECT_EQ(munmap(region, driver::kStreamRegionSize), 0);
+  EXPECT_EQ(errno, kUntouched);
+}
+
+TEST_F(Guest, DuplicatesAreNodesToo) {
+  const std::function<int(int)> ways[] = {
+      [](int fd) { return dup(fd); },
+      [](int fd) { return dup2(fd, 200); },
+      [](int fd) { return dup3(fd, 200, O_CLOEXEC); },
+      [](int fd) { return fcntl(fd, F_DUPFD, 100); },
+      [](int fd) { return fcntl(fd, F_DUPFD_CLOEXEC, 100); },
+      [](int fd) { return dup2(fd, fd); },
+  };
+  for (const auto &way : ways) {
+    const int original = open(driver::kDisplayNode, O_RDWR);
+    const int copy = way(original);
+    EXPECT_EQ(card::open_descriptors(), copy == original ? 5 : 6);
+    if (copy != original) close(original);
+    u32 width = 0;
+    EXPECT_EQ(send(copy, driver::DISP_IOC_GET_WIDTH, width), 0);
+    EXPECT_EQ(close(copy), 0);
+    EXPECT_EQ(card::open_descriptors(), 4);
+  }
+}
+
+// A number that the card still takes for its own would swallow the calls on somebody else's file.
+TEST_F(Guest, ANumberThatWasReplacedOrClosedIsNoLongerTheCards) {
+  const int replaced = open(driver::kEncoderNode, O_RDWR);
+  ASSERT_EQ(dup2(file, replaced), replaced);
+  EXPECT_EQ(content(replaced), "ordinary");
+  close(replaced);
+
+  const int closed = fcntl(encoder, F_DUPFD, 500);
+  ASSERT_EQ(close_range(500, 600, 0), 0);
+  ASSERT_EQ(fcntl(file, F_DUPFD, 500), closed);
+  EXPECT_EQ(content(closed), "ordinary");
+  closefrom(500);
+  EXPECT_EQ(read_node(closed, nullptr, 0), -EBADF);
+  EXPECT_EQ(card::open_descriptors(), 4);
+}
+
+TEST_F(Guest, CloseOnExecFollowsTheOpenFlags) {
+  const int kept = open(driver::kAudioNode, O_RDWR);
+  EXPECT_EQ(fcntl(kept, F_GETFD), 0);
+  EXPECT_EQ(fcntl(encoder, F_GETFD), FD_CLOEXEC);
+  close(kept);
+}
+
+TEST_F(Guest, MappingsFollowTheNodesRules) {
+  const struct {
+    int fd;
+    std::size_t length;
+    int protection;
+    int flags;
+    off_t offset;
+    long result;
+  } cases[] = {
+      {encoder, driver::kStreamRegionSize, PROT_READ | PROT_WRITE, MAP_SHARED, 0, 0},
+      {encoder, driver::kStreamRegionSize + 1, PROT_READ, MAP_SHARED, 0, -EINVAL},
+      {encoder, driver::kStreamRegionSize, PROT_READ, MAP_SHARED, 4096, -EINVAL},
+      {encoder, 4096, PROT_READ, MAP_PRIVATE, 0, -EINVAL},
+      {display, driver::kPreviewBufferSize, PROT_READ, MAP_SHARED, 0, 0},
+      {display, driver::kPreviewBufferSize, PROT_READ | PROT_WRITE, MAP_SHARED, 0, -EACCES},
+      {display, driver::kPreviewBufferSize + 1, PROT_READ, MAP_SHARED, 0, -EINVAL},
+      {audio, 4096, PROT_READ, MAP_SHARED, 0, -ENODEV},
+      {video_input, 4096, PROT_READ, MAP_SHARED, 0, -ENODEV},
+  };
+  for (const auto &each : cases) {
+    SCOPED_TRACE(&each - cases);
+    void *mapped = mmap(nullptr, each.length, each.protection, each.flags, each.fd, each.offset);
+    EXPECT_EQ(mapped == MAP_FAILED ? -errno : 0, each.result);
+    EXPECT_EQ(card::open_mappings(), mapped == MAP_FAILED ? 0 : 1);
+    if (mapped != MAP_FAILED) {
+      EXPECT_EQ(munmap(mapped, each.length), 0);
+    }
+    EXPECT_EQ(card::open_mappings(), 0);
+  }
+}
+
+// The card writes through a mapping of its own: it must neither go with the last descriptor, which the
+// host closes before it unmaps, nor leave a stale region behind for the next open.
+TEST_F(Guest, TheRegionLivesAsLongAsItIsMapped) {
+  auto *first = static_cast<u8 *>(
+      mmap(nullptr, driver::kStreamRegionSize, PROT_READ | PROT_WRITE, MAP_SHARED, encoder, 0));
+  close_nodes();
+  first[0] = 77;
+  open_nodes();
+  card::queue_mpeg4({{1, 2, 3}, 64});
+  EXPECT_EQ(read_mpeg4(), 64);
+  EXPECT_THAT(std::vector<u8>(first, first + 4), ::testing::ElementsAre(1, 2, 3, 0));
+  munmap(first, driver::kStreamRegionSize);
+}
+
+#if defined(__SANITIZE_THREAD__)
+constexpr bool kThreadsAfterFork = false;  // ThreadSanitizer ends a forked child that starts a thread
+#else
+constexpr bool kThreadsAfterFork = true;
+#endif
+
+// A child has the descriptors but none of the card's threads: waiting for them would hang it.
+TEST_F(Guest, AForkedChildLosesTheCardAndCanOpenItsOwn) {
+  const pid_t child = fork();
+  if (child == 0) {
+    bool good = card::open_descriptors() == 0 && send(encoder, driver::ENC_IOC_START) == -ENODEV &&
+                read_mpeg4() == -ENODEV && close(encoder) == 0 && answer(close(encoder)) == -EBADF &&
+                content(file) == "ordinary";
+    if (kThreadsAfterFork) {
+      const int own = open(driver::kDisplayNode, O_RDWR);
+      u32 width = 0;
+      good = good && own >= 0 && send(own, driver::DISP_IOC_GET_WIDTH, width) == 0 && close(own) == 0;
+    }
+    _exit(good ? 0 : 1);
+  }
+  int status = -1;
+  ASSERT_EQ(waitpid(child, &status, 0), child);
+  EXPECT_EQ(status, 0);
+  EXPECT_EQ(card::open_descriptors(), 4);
+  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+}
+
+}  // namespace
