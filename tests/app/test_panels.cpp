@@ -1,0 +1,83 @@
+#include "dialog_fixture.h"
+
+namespace {
+
+using Panels = DialogTest;
+
+TEST_F(Panels, WhatIsTypedReachesTheSdkOrIsRefused) {
+  dialog->comboMotionArea->setCurrentIndex(4);
+  dialog->checkMotionArea->setChecked(true);
+  QLineEdit *const edits[] = {dialog->edtLeft,  dialog->edtRight,      dialog->edtTop,  dialog->edtBottom,
+                              dialog->edtMLeft, dialog->edtMRight,     dialog->edtMTop, dialog->edtMBottom,
+                              dialog->edtFocus, dialog->edtSensitivity};
+  for (const auto &[text, value] : kTypedNumbers) {
+    SCOPED_TRACE(text);
+    for (QLineEdit *edit : edits) edit->setText(text);
+    const std::string number = std::to_string(value);
+    const int channel = static_cast<int>(static_cast<unsigned>(value) - 1u);
+    const auto expect = [&, typed = value](QPushButton *button, const std::string &lines, const char *call,
+                                           bool refused) {
+      const std::string error = std::string("ERROR:zv_") + call + " Error!\n";
+      EXPECT_EQ(printed_by([&] { button->click(); }), lines + (refused ? error : "")) << typed;
+    };
+    expect(dialog->btnSetSensitivity, "Channel 0 :Set Sensitivity = " + number + "\n", "SetMotionSensitivity",
+           value < 0);
+    expect(dialog->btnSetFocus, "Set Focus channel = " + std::to_string(channel) + "\n", "SetFocusChannel",
+           channel < 0 || channel > 15);
+    expect(dialog->btnSetShield, "", "SetShieldRect", value < 0);
+    std::string lines = "Mark : 1\n";
+    for (const char *edge : {"Left= ", "Right= ", "Top= ", "Bottom= "}) {
+      lines += std::string("channel 4 : ") + edge + number + "\n";
+    }
+    expect(dialog->btnSetMotionArea, lines, "MarkMotionArea", value < 0);
+    for (const QLineEdit *edit : edits) EXPECT_EQ(edit->text(), text);
+  }
+}
+
+TEST_F(Panels, SettingsComeBackFromTheCard) {
+  dialog->comboShield->setCurrentIndex(3);
+  QLineEdit *const edits[] = {dialog->edtLeft,   dialog->edtRight,     dialog->edtTop,
+                              dialog->edtBottom, dialog->edtFocus,     dialog->edtSensitivity,
+                              dialog->edtHue,    dialog->edtSaturation};
+  const char *const typed[] = {"80", "240", "40", "160", "5", "768", "90", "7"};
+  for (int n = 0; n < 8; ++n) edits[n]->setText(typed[n]);
+  for (auto *set : {dialog->btnSetShield, dialog->btnSetFocus, dialog->btnSetSensitivity}) set->click();
+  EXPECT_EQ(printed_by([&] { dialog->btnSetProperty->click(); }),
+            "Hue = 90\nSaturation = 7\nContrast = 100\nBrightness = 0\n");
+  for (QLineEdit *edit : edits) edit->clear();
+  for (auto *get : {dialog->btnGetShield, dialog->btiGetFocus, dialog->btnGetProperty}) get->click();
+  EXPECT_EQ(printed_by([&] { dialog->btnGetSensitivity->click(); }), "Channel 0 :Get Sensitivity = 768\n");
+  for (int n = 0; n < 8; ++n) EXPECT_EQ(edits[n]->text(), typed[n]);
+  EXPECT_EQ(dialog->sliderHue->value(), 90);
+
+  // A failed read: only the mask shows its fill value, and the picture sliders go to 0.
+  for (QComboBox *none : {dialog->comboShield, dialog->comboProperty, dialog->comboMotion}) {
+    none->setCurrentIndex(-1);
+  }
+  EXPECT_EQ(printed_by([&] {
+              for (auto *get : {dialog->btnGetShield, dialog->btnGetProperty, dialog->btnGetSensitivity}) {
+                get->click();
+              }
+            }),
+            "ERROR:zv_GetShieldRect Error!\nERROR:zv_GetVideoProperty Error!\n"
+            "ERROR:zv_GetMotionSensitivity Error!\n");
+  EXPECT_EQ(dialog->edtBottom->text(), "151587081");
+  EXPECT_EQ(dialog->edtSensitivity->text(), "768");
+  EXPECT_EQ(dialog->sliderHue->value(), 0);
+}
+
+TEST_F(Panels, SlidersAndEditsFollowEachOther) {
+  dialog->edtHue->setText("500");
+  EXPECT_EQ(dialog->edtHue->text(), "180");
+  dialog->edtHue->setText("500");  // the slider stands at its end already
+  EXPECT_EQ(
+      printed_by([&] { dialog->btnSetProperty->click(); }),
+      "Hue = 500\nSaturation = 100\nContrast = 100\nBrightness = 0\nERROR:zv_SetVideoProperty Error!\n");
+  dialog->edtHue->setText("0");
+  dialog->edtBrightness->setText("-");
+  dialog->sliderSaturation->setValue(50);
+  EXPECT_EQ(dialog->edtSaturation->text(), "50");
+  EXPECT_EQ(dialog->edtBrightness->text(), "0");
+}
+
+}  // namespace
