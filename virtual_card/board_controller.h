@@ -18,8 +18,8 @@ class BoardController {
   /// Carries a command out and answers it; commands it does not know answer 0.
   u32 command(u32 command, nanoseconds now);
   void set_version(u32 reply) { version_ = reply; }
-  /// The next commands with this code are answered from the list. They are carried out all the same
-  /// only if the reply is the one that says so.
+  /// The next commands with this code are answered from the list, and carried out only when the reply
+  /// is the one that confirms them.
   void script(u32 command, const std::vector<u32> &replies);
 
   /// True once, when the watchdog has run out.

@@ -72,6 +72,7 @@ void set_scene(unsigned channel, Scene scene) {
 }
 
 bool show_film(unsigned channel, const std::string &path, std::string *error) {
+  if (channel >= kChannels) throw std::out_of_range("channel");
   return board().engine.show_film(channel, path, error);
 }
 

@@ -4,7 +4,8 @@
  * benchmarks. Programs that only use the card never need this header.
  *
  * All functions may be called from any thread. The card of this process is made at the first use of
- * a device node or of this interface.
+ * a device node or of this interface, with the options of the environment variable ZARVO_VIRTUAL_CARD.
+ * A channel or input that does not exist throws std::out_of_range.
  */
 #ifndef VIRTUAL_CARD_H
 #define VIRTUAL_CARD_H
@@ -23,7 +24,8 @@ namespace virtual_card {
 // --- Power -------------------------------------------------------------------------------------
 
 /// The card as built: power-up registers, all cameras plugged and moving, real-time clock, empty
-/// queues, no faults, no log, counters zero. Only while no device node is open.
+/// queues, no faults, no log, counters zero, no options. Only while no device node is open, else it
+/// says so on standard error and does nothing.
 void reset();
 
 /// Number of descriptors on device nodes, and of mappings of their regions, now in use.
@@ -38,11 +40,13 @@ enum class ClockMode {
   manual      ///< card time stands still until advance()
 };
 
-/// Only while no device node is open.
+/// Card time begins at 0 again. Only while no device node is open, as reset(). `speed` counts with
+/// ClockMode::fast only.
 void set_clock(ClockMode mode, double speed = 1.0);
 
 /// Manual clock: moves card time on, and returns when everything that became due has been drawn,
-/// encoded and queued.
+/// encoded and queued. What is due at the very end of the time is not reached yet. Nothing happens
+/// with the other clocks.
 void advance(std::chrono::microseconds time);
 /// Manual clock: advance() by whole frames of the current standard, without rounding drift.
 void advance_frames(int frames);
@@ -81,9 +85,10 @@ ReadyFrame mpeg4_frame(unsigned channel, unsigned type, const std::vector<std::u
 ReadyFrame mjpeg_frame(unsigned channel, unsigned width, unsigned height,
                        const std::vector<std::uint8_t> &scan);
 
+/// Frames wait in the stream's queue, in turn with the card's own; a full queue loses them.
 void queue_mpeg4(ReadyFrame frame);
 void queue_mjpeg(ReadyFrame frame);
-/// Four blocks of 48 bytes, or whatever is given.
+/// Four blocks of 48 bytes, or whatever is given; 192 bytes at most reach the host.
 void queue_audio(ReadyFrame blocks);
 /// The preview read stores `index` and returns `result`, once.
 void queue_preview(std::uint32_t index, long result);
@@ -94,7 +99,7 @@ struct Supply {
   std::vector<ReadyFrame> mpeg4;
   std::vector<ReadyFrame> mjpeg;
   std::vector<ReadyFrame> audio;
-  double video_rate = 0;  ///< frames a second of card time over all channels; 0: as fast as they are read
+  double video_rate = 0;  ///< frames of each stream a second of card time; 0: as fast as they are read
   double audio_rate = 0;  ///< blocks of four a second of card time; 0: as fast as they are read
   std::uint64_t limit = ~std::uint64_t{0};
 };
@@ -114,7 +119,8 @@ void set_video_input_register(std::uint32_t address, std::uint32_t value);
 std::uint8_t decoder_register(unsigned chip, unsigned address);
 void set_decoder_register(unsigned chip, unsigned address, std::uint8_t value);
 
-/// The board controller answers the next commands with these replies, one each, then for itself again.
+/// The board controller answers the next commands of this code with these replies, one each, then for
+/// itself again. A command is carried out only when its reply is the one that confirms it.
 void script_board_replies(std::uint32_t command, std::vector<std::uint32_t> replies);
 /// The board revision that command 0x3A answers: 0x00, 0xBB, 0xCC or 0xDD.
 void set_board_version(std::uint32_t reply);
@@ -138,7 +144,7 @@ struct Command {
   std::size_t size = 0;      ///< read: count; mmap and munmap: length
   int protection = 0;        ///< mmap
   int flags = 0;             ///< open and mmap
-  long result = 0;
+  long result = 0;           ///< as the host got it; 0 for a mapping
 };
 
 /// Starts the log afresh, or ends it. It is off at first.
@@ -150,6 +156,8 @@ std::vector<Command> log();
 
 /// Makes an operation on the device nodes fail: the `countdown`-th matching one from now (1 is the
 /// next), once or from then on for good. `device` none matches every node, `code` 0 every command.
+/// The operation then does nothing, but for close, which reports the error and closes the descriptor
+/// all the same, as Linux does.
 struct Fault {
   Operation operation;
   int countdown = 1;
