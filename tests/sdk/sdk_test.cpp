@@ -46,8 +46,10 @@ std::mutex delivery_mutex;
 std::condition_variable delivered;
 std::vector<Delivery> delivery_list;
 
-void keep(char stream, const u8 *area, u32 channel, const u8 *data, i32 length, i32 flags) {
-  const Delivery delivery{stream, channel, data - area, Bytes(data, data + length), flags};
+void keep(const char *stream, const u8 *area, u32 channel, const u8 *data, i32 length, i32 flags) {
+  char summary[80];
+  std::snprintf(summary, sizeof summary, "%s %u %td %d %x", stream, channel, data - area, length, flags);
+  const Delivery delivery{summary, Bytes(data, data + length)};
   if (on_delivery) on_delivery(delivery);
   const std::lock_guard lock(delivery_mutex);
   delivery_list.push_back(delivery);
@@ -65,7 +67,14 @@ std::string cmd(std::uint32_t code, const Words &words) {
   char text[32];
   std::snprintf(text, sizeof text, "%08x", code);
   std::string line = text;
-  for (std::uint32_t word : words) line += " " + std::to_string(word);
+  // Register accesses in hexadecimal, sizes and places in decimal.
+  static const Words kRegisters = {0xC008640E, 0xC008640F, 0xC0087605, 0xC0087606,
+                                   0xC0037607, 0xC0037608, 0xC008760A, 0xC008650E};
+  const bool hex = std::find(kRegisters.begin(), kRegisters.end(), code) != kRegisters.end();
+  for (std::uint32_t word : words) {
+    std::snprintf(text, sizeof text, hex ? " %x" : " %u", word);
+    line += text;
+  }
   return line;
 }
 
@@ -76,6 +85,12 @@ Lines issued() {
       lines.push_back(describe(command));
   vc::record_log(true);
   return lines;
+}
+
+std::string sent() {
+  std::string text;
+  for (const std::string &line : issued()) text += (text.empty() ? "" : "; ") + line;
+  return text;
 }
 
 Lines operations() {
@@ -112,6 +127,7 @@ Faults faults;
 
 void Faults::reset() {
   malloc_countdown = thread_countdown = live_allocations = 0;
+  clock_reads = 0;
   struck = false;
 }
 
@@ -143,7 +159,8 @@ int __wrap_pthread_create(pthread_t *thread, const pthread_attr_t *attributes, v
 }
 int __wrap_clock_gettime(clockid_t clock, timespec *now) {
   const int result = __real_clock_gettime(clock, now);
-  now->tv_sec += faults.clock_ahead_ms / 1000;
+  now->tv_sec += faults.clock_ahead;
+  ++faults.clock_reads;
   return result;
 }
 }
@@ -155,19 +172,25 @@ std::vector<Delivery> deliveries() {
   return delivery_list;
 }
 
+Lines summaries() {
+  Lines lines;
+  for (const Delivery &delivery : deliveries()) lines.push_back(delivery.summary);
+  return lines;
+}
+
 bool wait_for_deliveries(std::size_t number) {
   std::unique_lock lock(delivery_mutex);
   return delivered.wait_for(lock, std::chrono::seconds(30), [&] { return delivery_list.size() >= number; });
 }
 
 void mpeg4_callback(u32 channel, u8 *data, i32 length, i32 flags) {
-  keep('m', zarvo::mpeg4_buf, channel, data, length, flags);
+  keep("m", zarvo::mpeg4_buf, channel, data, length, flags);
 }
 void mjpeg_callback(u32 channel, u8 *data, i32 length, i32 flags) {
-  keep('j', zarvo::mjpeg_buf, channel, data, length, flags);
+  keep("j", zarvo::mjpeg_buf, channel, data, length, flags);
 }
 void audio_callback(u32 channel, u8 *data, i32 length, i32 flags) {
-  keep('a', zarvo::audio_buf, channel, data, length, flags);
+  keep("a", zarvo::audio_buf, channel, data, length, flags);
 }
 
 void CardTest::SetUp() {

@@ -27,6 +27,8 @@ using Bytes = std::vector<std::uint8_t>;
 std::string cmd(std::uint32_t code, const Words &words = {});
 /// The commands since the last call, without those the data threads repeat all the time.
 Lines issued();
+/// The same in one line, with "; " between the commands.
+std::string sent();
 /// Everything done to the device nodes since the log was started.
 Lines operations();
 std::size_t count(const Lines &lines, const std::string &line);
@@ -42,22 +44,22 @@ struct Faults {
   int malloc_countdown = 0;
   int thread_countdown = 0;
   bool struck = false;
-  int live_allocations = 0;  ///< since reset()
-  std::atomic<std::int64_t> clock_ahead_ms{0};
+  int live_allocations = 0;         ///< since reset()
+  std::atomic<int> clock_ahead{0};  ///< seconds on the SDK's monotonic clock
+  std::atomic<int> clock_reads{0};
   void reset();
 };
 extern Faults faults;
 
-/// A frame or block that a callback got.
+/// A frame or block that a callback got: "stream channel offset length flags", where the stream is m, j
+/// or a, the offset is that in the stream's area, and the flags are hexadecimal; and the data.
 struct Delivery {
-  char stream;  ///< 'm' MPEG-4, 'j' Motion JPEG, 'a' audio
-  u32 channel;
-  std::ptrdiff_t offset;  ///< in the stream's area
+  std::string summary;
   Bytes data;
-  i32 flags;
 };
 /// The callbacks, and what they got. `on_delivery` runs inside the callback.
 std::vector<Delivery> deliveries();
+Lines summaries();
 bool wait_for_deliveries(std::size_t number);
 extern std::function<void(const Delivery &)> on_delivery;
 void mpeg4_callback(u32 channel, u8 *data, i32 length, i32 flags);
