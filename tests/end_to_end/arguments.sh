@@ -32,10 +32,10 @@ refused 2 'requires an argument' --scale
 refused 1 'frame-rate budget' --scale d1 --channels 1-5
 refused 1 '/dev/null/x' --output /dev/null/x
 
-# A device that is always full: a write error must not end as success.
+# A device that is always full: a write error must not end as success. It ends the recording at once.
 mkdir "$FOLDER/full"
 ln -s /dev/full "$FOLDER/full/ch01.m4v"
-refused 1 'No space left' --channels 1 --output full
+refused 1 'No space left' --seconds 60 --channels 1 --output full
 
 # The card refuses options that it cannot understand, on standard error only.
 for option in speed=fast lost=17 nonsense=1 camera3=/nowhere.mp4; do
