@@ -84,10 +84,17 @@ void Board::write_decoder(unsigned chip, unsigned address, u8 value) {
 void Board::stop_encoding() {
   settings.state.encoding = false;
   encoding = false;
+  ++settings.session;
   for (Stream *stream : {&mpeg4, &mjpeg, &audio}) {
     stream->queue.clear();
     stream->queue.wake();
   }
+}
+
+void Board::drop_frames_of_other_session(u32 session) {
+  const std::lock_guard lock(mutex);
+  if (session == settings.session) return;
+  for (Stream *stream : {&mpeg4, &mjpeg, &audio}) stream->queue.clear();
 }
 
 void Board::last_close() {

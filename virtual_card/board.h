@@ -32,6 +32,7 @@ struct Settings {
   std::array<u16, kChannels> motion_level{};
   std::optional<u32> scripted_motion;
   u32 selected_buffer = 0;
+  u32 session = 0;                                     ///< counts starts and stops of encoding
   nanoseconds encoding_since{0};                       ///< card time of ENC_IOC_START
   nanoseconds supplied_since{0};                       ///< card time at which a supply was set
   std::deque<std::pair<u32, long>> scripted_previews;  ///< index and result of the next preview reads
@@ -62,6 +63,9 @@ struct Board {
   void write_decoder(unsigned chip, unsigned address, u8 value);
   /// What ENC_IOC_STOP does. Needs `mutex`.
   void stop_encoding();
+  /// Drops what was encoded in another session than this one: a stop can come while a field is being
+  /// encoded, and its frames must not open the next recording.
+  void drop_frames_of_other_session(u32 session);
   /// What a driver does when its last node is closed: nothing is left running.
   void last_close();
   /// Back to the card's own encoders.

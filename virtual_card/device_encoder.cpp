@@ -132,6 +132,7 @@ long EncoderDevice::start() {
   if (board_.encoding) return 0;
   board_.settings.encoding_since = board_.clock.now();
   board_.settings.state.encoding = true;
+  ++board_.settings.session;
   board_.encoding = true;
   return 0;
 }

@@ -72,9 +72,9 @@ long close_node(int fd) {
   const Owner was = descriptors::remove(fd);
   if (was.device == Device::none) return real::close(fd) == 0 ? 0 : -errno;
   const long result = Card::instance().close(was.device);
-  const bool closed = real::close(fd) == 0;
+  const long error = real::close(fd) == 0 ? 0 : -errno;
   Card::instance().closed();
-  return closed ? result : -errno;
+  return error != 0 ? error : result;
 }
 
 /// A second descriptor of the same node.

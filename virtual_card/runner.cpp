@@ -97,8 +97,9 @@ void Runner::run_until(nanoseconds time) {
   watch(time);
 }
 
-CardState Runner::snapshot() {
+CardState Runner::snapshot(u32 *session) {
   const std::lock_guard lock(board_.mutex);
+  if (session != nullptr) *session = board_.settings.session;
   return board_.settings.state;
 }
 
@@ -146,19 +147,25 @@ void Runner::run(const Next &next) {
 }
 
 void Runner::run_field() {
-  CardState state = snapshot();
+  u32 session = 0;
+  CardState state = snapshot(&session);
   const bool supplied = board_.supplied;
   if (supplied) state.encoding = false;
   const nanoseconds due = fields_.due(field_);
   board_.engine.field(state, {field_, board_.clock.wall(due)});
+  if (state.encoding) board_.drop_frames_of_other_session(session);
   if (field_ % 2 != 0 && state.display.on) compose(state);
   ++field_;
   watch(due);
 }
 
 void Runner::run_audio_block() {
-  const CardState state = snapshot();
-  if (state.encoding && !board_.supplied) board_.engine.audio_block(state, audio_block_);
+  u32 session = 0;
+  const CardState state = snapshot(&session);
+  if (state.encoding && !board_.supplied) {
+    board_.engine.audio_block(state, audio_block_);
+    board_.drop_frames_of_other_session(session);
+  }
   ++audio_block_;
 }
 

@@ -52,7 +52,8 @@ class Runner {
   void run_audio_block();
   void compose(const CardState &state);
   void watch(nanoseconds now);
-  CardState snapshot();
+  /// The settings now, and the encoding session they belong to.
+  CardState snapshot(u32 *session = nullptr);
   nanoseconds pace_due(Pace &pace, const CardState &state);
   /// Leaves out what is long overdue and counts what that loses.
   void skip_to(nanoseconds now);

@@ -115,6 +115,23 @@ TEST_F(RunningClock, FramesComeByThemselvesAndEndWithTheLastClose) {
   }
 }
 
+// A frame that was being encoded when the stop came would open the next recording, with no intra frame
+// before it.
+TEST_F(RunningClock, AStopInTheMiddleOfAFieldLeavesNoFrameBehind) {
+  run(card::ClockMode::fast, 4.0);
+  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) encode_channel(channel);
+  for (int round = 0; round < 10; ++round) {
+    const auto made = card::counters().mpeg4.made;
+    EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+    EXPECT_TRUE(wait_for([&] { return card::counters().mpeg4.made > made; }));
+    EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0);
+    close_nodes();  // returns when the field is finished
+    open_nodes();
+    EXPECT_EQ(read_mpeg4(), 0);
+    EXPECT_EQ(read_mjpeg(), 0);
+  }
+}
+
 // A card that cannot keep up must lose frames and count them, not fall further and further behind.
 TEST_F(RunningClock, WhatComesTooLateIsLostAndCounted) {
   run(card::ClockMode::fast, 1000);
