@@ -203,9 +203,10 @@ TEST_F(Recording, OnlyAFolderOneCanEnterBecomesTheRoot) {
     dialog->btnRecordStop->click();
     EXPECT_THAT(files(), ElementsAre(root + "/Video/20090303/CH16/20090303-14.rec"));
   }
-  fs::create_directory(deepest + "f");
+  const std::string too_deep = deepest + "f";
+  fs::create_directory(too_deep);
   for (const std::string root :
-       {"", "~", "missing", "file", "file/..", "a b; echo", (deepest + "f").c_str()}) {
+       {"", "~", "missing", "file", "file/..", "a b; echo", too_deep.c_str()}) {
     EXPECT_FALSE(enter(root)) << root;
   }
 }
