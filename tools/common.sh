@@ -52,7 +52,7 @@ use_card() {
   ON_CARD=(env)
   [ ! -e /dev/zarvo_enc0 ] || return 0
   [ -f "$1" ] || die "the virtual card $1 is not built"
-  runtime=$(ldd "$1" | awk '/lib(asan|tsan)\.so/ { print $3; exit }')
+  runtime=$(ldd "$1" | awk '/lib(asan|tsan)\.so/ && !found++ { print $3 }')
   ON_CARD+=("LD_PRELOAD=${runtime:+$runtime:}$1${ZARVO_PRELOAD:+:$ZARVO_PRELOAD}")
 }
 

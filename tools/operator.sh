@@ -120,4 +120,4 @@ process_gone() { ! kill -0 "$1"; }
 rate_near() { local rate; rate=$(preview_rate) && [ "$rate" -ge $(($1 - 2)) ] && [ "$rate" -le $(($1 + 2)) ]; }
 
 # files_closed: whether the program has closed all its recordings.
-files_closed() { ! find "/proc/$DEMO/fd" -lname '*.rec' | grep -q .; }
+files_closed() { [ -z "$(find "/proc/$DEMO/fd" -lname '*.rec')" ]; }
