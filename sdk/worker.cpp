@@ -13,15 +13,19 @@ char cancel_type_failed[] = "ERROR:pthread_setcanceltype failed.\n";
 bool Worker::start(Routine routine, void *argument) {
   void *result = nullptr;
   if (!join(result)) return false;
+  const std::lock_guard lock(mutex_);
   joinable_ = pthread_create(&id_, nullptr, routine, argument) == 0;
   return joinable_;
 }
 
 bool Worker::join(void *&result) {
+  std::unique_lock lock(mutex_);
   if (!joinable_) return true;
-  if (pthread_equal(id_, pthread_self()) != 0 || pthread_join(id_, &result) != 0) return false;
+  if (pthread_equal(id_, pthread_self()) != 0) return false;
   joinable_ = false;
-  return true;
+  const pthread_t id = id_;
+  lock.unlock();
+  return pthread_join(id, &result) == 0;
 }
 
 void *make_cancellable() {

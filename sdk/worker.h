@@ -7,9 +7,11 @@
 
 #include <pthread.h>
 
+#include <mutex>
+
 namespace zarvo {
 
-/// A thread of the SDK. Its owner calls start() and join() from one thread at a time.
+/// A thread of the SDK. Its owner starts and joins it; the thread itself may try to, and is refused.
 class Worker {
  public:
   using Routine = void *(*)(void *);
@@ -19,10 +21,11 @@ class Worker {
   bool start(Routine routine, void *argument);
 
   /// Waits for the thread and keeps its exit value. True when there is nothing to join; false when
-  /// the join fails, as it does on the thread itself: it then stays to be joined later.
+  /// the join fails. On the thread itself it fails at once, and the thread stays to be joined later.
   bool join(void *&result);
 
  private:
+  std::mutex mutex_;  ///< guards the two below; not held while waiting for the thread
   pthread_t id_{};
   bool joinable_ = false;
 };

@@ -193,6 +193,11 @@ bool stop_thread(const CaptureThread &thread) {
   return set_run_flag(thread, 0) == 0 || thread.worker.join(thread.result);
 }
 
+bool stop_threads() {
+  const bool video_joined = stop_thread(kVideo);
+  return stop_thread(kAudio) && video_joined;
+}
+
 int start_capture(ZV_CARD &card) {
   if (start_flag != 0) return ZV_OK;
   if (check_encode_config(card) != ZV_OK) return ZV_ERR_CONFIG;
@@ -200,6 +205,8 @@ int start_capture(ZV_CARD &card) {
   const u32 state = read_codec(card, driver::kRegDisplayState);
   write_codec(card, driver::kRegDisplayState, set_bit(state, driver::kDisplayStateBit));
   if (start_thread(kVideo, card) && start_thread(kAudio, card)) {
+    // A callback may have stopped capture before the second thread was there.
+    if (start_flag == 0) stop_threads();
     usleep(1000);
     return ZV_OK;
   }
@@ -226,10 +233,9 @@ int stop_capture(ZV_CARD &card) {
   usleep(kSettle);
   issue_with_zero(card.enc_fd, driver::ENC_IOC_STOP);
   usleep(kSettle);
-  const bool video_joined = stop_thread(kVideo);
-  const bool audio_joined = stop_thread(kAudio);
+  const bool joined = stop_threads();
   clear_header_flags();
-  return video_joined && audio_joined ? ZV_OK : ZV_ERR_THREAD_JOIN;
+  return joined ? ZV_OK : ZV_ERR_THREAD_JOIN;
 }
 
 }  // namespace zarvo

@@ -160,10 +160,12 @@ TEST_F(Capture, NothingArrivesAfterStop) {
 TEST_F(Capture, StopFromACallbackEndsCapture) {
   for (char stream : {'m', 'j', 'a'}) {
     std::atomic<int> status{-1};
+    std::atomic<bool> started{false};
     on_delivery = [&](const Delivery &got) {
-      if (got.summary[0] == stream && status == -1) status = zv_Stop(handle);
+      if (started && got.summary[0] == stream && status == -1) status = zv_Stop(handle);
     };
     start_endless();
+    started = true;
     EXPECT_TRUE(eventually([&] { return status != -1; }));
     EXPECT_EQ(status, ZV_ERR_THREAD_JOIN);
     EXPECT_EQ(zarvo::start_flag, 0);
