@@ -37,6 +37,11 @@ inline bool near(Colour a, Colour b, int tolerance = 12) {
          std::abs(a.cr - b.cr) <= tolerance;
 }
 
+inline Colour pixel_of(const std::vector<u8> &uyvy, u32 width, u32 x, u32 y) {
+  const u8 *pair = uyvy.data() + (std::size_t{y} * width + (x & ~1u)) * 2;
+  return {pair[1 + (x & 1) * 2], pair[0], pair[2]};
+}
+
 /// A frame as the host would get it: what it carries, and the bytes behind the host's header.
 struct Encoded {
   unsigned channel = 0;
@@ -91,10 +96,7 @@ class PictureBench {
     screen.assign(std::size_t{state.width} * state.lines() * 2, 0);
     engine.compose(state, screen);
   }
-  Colour pixel(u32 x, u32 y) const {
-    const u8 *pair = screen.data() + (std::size_t{y} * state.width + (x & ~1u)) * 2;
-    return {pair[1 + (x & 1) * 2], pair[0], pair[2]};
-  }
+  Colour pixel(u32 x, u32 y) const { return pixel_of(screen, state.width, x, y); }
   void window(unsigned number, Area area, u32 flags = ZV_WINDOW_ENABLED) {
     state.display.window[number] = {number,       number,     1,          area.x_start,
                                     area.y_start, area.x_end, area.y_end, flags};

@@ -10,62 +10,29 @@ namespace virtual_card {
 namespace {
 
 constexpr u32 kCif = 2, kD1 = 9;
-constexpr u32 kBackdropX = 85, kBackdropY = 50;  ///< hundredths: nothing but the backdrop, most of the time
-constexpr u32 kBarX = 18, kBarY = 5;             ///< hundredths: the yellow bar
-
-TEST(Cameras, NoTwoOfSixteenLookAlike) {
-  PictureBench bench;
-  for (unsigned i = 0; i < kChannels; ++i) {
-    bench.encode(i, kCif, 1);
-    bench.state.channel[i].scene = Scene::still;
-  }
-  bench.fields(2);
-  std::vector<Decoded> pictures;
-  for (const Encoded &frame : bench.take_jpeg()) pictures.push_back(decode_jpeg(frame));
-  ASSERT_EQ(pictures.size(), kChannels);
-  for (unsigned i = 0; i < kChannels; ++i) {
-    EXPECT_EQ(pictures[i].mark()->channel, i);
-    for (unsigned other = 0; other < i; ++other) {
-      std::size_t different = 0;
-      for (std::size_t at = 0; at < pictures[i].cb.size(); ++at) {
-        if (std::abs(pictures[i].cb[at] - pictures[other].cb[at]) > 8 ||
-            std::abs(pictures[i].cr[at] - pictures[other].cr[at]) > 8) {
-          ++different;
-        }
-      }
-      EXPECT_GT(different, pictures[i].cb.size() / 4) << "channels " << i << " and " << other;
-    }
-  }
-}
+constexpr u32 kBarX = 18, kBarY = 5;  ///< hundredths: the yellow bar
 
 // A camera whose fields are copies of each other, or that moves when it should stand still.
 TEST(Cameras, FieldsAreDrawnAtTheirOwnTimes) {
-  constexpr struct {
-    Scene scene;
-    bool moves;
-  } kCases[] = {{Scene::moving, true}, {Scene::still, false}, {Scene::black, false}};
-  for (const auto &expected : kCases) {
+  for (const Scene scene : {Scene::moving, Scene::still, Scene::black}) {
     Camera camera(6);
     CardState state;
-    state.channel[6].scene = expected.scene;
+    state.channel[6].scene = scene;
     camera.adjust(state);
-    const auto at = [&](std::int64_t field) {
+    const auto lines_at = [&](std::int64_t field, u32 parity) {
       camera.draw(FieldMoment(0, field, std::chrono::microseconds(field * 16683)));
-      return camera.picture().y;
+      std::vector<u8> luma;
+      // Where the object is, without clock and mark.
+      for (u32 y = 80 + parity; y < 380; y += 2)
+        luma.insert(luma.end(), camera.picture().y_line(y), camera.picture().y_line(y + 1));
+      return luma;
     };
-    const auto first = at(100);
-    const auto both = at(101);
-    const auto later = at(102);
-    u32 lines_changed[2] = {};
-    for (u32 line = 80; line < 380; ++line) {  // where the ball is, without clock and mark
-      const auto begin = static_cast<std::ptrdiff_t>(line * 720);
-      if (!std::equal(first.begin() + begin, first.begin() + begin + 720, both.begin() + begin)) {
-        ++lines_changed[line % 2];
-      }
-    }
-    EXPECT_EQ(lines_changed[1] > 0, expected.moves);
-    EXPECT_EQ(lines_changed[0], 0u) << "the bottom field touched the top field's lines";
-    EXPECT_EQ(later != both, expected.moves);
+    const bool moves = scene == Scene::moving;
+    const auto top = lines_at(100, 0);
+    const auto bottom = lines_at(101, 1);
+    EXPECT_EQ(lines_at(101, 0), top) << "the bottom field touched the top field's lines";
+    EXPECT_EQ(lines_at(102, 0) != top, moves);
+    EXPECT_EQ(lines_at(103, 1) != bottom, moves);
   }
 }
 
@@ -140,7 +107,8 @@ TEST(Masks, BlankTheirRectangleInEveryPicture) {
     bench.encode(1, scale, scale == kD1 ? 0 : 1);
     bench.state.channel[1].mask = {1, 144, 432, 120, 464};
     bench.window(1, {0, 0, 360, 240});
-    for (int i = 0; i < 40; ++i) {
+    for (int i = 0; i < 10; ++i) {
+      bench.fields(6);
       const Decoded picture = bench.look(1);
       bench.compose();
       for (const u32 x : {22u, 40u, 58u}) {
@@ -156,24 +124,6 @@ TEST(Masks, BlankTheirRectangleInEveryPicture) {
     bench.state.channel[1].mask = {};
     EXPECT_FALSE(near(bench.look(1).at(22, 28), kMaskGrey));
   }
-}
-
-// A change that waits for the next restart.
-TEST(Cameras, PlugsScenesAndStandardsChangeAtOnce) {
-  PictureBench bench;
-  bench.encode(0, kCif, 1);
-  EXPECT_TRUE(bench.look(0).mark());
-  bench.state.channel[0].lost = true;
-  EXPECT_TRUE(near(bench.look(0).at(kBackdropX, kBackdropY), kLostBlue));
-  bench.state.channel[0].lost = false;
-  bench.state.channel[0].scene = Scene::black;
-  EXPECT_TRUE(near(bench.look(0).at(kBackdropX, kBackdropY), kBlack));
-  bench.state.channel[0].scene = Scene::moving;
-  bench.state.standard = VIDEO_STANDARD_ZV_PAL;
-  bench.state.width = 704;
-  const Decoded pal = bench.look(0);
-  EXPECT_EQ(pal.height, 288u);
-  EXPECT_TRUE(pal.mark());
 }
 
 }  // namespace

@@ -29,17 +29,13 @@ TEST_F(Motion, MovingCamerasAreReportedAndNoOthers) {
   bench_.state.channel[1].scene = Scene::black;
   bench_.state.channel[2].lost = true;
   bench_.state.motion_enable = 0xFFFF & ~8u;
-  for (int look = 0; look < 50; ++look) {
-    const u32 motion = motion_after(kLook);
-    ASSERT_EQ(motion & 0xF, 0u);
-    if (look > 1) {
-      ASSERT_EQ(motion, 0xFFF0u);
-    }
-  }
+  ASSERT_EQ(motion_after(2 * kLook) & 0xF, 0u);
+  for (int look = 0; look < 16; ++look) ASSERT_EQ(motion_after(kLook), 0xFFF0u);
 }
 
 // Settings of the card that would look like a burglar.
 TEST_F(Motion, ChangesOfSettingsAreNoMotion) {
+  bench_.state.motion_enable = kBit;
   bench_.state.channel[kChannel].scene = Scene::still;
   const auto expect_quiet = [&] {
     for (int look = 0; look < 4; ++look) ASSERT_EQ(motion_after(kLook) & kBit, 0u);
@@ -56,7 +52,8 @@ TEST_F(Motion, ChangesOfSettingsAreNoMotion) {
 }
 
 // Levels that work the wrong way round, and areas beside the place they were set for.
-TEST_F(Motion, LevelsAndAreasDecideBlockByBlock) {
+TEST_F(Motion, LevelsAreasAndMasksDecideBlockByBlock) {
+  bench_.state.motion_enable = kBit;
   EXPECT_EQ(motion_after(3 * kLook) & kBit, kBit);
   bench_.engine.set_threshold(kChannel, 250);
   EXPECT_EQ(motion_after(5 * kLook) & kBit, 0u);
@@ -65,20 +62,16 @@ TEST_F(Motion, LevelsAndAreasDecideBlockByBlock) {
   bench_.engine.set_threshold(kChannel, 0xFFFF);
   EXPECT_EQ(motion_after(5 * kLook) & kBit, 0u);
   set_area(0, 0, 45, 4, 0);  // the bars: nothing ever moves there
-  EXPECT_EQ(motion_after(50 * kLook) & kBit, 0u);
+  EXPECT_EQ(motion_after(20 * kLook) & kBit, 0u);
   set_area(40, 28, 64, 64, 0);  // the end of the mark, and far over the map's edge
   EXPECT_EQ(motion_after(3 * kLook) & kBit, kBit);
-}
-
-TEST_F(Motion, MaskedPartsDoNotMove) {
-  bench_.state.channel[kChannel].mask = {kChannel, 0, 720, 0, 480};
+  bench_.state.channel[kChannel].mask = {kChannel, 0, 720, 440, 480};
   EXPECT_EQ(motion_after(5 * kLook) & kBit, 0u);
-  bench_.state.channel[kChannel].mask = {};
-  EXPECT_EQ(motion_after(3 * kLook) & kBit, kBit);
 }
 
 // A report that flickers between looks, never ends, or survives a restart.
 TEST_F(Motion, ReportIsHeldThenEndsAndStartsAfresh) {
+  bench_.state.motion_enable = kBit;
   motion_after(5 * kLook);
   for (int field = 0; field < 3 * kLook; ++field) ASSERT_EQ(motion_after(1) & kBit, kBit);
   bench_.engine.set_threshold(kChannel, 0xFFFF);
@@ -90,7 +83,7 @@ TEST_F(Motion, ReportIsHeldThenEndsAndStartsAfresh) {
   motion_after(5 * kLook);
   bench_.state.motion_enable = 0;
   EXPECT_EQ(motion_after(1), 0u);
-  bench_.state.motion_enable = 0xFFFF;
+  bench_.state.motion_enable = kBit;
   while (!MotionDetector::looks_at(bench_.next)) bench_.fields(1);
   EXPECT_EQ(motion_after(1), 0u) << "one look compares with nothing";
 }
