@@ -160,7 +160,7 @@ TEST_F(PreviewTest, GoesOnUntilItIsStopped) {
   SDL_Event quit = {};
   quit.type = SDL_QUIT;
   ASSERT_EQ(SDL_PushEvent(&quit), 0);
-  for (const auto &[index, result] : {std::pair{7u, 100L}, {0u, 0L}, {1u, 0x240000L}, {2u, 0x7FFFFFFFL}})
+  for (const auto &[index, result] : {std::pair{7u, 100L}, {0u, 0L}, {1u, 0x240000L}})
     virtual_card::queue_preview(index, result);
   wait_for_pictures(5);
   struct sigaction action;
