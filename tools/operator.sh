@@ -18,8 +18,11 @@ open_display() {
   export DISPLAY QT_QPA_PLATFORM=xcb SDL_VIDEODRIVER=x11 XDG_RUNTIME_DIR=$OPERATOR_FOLDER
   openbox >"$OPERATOR_FOLDER/openbox.log" 2>&1 &
   OPENBOX=$!
-  wait_until 20 xprop -root _NET_SUPPORTING_WM_CHECK || die "openbox did not start"
+  wait_until 20 window_manager_runs || die "openbox did not start"
 }
+
+# Windows that appear before the window manager is ready may stay hidden.
+window_manager_runs() { [[ $(xprop -root _NET_SUPPORTING_WM_CHECK) == *"window id"* ]]; }
 
 close_display() {
   trap - EXIT
@@ -106,6 +109,7 @@ preview_rate() { preview_caption | sed 's/.*: //'; }
 picture() { import -silent -window "$1" "$2" && printf '  saved %s\n' "$2"; }
 
 # close_program: the operator closes the dialog; STATUS is what the program ended with.
+# shellcheck disable=SC2034 # STATUS is for the caller
 close_program() {
   focus_dialog
   xdotool key alt+F4
