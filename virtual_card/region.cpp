@@ -49,6 +49,7 @@ long Region::duplicate(bool close_on_exec) {
 }
 
 void Region::write(std::size_t offset, std::span<const u8> bytes, std::size_t end) {
+  if (bytes.empty()) return;
   with_bytes([&](std::span<u8> memory) {
     std::memcpy(memory.data() + offset, bytes.data(), std::min(bytes.size(), end - offset));
   });
