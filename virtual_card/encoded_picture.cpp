@@ -20,6 +20,13 @@ u32 period(u32 code) {
   return (code & driver::kIntervalSkipMask) + 1;
 }
 
+/// Fields from one kept field to the next. Code 0 keeps both fields; a host that wants one field of every nth
+/// frame sends code n, so that all rates but the first are whole frames apart and of one parity.
+std::int64_t kept_field(u32 code) {
+  const std::int64_t skipped = code & driver::kIntervalSkipMask;
+  return skipped == 0 ? 1 : 2 * skipped;
+}
+
 /// A row at the encoded width. The narrow pictures are half of the middle 704 pixels, whatever the input.
 void fit_row(const u8 *in, u32 in_width, u8 *out, u32 out_width) {
   if (in_width == out_width) {
@@ -49,14 +56,14 @@ bool picture_due(u32 interval_code, bool interlaced, std::int64_t field) {
   const bool bottom = field % 2 != 0;
   const std::int64_t every = period(interval_code);
   if (drop_mode(interval_code)) return bottom == interlaced && frame % every != every - 1;
-  return interlaced ? bottom && frame % every == 0 : field % every == 0;
+  return interlaced ? bottom && frame % every == 0 : field % kept_field(interval_code) == 0;
 }
 
 double picture_rate(u32 interval_code, bool interlaced, u32 standard) {
   const double frames = standard == VIDEO_STANDARD_ZV_NTSC ? 30000.0 / 1001.0 : 25.0;
   const double every = period(interval_code);
   if (drop_mode(interval_code)) return frames * (every - 1) / every;
-  return (interlaced ? frames : 2 * frames) / every;
+  return interlaced ? frames / every : 2 * frames / static_cast<double>(kept_field(interval_code));
 }
 
 void scale_picture(const Picture &from, u32 parity, EncodedSize size, EncodedPicture &to) {

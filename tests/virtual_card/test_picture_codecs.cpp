@@ -92,10 +92,10 @@ struct Interval {
 TEST(Intervals, PicturesIn600Frames) {
   constexpr Interval kIntervals[] = {{0, 1200, 600},
                                      {1, 600, 300},
-                                     {2, 400, 200},
-                                     {5, 200, 100},
-                                     {29, 40, 20},
-                                     {30, 39, 20},
+                                     {2, 300, 200},
+                                     {5, 120, 100},
+                                     {29, 21, 20},
+                                     {30, 20, 20},
                                      {kDropMode | 0, 0, 0},
                                      {kDropMode | 2, 400, 400},
                                      {kDropMode | 9, 540, 540}};
