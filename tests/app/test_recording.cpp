@@ -205,8 +205,7 @@ TEST_F(Recording, OnlyAFolderOneCanEnterBecomesTheRoot) {
   }
   const std::string too_deep = deepest + "f";
   fs::create_directory(too_deep);
-  for (const std::string root :
-       {"", "~", "missing", "file", "file/..", "a b; echo", too_deep.c_str()}) {
+  for (const std::string root : {"", "~", "missing", "file", "file/..", "a b; echo", too_deep.c_str()}) {
     EXPECT_FALSE(enter(root)) << root;
   }
 }
