@@ -51,7 +51,7 @@ struct ZV_CARD {
   Shared<u32> resolution;  ///< a ZV_RESOLUTION; read by the video thread for the headers
   Shared<u32> standard;    ///< a ZV_VIDEO_STANDARD; read by the video thread for the headers
   ZV_DISPLAY display;
-  ZV_VIDEO_CONFIG config[ZV_CHANNELS];  ///< written through store_config() and scale_of() only
+  ZV_VIDEO_CONFIG config[ZV_CHANNELS];  ///< enumerations: through word_of() and set_word()
   Shared<ZV_STREAM_CALLBACK> mpeg4_callback;
   Shared<ZV_STREAM_CALLBACK> mjpeg_callback;
   Shared<ZV_STREAM_CALLBACK> audio_callback;
@@ -65,9 +65,18 @@ inline constexpr std::size_t kMotionMapBytes = 0xCA800;
 inline constexpr std::size_t kAudioBufferSize = 0x300;
 inline constexpr std::size_t kAudioBufferAlignment = 0x40;
 
-/// The scale of a stored configuration: zv_Stop() wipes it while the video thread makes headers.
-inline std::atomic_ref<ZV_SCALE_VALUE> scale_of(ZV_VIDEO_CONFIG &config) {
-  return std::atomic_ref<ZV_SCALE_VALUE>(config.scale);
+// The enumerations of a configuration are read and written as words: a caller may have put any number
+// into them, and zv_Stop() wipes a scale while the video thread makes a header from it.
+using EnumWord __attribute__((__may_alias__)) = u32;
+template <typename Enum>
+u32 word_of(const Enum &field) {
+  static_assert(sizeof field == sizeof(u32));
+  return __atomic_load_n(reinterpret_cast<const EnumWord *>(&field), __ATOMIC_RELAXED);
+}
+template <typename Enum>
+void set_word(Enum &field, u32 word) {
+  static_assert(sizeof field == sizeof(u32));
+  __atomic_store_n(reinterpret_cast<EnumWord *>(&field), word, __ATOMIC_RELAXED);
 }
 
 /// Copies a configuration record into a stored one.

@@ -25,8 +25,8 @@ bool usable_qp_range(const ZV_VIDEO_CONFIG &config) {
 /// The interval record of a channel. The encoder counts fields: a one-field picture that keeps
 /// frames skips one field more.
 driver::Interval encoder_interval(const ZV_VIDEO_CONFIG &config, u32 channel) {
-  auto [skip, drop] = frame_interval(static_cast<u32>(config.interval));
-  if (!drop && config.twofield == TWOFIELD_DISABLE && config.scale != SCALE_ZV_D1) ++skip;
+  auto [skip, drop] = frame_interval(word_of(config.interval));
+  if (!drop && word_of(config.twofield) == TWOFIELD_DISABLE && word_of(config.scale) != SCALE_ZV_D1) ++skip;
   const u32 flag = drop ? 1 : 0;
   return {channel, skip | flag << driver::kIntervalDropShift, flag};
 }
@@ -51,9 +51,8 @@ int get_video_config(ZV_CARD &card, u32 channel) {
   ZV_VIDEO_CONFIG &config = card.config[channel];
   config.qp = qp.value;
   config.gop = gop.value;
-  scale_of(config).store(d1 ? SCALE_ZV_D1 : static_cast<ZV_SCALE_VALUE>(scale.value),
-                         std::memory_order_relaxed);
-  config.interval = static_cast<ZV_INTERVAL_VALUE>(interval_value({skip, drop}));
+  set_word(config.scale, d1 ? u32{SCALE_ZV_D1} : scale.value);
+  set_word(config.interval, interval_value({skip, drop}));
   config.enable = (scale.value & 0xF) != 0 ? 1 : 0;
   return ZV_OK;
 }
@@ -64,7 +63,8 @@ int set_video_config(ZV_CARD &card, u32 channel) {
   constexpr useconds_t kSettle = 500;
   if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;
   const ZV_VIDEO_CONFIG &config = card.config[channel];
-  const u32 scale = config.scale == SCALE_ZV_D1 ? driver::kScaleCodeD1 : static_cast<u32>(config.scale);
+  const u32 stored = word_of(config.scale);
+  const u32 scale = stored == SCALE_ZV_D1 ? driver::kScaleCodeD1 : stored;
   if (usable_qp_range(config))
     issue(card.enc_fd, driver::ENC_IOC_SET_QP_RANGE, driver::QpRange{channel, config.QPMax, config.QPMin, 1});
   driver::Interval interval = encoder_interval(config, channel);

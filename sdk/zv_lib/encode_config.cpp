@@ -13,13 +13,13 @@
 namespace zarvo {
 
 void store_config(ZV_VIDEO_CONFIG &stored, const ZV_VIDEO_CONFIG &record) {
-  stored.mjpeg = record.mjpeg;
-  scale_of(stored).store(record.scale, std::memory_order_relaxed);
+  set_word(stored.mjpeg, word_of(record.mjpeg));
+  set_word(stored.scale, word_of(record.scale));
   stored.gop = record.gop;
   stored.qp = record.qp;
-  stored.interval = record.interval;
-  stored.twofield = record.twofield;
-  stored.jpeg_qp = record.jpeg_qp;
+  set_word(stored.interval, word_of(record.interval));
+  set_word(stored.twofield, word_of(record.twofield));
+  set_word(stored.jpeg_qp, word_of(record.jpeg_qp));
   stored.enable = record.enable;
   stored.CBRValue = record.CBRValue;
   stored.CBREnable = record.CBREnable;
@@ -35,11 +35,11 @@ int set_encode_config(ZV_CARD &card, u32 channel, const ZV_VIDEO_CONFIG *record)
   if (record == nullptr) return ZV_ERR_PARAM;
   ZV_VIDEO_CONFIG &config = card.config[channel];
   store_config(config, *record);
-  if (config.enable != 0 && config.scale == SCALE_ZV_NO_ENCODE) {
+  if (config.enable != 0 && word_of(config.scale) == SCALE_ZV_NO_ENCODE) {
     std::printf("Error: zv_SetVideoEncodeConfig--invalid scale value.\n");
     return ZV_ERR_CONFIG;
   }
-  const bool two_field_slow = config.twofield == TWOFIELD_ENABLE && config.interval != 0;
+  const bool two_field_slow = word_of(config.twofield) == TWOFIELD_ENABLE && word_of(config.interval) != 0;
   return two_field_slow ? ZV_ERR_CONFIG : ZV_OK;
 }
 
@@ -59,10 +59,10 @@ struct Load {
 };
 
 Load load_of(const ZV_VIDEO_CONFIG &config) {
-  const u32 value = static_cast<u32>(config.interval);
+  const u32 value = word_of(config.interval);
   const FrameInterval interval = frame_interval(value);
-  const bool d1 = config.scale == SCALE_ZV_D1 && value < kIntervalCount;
-  const bool two_field = config.twofield != TWOFIELD_DISABLE;
+  const bool d1 = word_of(config.scale) == SCALE_ZV_D1 && value < kIntervalCount;
+  const bool two_field = word_of(config.twofield) != TWOFIELD_DISABLE;
   const u32 skip = interval.skip + (d1 || (two_field && value == 0) ? 0 : 1);
   return {skip, interval.drop, d1, two_field && skip == 0};
 }
@@ -76,7 +76,7 @@ u32 counted_rate(const Load &load, u32 base) {
 
 /// Size of a channel's pictures in CIF pictures.
 u32 weight_of(const ZV_VIDEO_CONFIG &config, const Load &load, u32 channel) {
-  switch (config.scale) {
+  switch (word_of(config.scale)) {
     case SCALE_ZV_NO_ENCODE:
       return 0;
     case SCALE_ZV_HALF_D1:
@@ -87,7 +87,7 @@ u32 weight_of(const ZV_VIDEO_CONFIG &config, const Load &load, u32 channel) {
       return 4;
     default:
       std::printf("Error: invalid scale value, channel = %d, scale = %d.\n", static_cast<int>(channel),
-                  static_cast<int>(config.scale));
+                  static_cast<int>(word_of(config.scale)));
       return 0;
   }
 }
@@ -102,8 +102,8 @@ int check_encode_config(ZV_CARD &card) {
   for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) {
     const ZV_VIDEO_CONFIG &config = card.config[channel];
     const Load load = load_of(config);
-    const u32 rate = config.scale == SCALE_ZV_NO_ENCODE ? 0 : counted_rate(load, base);
-    if (config.twofield == TWOFIELD_ENABLE && (load.skip != 0 || load.d1)) return ZV_ERR_CONFIG;
+    const u32 rate = word_of(config.scale) == SCALE_ZV_NO_ENCODE ? 0 : counted_rate(load, base);
+    if (word_of(config.twofield) == TWOFIELD_ENABLE && (load.skip != 0 || load.d1)) return ZV_ERR_CONFIG;
     total += static_cast<float>(weight_of(config, load, channel) * rate);
     if (total > budget) {
       std::printf("Error: zv_CheckVideoEncodeConfig--Exceed maximum total frame rate!!\n");
@@ -124,7 +124,7 @@ int mark_channels(ZV_CARD &card, u32 mask) {
       continue;
     }
     config.enable = 1;
-    if (config.scale == SCALE_ZV_NO_ENCODE) {
+    if (word_of(config.scale) == SCALE_ZV_NO_ENCODE) {
       std::printf(
           "ZarvoSDK: Error: zv_EnableVideoRecordChannels--invalid scale value of Channel%d. Please confirm  "
           "video config first.\n",
@@ -140,8 +140,8 @@ void send_jpeg_quality(const ZV_CARD &card) {
   constexpr u32 kQualityWords[] = {0x02020202, 0x02000102, 0x02000102};  // by ZV_JPEG_QUALITY
   u32 word = kQualityWords[JPEG_QP_ZV_MEDIUM];
   for (const ZV_VIDEO_CONFIG &config : card.config) {
-    if (config.mjpeg == VIDEO_CODEC_ZV_MPEG4) continue;
-    const u32 quality = static_cast<u32>(config.jpeg_qp);
+    if (word_of(config.mjpeg) == VIDEO_CODEC_ZV_MPEG4) continue;
+    const u32 quality = word_of(config.jpeg_qp);
     if (quality <= JPEG_QP_ZV_HIGH) word = kQualityWords[quality];
     issue(card.enc_fd, driver::ENC_IOC_WRITE_REG, driver::Register{driver::kRegMjpegQuality, word});
   }

@@ -35,7 +35,7 @@ void write_layer(const Layer &layer) {
 
 int make_MP4_header(ZV_CARD &card, u32 channel) {
   const auto [width, height] = input_picture(card);
-  switch (scale_of(card.config[channel]).load(std::memory_order_relaxed)) {
+  switch (word_of(card.config[channel].scale)) {
     case SCALE_ZV_NO_ENCODE:
       return 1;
     case SCALE_ZV_HALF_D1:
