@@ -3,8 +3,8 @@
  * The preview picture in detail: layouts, single windows, picture-in-picture and zoom.
  *
  * The functions work on the display state inside an open card, which zv_display_open() hands out and
- * which lives until zv_Close(). They answer -1 for a refusal, which changes nothing, and for a null
- * display. Zoom and picture-in-picture need the 1-picture layout and exclude each other; while either
+ * which lives until zv_Close(). Those with a result answer -1 for a refusal, which changes nothing, and for
+ * a null display. Zoom and picture-in-picture need the 1-picture layout and exclude each other; while either
  * is on, the layout is frozen.
  */
 #ifndef ZV_DISPLAY_H

@@ -39,15 +39,16 @@ int zv_Open(HANDLE *handle);
 
 /**
  * Closes the card and releases everything; the handle is dead afterwards. Turns the preview and
- * motion detection off. Call zv_Stop() and zv_DisableWatchDog() before.
+ * motion detection off. Call zv_Stop() and zv_DisableWatchDog() before; threads that still run are
+ * ended first, but no stop command is sent for them to the encoder.
  *
  * @param handle  the open card; anything when no card is open, which is no error
  * @return ZV_OK, also when no card is open; ZV_ERR_PARAM for another handle while a card is open;
- *         ZV_ERR_CLOSE when closing a device node failed: the card then still counts as open, and
- *         another zv_Close() goes on with the nodes that are left
+ *         ZV_ERR_CLOSE when closing a device node failed, or when called from a callback: the card
+ *         then still counts as open, and another zv_Close() goes on with the nodes that are left
  *
- * Context: control thread; open or closed, not capturing, watchdog off. Blocks for a thread that has
- * ended but was not joined yet.
+ * Context: control thread; open or closed, not capturing, watchdog off. Blocks for the threads that
+ * are still there.
  */
 int zv_Close(HANDLE handle);
 
@@ -70,8 +71,8 @@ int zv_RegisterCallBack(HANDLE handle, ZV_STREAM_CALLBACK mpeg4, ZV_STREAM_CALLB
  * Starts capture: frames and audio blocks of the enabled channels reach the callbacks.
  *
  * @param handle  the open card
- * @return ZV_OK, also when already capturing; ZV_ERR_PARAM; ZV_ERR_CONFIG when the stored encoder
- *         settings exceed the frame-rate budget; ZV_ERR_THREAD_CREATE after "Zarvo SDK: Start Error!
+ * @return ZV_OK, also when already capturing; ZV_ERR_PARAM; ZV_ERR_CONFIG when zv_CheckVideoEncodeConfig()
+ *         refuses the stored settings; ZV_ERR_THREAD_CREATE after "Zarvo SDK: Start Error!
  *         Error Code = 12." and a full zv_Stop(), which wipes the encoder settings
  *
  * Context: control thread, not from a callback; open or capturing. Blocks for about a millisecond.
@@ -156,8 +157,8 @@ int zv_EnablePreviewChannels(HANDLE handle, u32 mask);
  * @return what the driver's read returned: bytes of the picture, 0 for none yet, negative on failure;
  *         -1 for a bad handle or a null @p picture
  *
- * Context: any thread; open or capturing. Blocks until the driver has a picture or gives up, at
- * most about 10 milliseconds, longer while another thread is in it.
+ * Context: any thread; open or capturing. Blocks as long as the driver's read takes, longer
+ * while another thread is in it.
  */
 int zv_GetPreviewScreen(HANDLE handle, u8 **picture);
 
@@ -192,7 +193,8 @@ int zv_SetVideoEncodeConfig(HANDLE handle, u32 channel, const ZV_VIDEO_CONFIG *c
  *
  * @param handle  the open card
  * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CONFIG over budget (a line is printed) or for two-field mode
- *         with D1 or at another interval than 0
+ *         with D1 or at another interval than 0. A scale outside ZV_SCALE_VALUE is named in a
+ *         printed line and weighs nothing
  *
  * Context: control thread; open or capturing. Does not block.
  */
@@ -205,8 +207,8 @@ int zv_CheckVideoEncodeConfig(HANDLE handle);
  * @param handle  the open card
  * @param mask    channels, bits 0-15
  * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL when a bit above 15 is set; ZV_ERR_CONFIG when a
- *         channel of the mask has no scale (a line is printed) or the budget is exceeded: nothing is
- *         sent, but the stored settings stay as changed so far
+ *         channel of the mask has no scale (a line is printed) or zv_CheckVideoEncodeConfig()
+ *         refuses: nothing is sent, but the stored settings stay as changed so far
  *
  * Context: control thread; open. Blocks for about 10 milliseconds.
  */
@@ -469,7 +471,8 @@ int zv_EnableWatchDog(HANDLE handle);
  * @return ZV_OK, also when it does not run; ZV_ERR_PARAM; ZV_ERR_THREAD_JOIN; ZV_ERR_DEVICE when
  *         the board does not confirm: the watchdog may still be running
  *
- * Context: control thread; open or capturing. Blocks for a few milliseconds.
+ * Context: control thread; open or capturing. Blocks for a few milliseconds, or as long as the
+ * driver holds the thread in a command.
  */
 int zv_DisableWatchDog(HANDLE handle);
 

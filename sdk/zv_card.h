@@ -24,7 +24,6 @@ template <typename T>
 class Shared {
  public:
   Shared() = default;
-  explicit Shared(T value) : word_(value) {}
   operator T() const { return word_.load(std::memory_order_acquire); }
   T operator=(T value) {
     word_.store(value, std::memory_order_release);
@@ -114,6 +113,26 @@ extern void *zv_thread_result;
 extern void *zv_audio_thread_result;
 extern void *zv_watchdog_thread_result;
 extern Shared<u32> mp4_header_flag[ZV_CHANNELS];  ///< type of the last MPEG-4 frame, 1 once it has a header
+
+/// The run flag of a thread. Its mutex exists while the card is open.
+struct RunFlag {
+  Shared<int> &word;
+  pthread_mutex_t &mutex;
+
+  /// Writes the flag and returns what it was.
+  int exchange(int value) const {
+    pthread_mutex_lock(&mutex);
+    const int before = word.exchange(value);
+    pthread_mutex_unlock(&mutex);
+    return before;
+  }
+  bool is_set() const {
+    pthread_mutex_lock(&mutex);
+    const bool set = word != 0;
+    pthread_mutex_unlock(&mutex);
+    return set;
+  }
+};
 
 /// The card behind a handle; null for anything but the handle of the open card.
 inline ZV_CARD *card_of(HANDLE handle) {

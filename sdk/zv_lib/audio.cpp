@@ -12,13 +12,6 @@ namespace zarvo {
 
 namespace {
 
-bool audio_enabled() {
-  pthread_mutex_lock(&mutex_zv_audio_enable);
-  const bool enabled = zv_audio_thread_enable != 0;
-  pthread_mutex_unlock(&mutex_zv_audio_enable);
-  return enabled;
-}
-
 void deliver_blocks(const ZV_CARD &card) {
   for (u32 n = 0; n < ZV_AUDIO_CHANNELS; ++n) {
     const ZV_STREAM_CALLBACK callback = card.audio_callback;
@@ -34,10 +27,10 @@ int audio_stream(ZV_CARD &, u32 channel) {
 }  // namespace
 
 void *get_audio_data_thread(void *argument) {
-  constexpr useconds_t kPassPause = 100;
   if (void *failure = make_cancellable()) return failure;
   const ZV_CARD &card = *static_cast<ZV_CARD *>(argument);
-  while (audio_enabled()) {
+  const RunFlag running{zv_audio_thread_enable, mutex_zv_audio_enable};
+  while (running.is_set()) {
     if (card.audio_mask != 0) {
       // The count is in blocks: the driver fills one block an input.
       if (read(card.g723_fd, audio_buf, driver::kAudioReadCount) <= 0) continue;

@@ -29,7 +29,6 @@ Shared<u32> mp4_header_flag[ZV_CHANNELS];
 
 namespace {
 
-constexpr useconds_t kPassPause = 100;
 constexpr std::uint64_t kPollPeriod = 100000;  ///< microseconds of capture time
 
 /// What the video data thread keeps between frames.
@@ -165,32 +164,27 @@ namespace {
 struct CaptureThread {
   Worker &worker;
   Worker::Routine routine;
-  Shared<int> &enable;
-  pthread_mutex_t &mutex;
+  RunFlag running;
   void *&result;
 };
-const CaptureThread kVideo{zv_capture_thread, get_video_data_thread, zv_thread_enable, mutex_zv_enable,
-                           zv_thread_result};
-const CaptureThread kAudio{zv_audio_capture_thread, get_audio_data_thread, zv_audio_thread_enable,
-                           mutex_zv_audio_enable, zv_audio_thread_result};
-
-/// Writes a run flag under its mutex and returns what it was.
-int set_run_flag(const CaptureThread &thread, int value) {
-  pthread_mutex_lock(&thread.mutex);
-  const int before = thread.enable.exchange(value);
-  pthread_mutex_unlock(&thread.mutex);
-  return before;
-}
+const CaptureThread kVideo{
+    zv_capture_thread, get_video_data_thread, {zv_thread_enable, mutex_zv_enable}, zv_thread_result};
+const CaptureThread kAudio{zv_audio_capture_thread,
+                           get_audio_data_thread,
+                           {zv_audio_thread_enable, mutex_zv_audio_enable},
+                           zv_audio_thread_result};
 
 bool start_thread(const CaptureThread &thread, ZV_CARD &card) {
-  set_run_flag(thread, 1);
+  // A thread that stopped itself from its callback must be gone before the flag is set again.
+  if (!thread.worker.join(thread.result)) return false;
+  thread.running.exchange(1);
   if (thread.worker.start(thread.routine, &card)) return true;
-  set_run_flag(thread, 0);
+  thread.running.exchange(0);
   return false;
 }
 
 bool stop_thread(const CaptureThread &thread) {
-  return set_run_flag(thread, 0) == 0 || thread.worker.join(thread.result);
+  return thread.running.exchange(0) == 0 || thread.worker.join(thread.result);
 }
 
 bool stop_threads() {
@@ -224,6 +218,13 @@ int register_callbacks(ZV_CARD &card, ZV_STREAM_CALLBACK mpeg4, ZV_STREAM_CALLBA
 }
 
 }  // namespace
+
+bool join_capture() {
+  start_flag = 0;
+  stop_threads();
+  const bool video_joined = zv_capture_thread.join(zv_thread_result);
+  return zv_audio_capture_thread.join(zv_audio_thread_result) && video_joined;
+}
 
 int stop_capture(ZV_CARD &card) {
   constexpr useconds_t kSettle = 10000;

@@ -16,9 +16,18 @@ namespace {
 
 constexpr u32 kNeverMoves = 0xFFFF;
 
+}  // namespace
+
 void write_motion_control(const ZV_CARD &card) {
   write_codec(card, driver::kRegMotionControl, driver::kMotionControlAll);
 }
+
+void disable_motion(const ZV_CARD &card) {
+  const u32 enabled = read_codec(card, driver::kRegMotionEnable);
+  write_codec(card, driver::kRegMotionEnable, mask_bit(enabled, driver::kMotionEnableMask));
+}
+
+namespace {
 
 /// Gives every block of a rectangle of blocks the same threshold.
 int send_thresholds(ZV_CARD &card, driver::MotionMap area, u32 threshold) {
@@ -74,14 +83,13 @@ int start_detection(ZV_CARD &card) {
 
 u32 motion_of(ZV_CARD &card) {
   const u32 motion = ask(card.disp_fd, driver::DISP_IOC_GET_MOTION, card.motion_status);
-  return card.motion_status = motion & ~video_loss(card) & 0xFFFF;
+  return card.motion_status = motion & ~video_loss(card) & kAllVideo;
 }
 
 }  // namespace
 
 int stop_motion_detection(ZV_CARD &card) {
-  const u32 enabled = read_codec(card, driver::kRegMotionEnable);
-  write_codec(card, driver::kRegMotionEnable, mask_bit(enabled, driver::kMotionEnableMask));
+  disable_motion(card);
   issue(card.disp_fd, driver::DISP_IOC_MOTION_TRACE_OFF);
   write_motion_control(card);
   return ZV_OK;

@@ -13,7 +13,6 @@
 
 #include "command.h"
 #include "internal.h"
-#include "zv_bits.h"
 #include "zv_card.h"
 #include "zv_lib.h"
 
@@ -122,7 +121,8 @@ void release_memory(ZV_CARD *card) {
   std::free(card);
 }
 
-/// The zeroed record with all regions mapped and all buffers allocated, or null with nothing kept.
+/// The zeroed record with all regions mapped and all buffers allocated; or a message, and null with
+/// nothing kept.
 ZV_CARD *acquire_memory(const Descriptors &fds) {
   void *memory = std::malloc(sizeof(ZV_CARD));
   ZV_CARD *card = memory != nullptr ? new (memory) ZV_CARD{} : nullptr;
@@ -138,6 +138,7 @@ ZV_CARD *acquire_memory(const Descriptors &fds) {
     return preview_scratch != nullptr && card->motion_map != nullptr;
   };
   if (acquired()) return card;
+  std::printf("Zarvo SDK: Open Error! Error Code = %d.\n", ZV_ERR_NO_MEMORY);
   release_memory(card);
   return nullptr;
 }
@@ -145,7 +146,7 @@ ZV_CARD *acquire_memory(const Descriptors &fds) {
 void set_defaults(ZV_CARD &card) {
   card.display.fd = card.disp_fd;
   driver::MotionLevels levels{};
-  issue(card.vin_fd, driver::VIN_IOC_GET_MOTION_LEVELS, levels);
+  if (issue(card.vin_fd, driver::VIN_IOC_GET_MOTION_LEVELS, levels) != 0) levels = {};
   for (u32 n = 0; n < ZV_CHANNELS; ++n) {
     ZV_DISPLAY_WINDOW &window = card.display.window[n];
     window.index = n;
@@ -161,9 +162,8 @@ void set_defaults(ZV_CARD &card) {
 void set_up_chips(const ZV_CARD &card) {
   constexpr u8 kDecoderSetup[][2] = {{0x72, 0x00}, {0x73, 0x11}, {0x74, 0x11}};
   for (const auto &[address, value] : kDecoderSetup) write_decoder(card, 0, address, value);
-  const u32 motion = read_codec(card, driver::kRegMotionEnable);
-  write_codec(card, driver::kRegMotionEnable, mask_bit(motion, driver::kMotionEnableMask));
-  write_codec(card, driver::kRegMotionControl, driver::kMotionControlAll);
+  disable_motion(card);
+  write_motion_control(card);
 }
 
 int open_card_record(HANDLE *handle) {
@@ -176,7 +176,6 @@ int open_card_record(HANDLE *handle) {
   }
   ZV_CARD *card = acquire_memory(fds);
   if (card == nullptr) {
-    std::printf("Zarvo SDK: Open Error! Error Code = %d.\n", ZV_ERR_NO_MEMORY);
     close_nodes(fds, kNodeCount);
     open_count = 0;
     return ZV_ERR_NO_MEMORY;
@@ -191,8 +190,13 @@ int open_card_record(HANDLE *handle) {
 }
 
 int close_card(ZV_CARD &card) {
-  issue(card.disp_fd, driver::DISP_IOC_PREVIEW_OFF);
-  stop_motion_detection(card);
+  // Nobody may use the descriptors once they are closed, nor the memory once it is given back.
+  const bool capture_joined = join_capture();
+  if (!join_watchdog() || !capture_joined) return ZV_ERR_CLOSE;
+  if (card.disp_fd >= 0) {
+    issue(card.disp_fd, driver::DISP_IOC_PREVIEW_OFF);
+    stop_motion_detection(card);
+  }
   for (const Node &node : kNodes) {
     // The number is given up first: a close that fails has released it all the same, and it may
     // belong to someone else by the time zv_Close() is called again.
@@ -201,9 +205,6 @@ int close_card(ZV_CARD &card) {
     card.display.fd = card.disp_fd;
     if (fd >= 0 && close(fd) == -1) return ZV_ERR_CLOSE;
   }
-  zv_capture_thread.join(zv_thread_result);
-  zv_audio_capture_thread.join(zv_audio_thread_result);
-  zv_watchdog_thread.join(zv_watchdog_thread_result);
   open_card = nullptr;
   release_memory(&card);
   for (pthread_mutex_t *mutex : kMutexes) pthread_mutex_destroy(mutex);

@@ -11,7 +11,6 @@ namespace zarvo {
 
 namespace {
 
-constexpr u32 kAllVideo = 0xFFFF;
 constexpr u32 kAllAudio = 0xF;
 
 u32 audio_loss(ZV_CARD &card) {

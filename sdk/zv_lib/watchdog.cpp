@@ -26,20 +26,7 @@ constexpr std::int64_t kKickPeriod = 30000;  ///< milliseconds
 constexpr useconds_t kLookPause = 5000;      ///< microseconds between looks at the flag and the clock
 constexpr int kAttempts = 10;
 
-/// Writes the run flag under its mutex and returns what it was.
-int set_watchdog_flag(int value) {
-  pthread_mutex_lock(&mutex_watchdog);
-  const int before = zv_watchdog_thread_enable.exchange(value);
-  pthread_mutex_unlock(&mutex_watchdog);
-  return before;
-}
-
-bool watchdog_enabled() {
-  pthread_mutex_lock(&mutex_watchdog);
-  const bool enabled = zv_watchdog_thread_enable != 0;
-  pthread_mutex_unlock(&mutex_watchdog);
-  return enabled;
-}
+const RunFlag kRunning{zv_watchdog_thread_enable, mutex_watchdog};
 
 /// Repeats a board command until the controller gives the expected reply. `reply` is the last one.
 bool handshake(const ZV_CARD &card, u32 command, u32 expected, u32 &reply) {
@@ -63,12 +50,13 @@ std::int64_t now_ms() {
 /// Feeds the watchdog until the run flag is cleared or the controller fails to answer.
 void feed(const ZV_CARD &card) {
   std::int64_t next_kick = now_ms() + kKickPeriod;
-  while (watchdog_enabled()) {
-    if (now_ms() < next_kick) {
+  while (kRunning.is_set()) {
+    const std::int64_t now = now_ms();
+    if (now < next_kick) {
       usleep(kLookPause);
       continue;
     }
-    next_kick = now_ms() + kKickPeriod;
+    next_kick = now + kKickPeriod;
     write_codec(card, driver::kRegWatchdogPeriod, driver::kWatchdogPeriod);
     u32 reply = 0;
     if (!kick(card, reply)) {
@@ -91,7 +79,7 @@ void *watchdog_thread(void *argument) {
   } else {
     std::printf("ERROR: Zarvo WatchDog init failed. code = 0x%x\n", reply);
   }
-  set_watchdog_flag(0);
+  kRunning.exchange(0);
   board_command(card, driver::kBoardWatchdogOff, 0);
   write_codec(card, driver::kRegWatchdogPeriod, 0);
   return nullptr;
@@ -100,14 +88,14 @@ void *watchdog_thread(void *argument) {
 namespace {
 
 int enable_watchdog(ZV_CARD &card) {
-  if (set_watchdog_flag(1) != 0) return ZV_OK;
+  if (kRunning.exchange(1) != 0) return ZV_OK;
   if (zv_watchdog_thread.start(watchdog_thread, &card)) return ZV_OK;
-  set_watchdog_flag(0);
+  kRunning.exchange(0);
   return ZV_ERR_THREAD_CREATE;
 }
 
 int disable_watchdog(ZV_CARD &card) {
-  if (set_watchdog_flag(0) == 0) return ZV_OK;
+  if (kRunning.exchange(0) == 0) return ZV_OK;
   if (!zv_watchdog_thread.join(zv_watchdog_thread_result)) return ZV_ERR_THREAD_JOIN;
   write_codec(card, driver::kRegWatchdogPeriod, 0);
   u32 reply = 0;
@@ -116,6 +104,11 @@ int disable_watchdog(ZV_CARD &card) {
 }
 
 }  // namespace
+
+bool join_watchdog() {
+  kRunning.exchange(0);
+  return zv_watchdog_thread.join(zv_watchdog_thread_result);
+}
 
 }  // namespace zarvo
 
