@@ -71,9 +71,10 @@ void audio_call_back(unsigned int ch, unsigned char *data, int length, int) {
 }
 
 void DemoDialog::StartRecord() {
-  // A second start would truncate the files that the capture threads are writing.
-  if (!g_finish_record) return;
-  if (!CheckDiskSpace(g_filepath)) {
+  // A second start would truncate the files that the capture threads are writing. The timer tells: it
+  // also stops when a dialog is left while it records, and g_finish_record keeps its 0 then.
+  if (timer.isActive()) return;
+  if (std::strlen(g_filepath) > kMaxRootBytes || !CheckDiskSpace(g_filepath)) {
     std::puts(kNoSpace);
     return;
   }
@@ -89,10 +90,9 @@ void DemoDialog::StartRecord() {
     return;
   }
   WriteEnableCh();
-  if (!sdk_ok(zv_Start(zv_handle), "ERROR:zv_Start Error!")) {
-    CloseFile();
-    return;
-  }
+  const int status = zv_Start(zv_handle);
+  if (status != ZV_OK) CloseFile();  // whoever reads the line finds the files complete
+  if (!sdk_ok(status, "ERROR:zv_Start Error!")) return;
   timer.start(g_time_interval);
   g_finish_record = 0;
   UpdateUI(RECORD_START);

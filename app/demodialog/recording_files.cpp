@@ -44,8 +44,10 @@ void make_day(const std::string &day_path, unsigned channels, char (&kept)[256])
 }
 
 /// Opens a recording file anew. Unbuffered: each delivery is one write, and what a callback has been
-/// given is in the file when it returns, whatever happens to the process afterwards.
+/// given is in the file when it returns, whatever happens to the process afterwards. Null when there is
+/// no day folder.
 FILE *open_recording(const char *day_path, unsigned index, const std::string &name) {
+  if (*day_path == '\0') return nullptr;
   FILE *const stream = std::fopen((channel_folder(day_path, index) + "/" + name).c_str(), "w");
   if (stream) std::setvbuf(stream, nullptr, _IONBF, 0);
   return stream;
