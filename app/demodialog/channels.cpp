@@ -27,7 +27,7 @@ void enable_boxes(unsigned count) {
 }
 
 /// Shows a status on the boxes, which then belong to none of the editing modes.
-void show_status(DemoDialog &dialog, unsigned status, const char *title) {
+void show_status(DemoDialog &dialog, unsigned status, const QString &title) {
   dialog.SetCheckBox(status);
   enable_boxes(0);
   dialog.ChecksGroup->setTitle(title);
@@ -76,7 +76,7 @@ void DemoDialog::EnablePreview() {
   SetCheckBox(g_preview_ch);
   enable_boxes(ZV_CHANNELS);
   g_channel_mode = ENABLE_PREVIEW;
-  ChecksGroup->setTitle("Preview");
+  ChecksGroup->setTitle(tr("Preview"));
 }
 
 void DemoDialog::EnableAudio() {
@@ -86,7 +86,7 @@ void DemoDialog::EnableAudio() {
   SetCheckBox(g_audio_ch & kAudioMask);
   enable_boxes(ZV_AUDIO_CHANNELS);
   g_channel_mode = ENABLE_AUDIO;
-  ChecksGroup->setTitle("Audio");
+  ChecksGroup->setTitle(tr("Audio"));
 }
 
 void DemoDialog::EnableRecord() {
@@ -94,21 +94,21 @@ void DemoDialog::EnableRecord() {
   SetCheckBox(g_record_ch);
   enable_boxes(ZV_CHANNELS);
   g_channel_mode = ENABLE_RECORD;
-  ChecksGroup->setTitle("Record");
+  ChecksGroup->setTitle(tr("Record"));
 }
 
 void DemoDialog::GetVideoStatus() {
   g_channel_mode = VIDEO_STATUS;
   g_video_ch = zv_GetVideoStatus(zv_handle);
   std::printf("g_video_ch = %x\n", g_video_ch);
-  show_status(*this, g_video_ch, "Video loss");
+  show_status(*this, g_video_ch, tr("Video loss"));
 }
 
 void DemoDialog::GetMotionStatus() {
   g_channel_mode = MOTION_STATUS;
   g_motion_ch = zv_GetMotionStatus(zv_handle);
   std::printf("g_motion_ch = %x\n", g_motion_ch);
-  show_status(*this, g_motion_ch, "Motion");
+  show_status(*this, g_motion_ch, tr("Motion"));
 }
 
 void DemoDialog::WriteEnableCh() {

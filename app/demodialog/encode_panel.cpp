@@ -46,7 +46,9 @@ constexpr u32 kDefaultQpMax = 15;
 constexpr u32 kDefaultQpMin = 2;
 
 /// edtScale, by ZV_SCALE_VALUE.
-const char *const kScaleNames[] = {"No Encoding", "Half D1", "CIF", "D1"};
+const char *const kScaleNames[] = {
+    QT_TRANSLATE_NOOP("DemoDialog", "No Encoding"), QT_TRANSLATE_NOOP("DemoDialog", "Half D1"),
+    QT_TRANSLATE_NOOP("DemoDialog", "CIF"), QT_TRANSLATE_NOOP("DemoDialog", "D1")};
 
 ZV_VIDEO_CODEC codec_of(const QComboBox *combo) {
   return combo->currentIndex() == 0 ? VIDEO_CODEC_ZV_MPEG4 : VIDEO_CODEC_ZV_MJPEG;
@@ -100,7 +102,7 @@ void show_record_set(DemoDialog &dialog) {
   dialog.radioEnRecord->setEnabled(true);
   dialog.radioEnAudio->setEnabled(true);
   dialog.radioEnRecord->setChecked(true);
-  dialog.ChecksGroup->setTitle("Record");
+  dialog.ChecksGroup->setTitle(DemoDialog::tr("Record"));
   g_channel_mode = INITIAL_CASE;
   for (QCheckBox *box : g_check_handle) box->setEnabled(true);
   dialog.SetCheckBox(g_record_ch);
@@ -134,7 +136,7 @@ void show_scale(QLineEdit *edit, ZV_SCALE_VALUE scale) {
   if (scale == SCALE_ZV_INVALID) {
     std::puts("ERROR:zv_GetVideoEncodeConfig Error -- SCALE_ZV_INVALID:!");
   } else if (scale < std::size(kScaleNames)) {
-    edit->setText(kScaleNames[scale]);
+    edit->setText(DemoDialog::tr(kScaleNames[scale]));
   }
 }
 

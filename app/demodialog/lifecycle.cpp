@@ -1,6 +1,7 @@
 #include <unistd.h>
 
 #include <QEvent>
+#include <QFile>
 #include <algorithm>
 #include <cstdlib>
 #include <string>
@@ -47,9 +48,9 @@ void refill(QComboBox *combo) {
 
 DemoDialog::DemoDialog(QWidget *parent, const char *name, bool modal, unsigned int flags)
     : QDialog(parent, Qt::WindowFlags(static_cast<int>(flags))) {
-  if (name != nullptr) setObjectName(QString::fromUtf8(name));
   setModal(modal);
   setupUi(this);
+  if (name != nullptr) setObjectName(QString::fromUtf8(name));  // an empty one, too
   languageChange();
   resize(kLeastSize.expandedTo(minimumSizeHint()));
   init();
@@ -107,7 +108,7 @@ void DemoDialog::init() {
   // The sliders follow the edits.
   for (const Range &range : ranges) range.edit->setText(QLatin1String(range.neutral));
 
-  edtRecordPath->setText(QString::fromLocal8Bit(g_filepath));
+  edtRecordPath->setText(QFile::decodeName(g_filepath));
   comboFrameRate->addItems(frame_rate_labels(VIDEO_STANDARD_ZV_NTSC));
   zv_config.CBREnable = 0;
   zv_config.QPMinMaxEnable = 0;

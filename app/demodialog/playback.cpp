@@ -14,7 +14,7 @@ namespace {
 QByteArray choose_recording(QWidget *parent) {
   char folder[256];
   if (!getcwd(folder, sizeof folder)) folder[0] = '\0';
-  QFileDialog chooser(parent, QObject::tr("Choose a file to playback"), QFile::decodeName(folder),
+  QFileDialog chooser(parent, DemoDialog::tr("Choose a file to playback"), QFile::decodeName(folder),
                       QStringLiteral("Video (*.rec);; Audio (*.aud)"));
   chooser.setObjectName("Playback");
   chooser.setFileMode(QFileDialog::ExistingFile);
