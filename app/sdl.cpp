@@ -10,15 +10,15 @@
 #include <cstring>
 #include <iterator>
 
-namespace {
-
-constexpr int kBitsPerPixel = 24;
-constexpr std::size_t kBytesPerPixel = 2;  // of a UYVY picture
-
 SDL_Surface *screen = nullptr;
 SDL_Overlay *overlay = nullptr;
 SDL_Rect video_rect;
 SDL_Event event;
+
+namespace {
+
+constexpr int kBitsPerPixel = 24;
+constexpr std::size_t kBytesPerPixel = 2;  // of a UYVY picture
 
 // Rows of the overlay may be padded; rows of a picture never are.
 void copy_into_overlay(const unsigned char *picture, std::size_t length) {
@@ -51,12 +51,16 @@ int init_without_signals() {
 
 }  // namespace
 
-int InitialSDL(int width, int height) {
+void set_overlay_environment() {
   // putenv() keeps the strings themselves.
   static char direct[] = "SDL_VIDEO_YUV_DIRECT=1";
   static char accelerated[] = "SDL_VIDEO_YUV_HWACCEL=1";
   putenv(direct);
   putenv(accelerated);
+}
+
+int InitialSDL(int width, int height) {
+  set_overlay_environment();
   if (init_without_signals() != 0) {
     std::printf("Initial SDL error: %s\n", SDL_GetError());
     return -1;

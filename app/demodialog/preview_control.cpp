@@ -13,6 +13,13 @@ void show_split(ZV_VIDEO_MODE mode) {
   sdk_ok(zv_SetPreviewMode(zv_handle, zv_mode), "ERROR:zv_SetPreviewMode Error!");
 }
 
+void show_standard(ZV_VIDEO_STANDARD standard) {
+  const std::lock_guard lock(layout_mutex);
+  zv_format = standard;
+  g_height = standard == VIDEO_STANDARD_ZV_NTSC ? 480 : 576;
+  sdk_ok(zv_SetVideoStandard(zv_handle, zv_format), "ERROR:zv_SetVideoStandard Error!");
+}
+
 }  // namespace
 
 void DemoDialog::StartPreview() {
@@ -50,14 +57,11 @@ void DemoDialog::PreviewSplit16() {
 }
 
 void DemoDialog::CheckFormat() {
-  const std::lock_guard lock(layout_mutex);
-  zv_format = radioNTSC->isChecked() ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL;
-  g_height = zv_format == VIDEO_STANDARD_ZV_NTSC ? 480 : 576;
+  show_standard(radioNTSC->isChecked() ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL);
   comboFrameRate->clear();
   comboFrameRate->addItems(frame_rate_labels(zv_format));
   zv_config.interval = static_cast<ZV_INTERVAL_VALUE>(0);
   comboFrameRate->setCurrentIndex(0);
-  sdk_ok(zv_SetVideoStandard(zv_handle, zv_format), "ERROR:zv_SetVideoStandard Error!");
 }
 
 void DemoDialog::ChangeResolution() {
