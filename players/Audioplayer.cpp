@@ -7,10 +7,11 @@ int main(int argc, char **argv) {
   if (file < 0) return 1;
   const std::string title = players::base_name(argv[1]);
   return players::hand_over(
-      file, {{"ffplay",
-              {"-hide_banner", "-loglevel", "error", "-autoexit", "-window_title", title, "-f", "g726",
-               "-code_size", "3", "-sample_rate", "8000", "-i", "pipe:0"}},
-             {"mpv",
-              {"--title=" + title, "--force-window", "--demuxer=lavf", "--demuxer-lavf-format=g726",
-               "--demuxer-lavf-o=code_size=3,sample_rate=8000", "-"}}});
+      file, argv[1],
+      {{"ffplay",
+        {"-hide_banner", "-loglevel", "error", "-autoexit", "-window_title", title, "-f", "g726",
+         "-code_size", "3", "-sample_rate", "8000", "-i", "pipe:0"}},
+       {"mpv",
+        {"--title=" + title, "--force-window", "--demuxer=lavf", "--demuxer-lavf-format=g726",
+         "--demuxer-lavf-o=code_size=3,sample_rate=8000", "-"}}});
 }

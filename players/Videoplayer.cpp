@@ -13,7 +13,12 @@ namespace {
 /// Reads the header; the file then stands at the first byte of the stream.
 std::optional<RECORD_FILE_HEADER> read_header(int file) {
   RECORD_FILE_HEADER header;
-  if (read(file, &header, sizeof header) != static_cast<ssize_t>(sizeof header)) return std::nullopt;
+  // A pipe may hand the header over in pieces.
+  for (std::size_t had = 0; had < sizeof header;) {
+    const ssize_t part = read(file, reinterpret_cast<char *>(&header) + had, sizeof header - had);
+    if (part <= 0) return std::nullopt;
+    had += static_cast<std::size_t>(part);
+  }
   return header;
 }
 
@@ -59,5 +64,5 @@ int main(int argc, char **argv) {
     std::fprintf(stderr, "%s: no recording header\n", argv[1]);
     return 1;
   }
-  return players::hand_over(file, commands(*header, format, window_title(*header, argv[1])));
+  return players::hand_over(file, argv[1], commands(*header, format, window_title(*header, argv[1])));
 }

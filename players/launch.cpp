@@ -44,17 +44,26 @@ std::string base_name(const std::string &path) {
   return path.substr(path.rfind('/') + 1);
 }
 
-int hand_over(int file, const std::vector<Command> &commands) {
+int hand_over(int file, const char *path, const std::vector<Command> &commands) {
+  struct stat info {};
+  if (fstat(file, &info) == 0 && S_ISREG(info.st_mode) && lseek(file, 0, SEEK_CUR) >= info.st_size) {
+    std::fprintf(stderr, "%s: nothing is recorded in this file\n", path);
+    return 1;
+  }
   if (dup2(file, STDIN_FILENO) < 0) {
     std::perror("dup2");
     return 1;
   }
-  if (file != STDIN_FILENO) close(file);
+  // Whoever started this program may have left its own descriptors open, the card's among them.
+  closefrom(STDERR_FILENO + 1);
+  bool installed = false;
   for (const Command &command : commands) {
     run(command);
-    if (errno != ENOENT) std::fprintf(stderr, "%s: %s\n", command.program.c_str(), std::strerror(errno));
+    if (errno == ENOENT) continue;
+    installed = true;
+    std::fprintf(stderr, "%s: %s\n", command.program.c_str(), std::strerror(errno));
   }
-  std::fputs("No player found. Install ffplay (package ffmpeg) or mpv.\n", stderr);
+  if (!installed) std::fputs("No player found. Install ffplay (package ffmpeg) or mpv.\n", stderr);
   return 1;
 }
 

@@ -24,8 +24,10 @@ int open_argument(int argc, char **argv);
 std::string base_name(const std::string &path);
 
 /// Replaces this process by the first of the players that is installed, `file` being its standard input
-/// from its current position on. Returns 1, with a message on standard error, when none is installed.
-int hand_over(int file, const std::vector<Command> &commands);
+/// from its current position on; all other descriptors but standard output and error are closed. Returns 1,
+/// with a message on standard error, when nothing is left to read or no player can be run. `path` is the
+/// file's name for the message.
+int hand_over(int file, const char *path, const std::vector<Command> &commands);
 
 }  // namespace players
 
