@@ -35,6 +35,8 @@ using virtual_card::ClockMode;
 using virtual_card::Supply;
 namespace fs = std::filesystem;
 
+std::atomic<int> hours_ahead{0};
+
 constexpr double kVideoRate = 480;
 constexpr double kAudioRate = 62.5;
 
@@ -264,7 +266,7 @@ void rotation(benchmark::State &state) {
     std::vector<double> without;
     for (int round = 0; round < 5; ++round) {
       recording.dialog().StartRecord();
-      g_cur_hour = (g_cur_hour + 1) % 24;
+      hours_ahead += 1;
       const auto start = clock::now();
       recording.dialog().TimerTick();
       with_files.push_back(ms_since(start) - 1000);
@@ -288,6 +290,7 @@ void rotation(benchmark::State &state) {
       without.push_back(ms_since(bare_start));
       zv_Stop(zv_handle);
     }
+    bench::note("rotation of 20 files beyond its one-second pause", bench::median(with_files), "ms");
     bench::figure("rotation of 20 files beyond its pause and the SDK's own pauses",
                   bench::median(with_files) - bench::median(without), 1000.0 / 30, "ms");
   }
@@ -295,3 +298,12 @@ void rotation(benchmark::State &state) {
 BENCHMARK(rotation)->Iterations(1)->Unit(benchmark::kSecond);
 
 }  // namespace
+
+// The wall clock, some hours ahead: a rotation opens files that are not there yet.
+extern "C" time_t time(time_t *result) noexcept {
+  timespec now{};
+  clock_gettime(CLOCK_REALTIME_COARSE, &now);
+  now.tv_sec += hours_ahead * 3600;
+  if (result != nullptr) *result = now.tv_sec;
+  return now.tv_sec;
+}

@@ -1,6 +1,7 @@
 /// Processor clocks, and the bare driver the SDK is measured against: the calls of a capture pass on the
 /// device nodes, and nothing else.
-#pragma once
+#ifndef BENCH_MEASURE_H
+#define BENCH_MEASURE_H
 
 #include <cstdint>
 #include <functional>
@@ -45,3 +46,5 @@ virtual_card::Supply ready_made_supply(std::size_t size, bool mpeg4, bool mjpeg,
 virtual_card::Supply encoded_supply(int frames);
 
 }  // namespace bench
+
+#endif

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <limits>
 
 namespace bench {
 namespace {
@@ -15,6 +16,7 @@ struct Line {
 };
 
 std::vector<Line> lines;
+constexpr double kNoLimit = std::numeric_limits<double>::infinity();
 
 std::string format(const char *pattern, double a, double b, double c, double d) {
   char text[160];
@@ -52,15 +54,20 @@ void figure(const std::string &name, double value, double limit, const std::stri
   lines.push_back({name, value, limit, unit, ""});
 }
 
+void note(const std::string &name, double value, const std::string &unit) {
+  lines.push_back({name, value, kNoLimit, unit, ""});
+}
+
 bool print_report() {
   bool all_hold = true;
-  std::printf("\n%-62s %10s %10s\n", "what", "measured", "limit");
+  std::printf("\n%-66s %12s %12s\n", "what", "measured", "limit");
   for (const Line &line : lines) {
     const bool holds = line.value <= line.limit;
     all_hold = all_hold && holds;
-    std::printf("%-62s %8.2f %-2s %7.2f %-2s %s%s%s\n", line.name.c_str(), line.value, line.unit.c_str(),
-                line.limit, line.unit.c_str(), holds ? "holds" : "EXCEEDED", line.detail.empty() ? "" : "  ",
-                line.detail.c_str());
+    std::printf("%-66s %9.2f %-2s ", line.name.c_str(), line.value, line.unit.c_str());
+    if (line.limit < kNoLimit)
+      std::printf("%9.2f %-2s %s", line.limit, line.unit.c_str(), holds ? "holds" : "EXCEEDED");
+    std::printf("  %s\n", line.detail.c_str());
   }
   return all_hold;
 }

@@ -1,6 +1,7 @@
 /// Ratios of the benchmarks: collected while they run, printed as one table at the end, with the limit
 /// each has to keep.
-#pragma once
+#ifndef BENCH_REPORT_H
+#define BENCH_REPORT_H
 
 #include <functional>
 #include <string>
@@ -16,9 +17,14 @@ void compare(const std::string &name, int rounds, double limit, const std::funct
 /// Reports a figure that has to stay at or below a limit.
 void figure(const std::string &name, double value, double limit, const std::string &unit);
 
+/// Reports a figure that has no limit.
+void note(const std::string &name, double value, const std::string &unit);
+
 /// Prints the table. False when a limit is exceeded.
 bool print_report();
 
 double median(std::vector<double> values);
 
 }  // namespace bench
+
+#endif
