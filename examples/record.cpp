@@ -12,6 +12,7 @@
 #include <chrono>
 #include <cstdio>
 #include <cstring>
+#include <thread>
 #include <utility>
 
 #include "card.h"
@@ -30,6 +31,7 @@ struct Stream {
 std::array<Stream, ZV_CHANNELS> video;
 std::array<Stream, ZV_AUDIO_CHANNELS> audio;
 std::atomic<int> write_error{0};  // errno of a write that failed on an SDK thread
+std::atomic<bool> interrupted{false};
 
 // --- The SDK calls these, on threads of its own
 
@@ -103,23 +105,31 @@ void configure(HANDLE card, const RecordOptions &options) {
   check(zv_StartMotionDetection(card), "zv_StartMotionDetection");
 }
 
+void on_signal(int) {
+  interrupted = true;
+}
+
+/// From here on Ctrl-C and a polite kill end the recording. A second one ends the program, in case the
+/// card hangs; so does the first one while the card is being opened.
+void catch_signals() {
+  struct sigaction action {};
+  action.sa_handler = on_signal;
+  action.sa_flags = SA_RESTART | static_cast<int>(SA_RESETHAND);
+  sigaction(SIGINT, &action, nullptr);
+  sigaction(SIGTERM, &action, nullptr);
+}
+
 /// Returns when the time is over, a signal has come or a write has failed; the seconds that have passed.
-double wait_for_end(unsigned seconds, const sigset_t &signals) {
-  const timespec pause{.tv_sec = 0, .tv_nsec = 2'000'000};
+double wait_for_end(unsigned seconds) {
   const auto start = Clock::now();
   const auto end = start + std::chrono::seconds(seconds);
-  while (Clock::now() < end && !write_error && sigtimedwait(&signals, nullptr, &pause) <= 0) {
+  while (Clock::now() < end && !write_error && !interrupted) {
+    std::this_thread::sleep_for(std::chrono::milliseconds(2));
   }
   return std::chrono::duration<double>(Clock::now() - start).count();
 }
 
 void record(const RecordOptions &options) {
-  sigset_t signals;
-  sigemptyset(&signals);
-  sigaddset(&signals, SIGINT);
-  sigaddset(&signals, SIGTERM);
-  pthread_sigmask(SIG_BLOCK, &signals, nullptr);  // the SDK's threads inherit it
-
   Card card;
   configure(card.handle, options);
 
@@ -131,8 +141,9 @@ void record(const RecordOptions &options) {
   // The card encodes each channel with both codecs; a null callback leaves the other one out.
   check(zv_RegisterCallBack(card.handle, mpeg4 ? on_video : nullptr, mpeg4 ? nullptr : on_video, on_audio),
         "zv_RegisterCallBack");
+  catch_signals();
   check(zv_Start(card.handle), "zv_Start");
-  const double seconds = wait_for_end(options.seconds, signals);
+  const double seconds = wait_for_end(options.seconds);
   check(zv_Stop(card.handle), "zv_Stop");  // from here on no callback runs
 
   close_files(video, seconds);

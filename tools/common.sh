@@ -47,13 +47,17 @@ build() {
 # use_card CARD-LIBRARY: fills the array ON_CARD with the command that puts a program on the card of this
 # machine, or else on the virtual card: "${ON_CARD[@]}" PROGRAM .... A program built with a sanitizer needs
 # the sanitizer's runtime in front of the card. ZARVO_PRELOAD names one more library, to stand behind it.
+# The list of libraries has no quoting, so the card stands in it by its name alone and is found by its folder.
 use_card() {
-  local runtime
+  local runtime folder
   ON_CARD=(env)
   [ ! -e /dev/zarvo_enc0 ] || return 0
   [ -f "$1" ] || die "the virtual card $1 is not built"
+  folder=$(cd "$(dirname "$1")" && pwd)
+  case $folder in *[:\;]*) die "the virtual card cannot be put in front of a program from a folder with ':' or ';' in its name: $folder" ;; esac
   runtime=$(ldd "$1" | awk '/lib(asan|tsan)\.so/ && !found++ { print $3 }')
-  ON_CARD+=("LD_PRELOAD=${runtime:+$runtime:}$1${ZARVO_PRELOAD:+:$ZARVO_PRELOAD}")
+  ON_CARD+=("LD_LIBRARY_PATH=$folder${LD_LIBRARY_PATH:+:$LD_LIBRARY_PATH}"
+    "LD_PRELOAD=${runtime:+$runtime:}${1##*/}${ZARVO_PRELOAD:+:$ZARVO_PRELOAD}${LD_PRELOAD:+:$LD_PRELOAD}")
 }
 
 # wait_until SECONDS COMMAND...: waits for a condition, false when it has not come true in that time.

@@ -5,7 +5,7 @@
 
 OPERATOR_FOLDER=   # display number, log, widget positions; removed at the end
 DIALOG=            # X window of the dialog
-declare -A WIDGET  # object name to "x y" in the dialog
+declare -A WIDGET=()  # object name to "x y" in the dialog
 
 # open_display: an X server without a screen, and a window manager on it.
 open_display() {
@@ -38,7 +38,7 @@ close_display() {
 start_program() {
   LOG=$1/output.log
   use_card "$CARD"
-  read_widget_map
+  [ ${#WIDGET[@]} -gt 0 ] || read_widget_map
   (cd "$1" && exec "${ON_CARD[@]}" "$PROGRAM") >"$LOG" 2>&1 &
   DEMO=$!
   wait_until 30 dialog_shown || die "the dialog did not appear: $(cat "$LOG")"

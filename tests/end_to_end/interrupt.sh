@@ -1,11 +1,14 @@
 #!/usr/bin/env bash
 # Ctrl-C and a polite kill end a recording early, with status 0 and complete files.
+# A program that hangs before it records ends at once.
 . "$(dirname "$0")/common.sh"
+
+# A background job of a script ignores SIGINT; env gives the program the default back.
+RECORD=(env --default-signal=INT "${ON_CARD[@]}" "$ZARVO_RECORD")
 
 for signal in INT TERM; do
   out=$FOLDER/$signal
-  # A background job of a script ignores SIGINT; env gives the program the default back.
-  "${ON_CARD[@]}" --default-signal=INT "$ZARVO_RECORD" --seconds 600 --channels 1-4 --output "$out" >"$FOLDER/log" 2>&1 &
+  "${RECORD[@]}" --seconds 600 --channels 1-4 --output "$out" >"$FOLDER/log" 2>&1 &
   recorder=$!
   expect "no data came: $(cat "$FOLDER/log")" wait_until 30 test -s "$out/ch04.m4v" -a -s "$out/audio4.g726"
   kill -s "$signal" "$recorder"
@@ -18,3 +21,15 @@ for signal in INT TERM; do
     expect_equal "frames in $file and in its line" "$told" "$(decoded_frames "$file")"
   done
 done
+
+# The second file is a pipe that nobody reads: opening it hangs, as a bad driver's open may.
+mkdir "$FOLDER/hang"
+mkfifo "$FOLDER/hang/ch02.m4v"
+"${RECORD[@]}" --seconds 600 --channels 1-2 --output "$FOLDER/hang" >"$FOLDER/log" 2>&1 &
+recorder=$!
+expect "no file came: $(cat "$FOLDER/log")" wait_until 30 test -e "$FOLDER/hang/ch01.m4v"
+kill -s INT "$recorder"
+expect "the program hangs in spite of SIGINT" wait_until 10 process_gone "$recorder"
+status=0
+wait "$recorder" || status=$?
+expect_equal "status after SIGINT before the recording" 130 "$status"
