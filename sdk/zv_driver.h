@@ -21,6 +21,7 @@ inline constexpr char kDisplayNode[] = "/dev/zarvo_disp0";
 inline constexpr char kAudioNode[] = "/dev/zarvo_g723_0";
 inline constexpr char kVideoInputNode[] = "/dev/zarvo_vin0";
 inline constexpr char kDecoderNode[] = "/dev/zarvo_dec0";
+inline constexpr char kNodePrefix[] = "/dev/zarvo_";  // what they all begin with
 
 // Commands of the encoder device.
 inline constexpr u32 ENC_IOC_SET_SCALE = 0x40086500;           // ChannelValue

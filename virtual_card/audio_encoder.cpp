@@ -65,17 +65,20 @@ void AudioEncoder::Closer::operator()(AVPacket *packet) const {
   av_packet_free(&packet);
 }
 
-AudioEncoder::AudioEncoder(unsigned input)
-    : second_(beep(tone_frequency(input))),
-      encoder_(open_encoder()),
-      frame_(av_frame_alloc()),
-      packet_(av_packet_alloc()) {}
-
 AudioEncoder::~AudioEncoder() = default;
+
+/// At the first block: many an opened card never encodes sound.
+bool AudioEncoder::start() {
+  if (second_.empty()) second_ = beep(tone_frequency(input_));
+  if (!encoder_) encoder_.reset(open_encoder());
+  if (!frame_) frame_.reset(av_frame_alloc());
+  if (!packet_) packet_.reset(av_packet_alloc());
+  return encoder_ && frame_ && packet_;
+}
 
 std::array<u8, driver::kAudioBlockSize> AudioEncoder::encode(std::int64_t block, bool sound) {
   std::array<u8, driver::kAudioBlockSize> bytes{};
-  if (!encoder_ || !frame_ || !packet_) return bytes;
+  if (!start()) return bytes;
   std::array<std::int16_t, kBlockSamples> samples{};
   if (sound) {
     auto at = static_cast<std::size_t>(block * kBlockSamples % kSampleRate);

@@ -26,18 +26,21 @@ unsigned tone_frequency(unsigned input);
 
 class AudioEncoder {
  public:
-  explicit AudioEncoder(unsigned input);
+  explicit AudioEncoder(unsigned input) : input_(input) {}
   ~AudioEncoder();
 
   /// Encodes block number `block` of the input's test sound, a beep a second, or of silence.
   std::array<u8, driver::kAudioBlockSize> encode(std::int64_t block, bool sound);
 
  private:
+  bool start();
+
   struct Closer {
     void operator()(AVCodecContext *encoder) const;
     void operator()(AVFrame *frame) const;
     void operator()(AVPacket *packet) const;
   };
+  unsigned input_;
   std::vector<std::int16_t> second_;  ///< the sound repeats every second
   std::unique_ptr<AVCodecContext, Closer> encoder_;
   std::unique_ptr<AVFrame, Closer> frame_;

@@ -52,9 +52,19 @@ bool pattern(unsigned channel, u32 x, u32 y) {
   }
 }
 
-Area clock_area(const Font &font, u32 lines) {
+/// All cameras share these, made when the first of them draws. The card may draw until the process ends.
+const Font &clock_font() {
+  static const Font *const font = new Font(kClockHeight);
+  return *font;
+}
+const Coverage &ball() {
+  static const Coverage *const coverage = new Coverage(disc(kBallSize));
+  return *coverage;
+}
+
+Area clock_area(u32 lines) {
   const u32 y = lines - kClockFromBottom;
-  return {kClockX, y, kClockX + font.text_width("00:00:00.00"), y + kClockHeight};
+  return {kClockX, y, kClockX + clock_font().text_width("00:00:00.00"), y + kClockHeight};
 }
 
 /// The ball's corner: a slow figure over the whole picture below the bars, each camera at its own pace.
@@ -77,8 +87,6 @@ auto as_tuple(const PictureSettings &s) {
 
 }  // namespace
 
-Camera::Camera(unsigned channel) : channel_(channel), clock_font_(kClockHeight), ball_(disc(kBallSize)) {}
-
 bool Camera::same(const Settings &a, const Settings &b) {
   return std::tie(a.width, a.lines, a.scene, a.lost) == std::tie(b.width, b.lines, b.scene, b.lost) &&
          as_tuple(a.picture) == as_tuple(b.picture) && as_tuple(a.mask) == as_tuple(b.mask);
@@ -91,7 +99,7 @@ bool Camera::adjust(const CardState &state) {
       state.width,     state.lines(),
       channel.picture, clip({mask.x_start, mask.y_start, mask.x_end, mask.y_end}, state.width, state.lines()),
       channel.scene,   channel.lost};
-  if (same(settings, settings_)) return false;
+  if (backdrop_drawn_ && same(settings, settings_)) return false;
   settings_ = settings;
   controls_ = PictureControls(settings.picture);
   draw_backdrop();
@@ -104,6 +112,7 @@ void Camera::show_film(std::shared_ptr<Film> film) {
 }
 
 void Camera::draw_backdrop() {
+  backdrop_drawn_ = false;
   backdrop_.resize(settings_.width, settings_.lines);
   if (settings_.lost) {
     fill(backdrop_, {0, 0, settings_.width, settings_.lines}, kLostBlue);
@@ -116,6 +125,7 @@ void Camera::draw_backdrop() {
   drawn_ = {kNever, kNever};
   ball_area_ = {};
   film_frame_ = -1;
+  backdrop_drawn_ = true;
 }
 
 void Camera::draw_scene() {
@@ -145,7 +155,7 @@ void Camera::draw_scene() {
   if (settings_.scene == Scene::still) {
     draw_frame_mark(backdrop_, {channel_, 0, false}, kMarkBlack, kMarkWhite, kAllLines);
   } else {
-    const Area clock = clock_area(clock_font_, lines);
+    const Area clock = clock_area(lines);
     fill(backdrop_, {clock.x_start - 8, clock.y_start - 6, clock.x_end + 8, clock.y_end + 6}, kClockBox);
   }
 }
@@ -166,13 +176,13 @@ void Camera::draw_moving(const FieldMoment &moment) {
   const u32 width = settings_.width, lines = settings_.lines;
   const u32 parity = moment.parity();
   const Lines field = field_lines(parity);
-  const Area clock = clock_area(clock_font_, lines);
+  const Area clock = clock_area(lines);
 
   copy_area(picture_, backdrop_, ball_area_[parity], field);
   copy_area(picture_, backdrop_, clock, field);
   ball_area_[parity] = ball_area(channel_, moment.seconds, width, lines);
-  blend(picture_, ball_, ball_area_[parity].x_start, ball_area_[parity].y_start, ball_colour_, field);
-  draw_text(picture_, clock_font_, moment.clock(), clock.x_start, clock.y_start, controls_.apply(kWhite),
+  blend(picture_, ball(), ball_area_[parity].x_start, ball_area_[parity].y_start, ball_colour_, field);
+  draw_text(picture_, clock_font(), moment.clock(), clock.x_start, clock.y_start, controls_.apply(kWhite),
             field);
   const FrameMark mark{channel_, static_cast<std::uint32_t>(moment.number / 2), parity != 0};
   draw_frame_mark(picture_, mark, controls_.apply({kMarkBlack, 128, 128}).y,

@@ -21,7 +21,7 @@ namespace virtual_card {
 
 class Camera {
  public:
-  explicit Camera(unsigned channel);
+  explicit Camera(unsigned channel) : channel_(channel) {}
 
   /// Takes the settings of the channel over. True when the picture changes with them.
   bool adjust(const CardState &state);
@@ -53,9 +53,8 @@ class Camera {
   unsigned channel_;
   Settings settings_;
   PictureControls controls_;
-  Font clock_font_;
-  Coverage ball_;
   Colour ball_colour_{};
+  bool backdrop_drawn_ = false;
   Picture backdrop_;  ///< all that stands still, properties and mask applied
   Picture picture_;
   std::array<std::int64_t, 2> drawn_{kNever, kNever};  ///< number of the field in the lines of each parity

@@ -7,6 +7,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <system_error>
 
 #include "device_audio.h"
 #include "device_display.h"
@@ -18,8 +19,18 @@ namespace virtual_card {
 namespace {
 
 constinit std::atomic<Card *> current{nullptr};
-constinit std::mutex creation_mutex;  // guards the making of the card
-Card *left_to_parent = nullptr;       // after a fork; kept so that leak checkers find it
+constinit std::mutex creation_mutex;         // guards the making of the card
+Card *left_to_parent = nullptr;              // after a fork; kept so that leak checkers find it
+constinit thread_local bool making = false;  // this thread is making the card
+
+/// A film among the options is opened with the host's calls, which may lead back here.
+class Making {
+ public:
+  Making() { making = true; }
+  ~Making() { making = false; }
+  Making(const Making &) = delete;
+  Making &operator=(const Making &) = delete;
+};
 
 /// Ends the card's threads before the host's libraries are torn down.
 struct AtExit {
@@ -42,8 +53,10 @@ Device device_of(const char *path) {
 
 Card &Card::instance() {
   if (Card *card = current.load(std::memory_order_acquire)) return *card;
+  if (making) throw std::system_error(EBUSY, std::generic_category());
   const std::lock_guard lock(creation_mutex);
   if (Card *card = current.load(std::memory_order_acquire)) return *card;
+  const Making now;
   static const AtExit at_exit;
   Card *card = new Card;
   current.store(card, std::memory_order_release);
@@ -105,8 +118,7 @@ long Card::power_on() {
   if (open_ == 0 && mapped_ == 0)
     for (const auto &each : nodes_)
       if (const long error = each->region().create()) return error;
-  if (open_ == 0 && !off_) runner_.start();
-  return 0;
+  return open_ == 0 && !off_ ? runner_.start() : 0;
 }
 
 void Card::power_down_if_unused() {

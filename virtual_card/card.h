@@ -27,6 +27,7 @@ struct MapRequest {
 class Card {
  public:
   /// Made at the first use, and never destroyed: the host's threads may outlive its destructors.
+  /// Throws std::system_error, EBUSY, where making it leads back here.
   static Card &instance();
   /// A forked child has none of the card's threads: it begins with a card of its own.
   static void before_fork();

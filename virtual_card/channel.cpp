@@ -1,6 +1,7 @@
 #include "channel.h"
 
 #include <algorithm>
+#include <new>
 
 namespace virtual_card {
 
@@ -42,11 +43,22 @@ void Channel::draw(const CardState &state, const FieldMoment &moment) {
 }
 
 void Channel::process(const CardState &state, const FieldMoment &moment, const Work &work) {
-  adjust(state);
-  if (work.size && work.size->interlaced) camera_.draw(moment.field_before());
-  camera_.draw(moment);
-  if (work.look) motion_.look(camera_.picture(), moment.number);
-  if (work.size) encode(state, moment.parity(), *work.size);
+  try {
+    adjust(state);
+    if (work.size && work.size->interlaced) camera_.draw(moment.field_before());
+    camera_.draw(moment);
+    if (work.look) motion_.look(camera_.picture(), moment.number);
+    if (work.size) encode(state, moment.parity(), *work.size);
+  } catch (const std::bad_alloc &) {
+    lose_output();
+  }
+}
+
+/// What follows must not build on a frame nobody gets.
+void Channel::lose_output() {
+  mpeg4_.reset();
+  output_.mpeg4.bitstream.clear();
+  output_.jpeg.clear();
 }
 
 void Channel::encode(const CardState &state, u32 parity, EncodedSize size) {

@@ -38,7 +38,7 @@ class Channel {
     EncodedSize size{};
     std::vector<u8> jpeg;
   };
-  /// What the last process() has encoded.
+  /// What the last process() has encoded; empty where it could not.
   const Output &output() const { return output_; }
 
   Camera &camera() { return camera_; }
@@ -47,6 +47,7 @@ class Channel {
  private:
   void adjust(const CardState &state);
   void encode(const CardState &state, u32 parity, EncodedSize size);
+  void lose_output();
 
   unsigned number_;
   Camera camera_;

@@ -1,5 +1,7 @@
 #include "descriptors.h"
 
+#include <unistd.h>
+
 #include <algorithm>
 #include <array>
 #include <atomic>
@@ -11,6 +13,7 @@ namespace {
 
 constexpr std::uint8_t kForeign = 0;
 constexpr std::uint8_t kOrphan = 0xFF;
+constexpr std::uint8_t kInner = 0xFE;
 
 std::uint8_t mark_of(Device device) {
   return static_cast<std::uint8_t>(static_cast<int>(device) + 1);
@@ -18,6 +21,7 @@ std::uint8_t mark_of(Device device) {
 
 constinit std::array<std::atomic<std::uint8_t>, kTableSize> marks{};  // device + 1 of each number
 constinit std::atomic<int> open_count{0};                             // marks of devices
+constinit std::atomic<pid_t> home{0};                                 // process of the card
 
 struct Mapping {
   std::uintptr_t start;
@@ -37,7 +41,8 @@ std::atomic<std::uint8_t> *mark(int fd) {
 }
 
 Owner owner_of(std::uint8_t value) {
-  if (value == kForeign) return {};
+  if (value == kForeign || !at_home()) return {};
+  if (value == kInner) return {false, Device::none, true};
   return {true, value == kOrphan ? Device::none : static_cast<Device>(value - 1)};
 }
 
@@ -46,7 +51,21 @@ std::uintptr_t end_of(const void *address, std::size_t length) {
   return (reinterpret_cast<std::uintptr_t>(address) + length + kPage - 1) & ~(kPage - 1);
 }
 
+bool set(int fd, std::uint8_t value) {
+  auto *entry = mark(fd);
+  if (entry != nullptr) entry->store(value, std::memory_order_relaxed);
+  return entry != nullptr;
+}
+
 }  // namespace
+
+bool at_home() {
+  return home.load(std::memory_order_relaxed) == getpid();
+}
+
+void settle() {
+  home = getpid();
+}
 
 Owner owner(int fd) {
   const auto *entry = mark(fd);
@@ -54,11 +73,13 @@ Owner owner(int fd) {
 }
 
 bool add(int fd, Device device) {
-  auto *entry = mark(fd);
-  if (entry == nullptr) return false;
-  entry->store(device == Device::none ? kOrphan : mark_of(device), std::memory_order_relaxed);
+  if (!set(fd, device == Device::none ? kOrphan : mark_of(device))) return false;
   if (device != Device::none) ++open_count;
   return true;
+}
+
+bool add_inner(int fd) {
+  return set(fd, kInner);
 }
 
 Owner remove(int fd) {
@@ -80,7 +101,7 @@ void add_mapping(void *address, std::size_t length, Device device) {
 }
 
 std::optional<Device> mapping(const void *address, std::size_t length) {
-  if (mapping_count == 0) return {};
+  if (mapping_count == 0 || !at_home()) return {};
   const auto start = reinterpret_cast<std::uintptr_t>(address);
   const std::uintptr_t end = end_of(address, length);
   const std::lock_guard lock(mapping_mutex);
@@ -109,11 +130,15 @@ void before_fork() {
 
 void after_fork(bool child) {
   if (child) {
+    settle();
     mapping_list().clear();
     mapping_count = 0;
     open_count = 0;
-    for (auto &entry : marks)
-      if (entry.load(std::memory_order_relaxed) != kForeign) entry.store(kOrphan, std::memory_order_relaxed);
+    for (auto &entry : marks) {
+      const std::uint8_t value = entry.load(std::memory_order_relaxed);
+      // The parent's inner descriptors serve nothing here: the host may close them with the rest.
+      if (value != kForeign) entry.store(value == kInner ? kForeign : kOrphan, std::memory_order_relaxed);
+    }
   }
   mapping_mutex.unlock();
 }

@@ -1,7 +1,8 @@
 /**
  * @file descriptors.h
  * Which descriptors of the process are the card's, and which mappings. Telling that one is not costs
- * one atomic load.
+ * one atomic load. In a process that shares this memory without being this process, as the child of a
+ * vfork is, none of them is.
  */
 #ifndef VIRTUAL_CARD_DESCRIPTORS_H
 #define VIRTUAL_CARD_DESCRIPTORS_H
@@ -21,11 +22,19 @@ struct Owner {
   bool ours = false;
   /// Device::none: a descriptor that came through a fork. Its card stayed with the parent.
   Device device = Device::none;
+  /// The card's own, which the host neither has nor may close. Not `ours` to answer for.
+  bool inner = false;
 };
 Owner owner(int fd);
+/// This process is the one the card is in.
+bool at_home();
+/// From now on it is this one.
+void settle();
 
 /// False when the number is beyond the table.
 bool add(int fd, Device device);
+/// The same for a descriptor of the card's own.
+bool add_inner(int fd);
 /// Forgets a number; what it stood for.
 Owner remove(int fd);
 /// Descriptors that reach the card.

@@ -73,11 +73,16 @@ void Engine::Parts::take_films() {
 
 void Engine::Parts::queue_output(unsigned channel, std::chrono::microseconds time) {
   const Channel::Output &output = channels[channel]->output();
-  if (!output.mpeg4.bitstream.empty()) {
-    mpeg4.push(mpeg4_frame(channel, output.mpeg4.intra ? 0 : 1, output.mpeg4.bitstream, time));
+  if (output.mpeg4.bitstream.empty()) {
+    mpeg4.missed(1);
+  } else {
+    mpeg4.push_new(
+        [&] { return mpeg4_frame(channel, output.mpeg4.intra ? 0 : 1, output.mpeg4.bitstream, time); });
   }
-  if (!output.jpeg.empty()) {
-    mjpeg.push(mjpeg_frame(channel, output.size.width, output.size.height, output.jpeg));
+  if (output.jpeg.empty()) {
+    mjpeg.missed(1);
+  } else {
+    mjpeg.push_new([&] { return mjpeg_frame(channel, output.size.width, output.size.height, output.jpeg); });
   }
 }
 
@@ -110,13 +115,15 @@ void Engine::field(const CardState &state, FieldTime time) {
 }
 
 void Engine::audio_block(const CardState &state, std::int64_t block) {
-  ReadyFrame frame;
-  frame.result = driver::kAudioReadCount;
-  for (unsigned i = 0; i < kAudioInputs; ++i) {
-    const auto bytes = parts_->inputs[i].encode(block, ((state.sound_present >> i) & 1) != 0);
-    frame.area.insert(frame.area.end(), bytes.begin(), bytes.end());
-  }
-  parts_->audio.push(std::move(frame));
+  parts_->audio.push_new([&] {
+    ReadyFrame frame;
+    frame.result = driver::kAudioReadCount;
+    for (unsigned i = 0; i < kAudioInputs; ++i) {
+      const auto bytes = parts_->inputs[i].encode(block, ((state.sound_present >> i) & 1) != 0);
+      frame.area.insert(frame.area.end(), bytes.begin(), bytes.end());
+    }
+    return frame;
+  });
 }
 
 void Engine::compose(const CardState &state, std::span<u8> uyvy) {
@@ -178,6 +185,10 @@ bool Engine::show_film(unsigned channel, const std::string &path, std::string *e
   const std::lock_guard lock(parts_->films_mutex);
   parts_->new_films[channel] = std::move(film);
   return true;
+}
+
+void Engine::rest() {
+  parts_->pool.stop();
 }
 
 void Engine::reset() {

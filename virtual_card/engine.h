@@ -46,6 +46,8 @@ class Engine {
   /// Puts a film in front of a camera, or takes it away with an empty path. Any thread.
   bool show_film(unsigned channel, const std::string &path, std::string *error);
 
+  /// Ends the threads inside, until the next field or preview. Same thread rule as field().
+  void rest();
   /// Encoders, maps, films and pictures as at power-up.
   void reset();
 

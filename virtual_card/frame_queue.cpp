@@ -10,13 +10,17 @@ FrameQueue::FrameQueue(std::size_t capacity) : capacity_(capacity) {}
 bool FrameQueue::push(ReadyFrame frame) {
   {
     const std::lock_guard lock(mutex_);
+    const std::size_t size = frame.area.size();
+    const bool fits = bytes_ + size <= capacity_;
+    if (fits) {
+      frames_.push_back(std::move(frame));
+      bytes_ += size;
+    }
     ++counters_.made;
-    if (bytes_ + frame.area.size() > capacity_) {
+    if (!fits) {
       ++counters_.lost;
       return false;
     }
-    bytes_ += frame.area.size();
-    frames_.push_back(std::move(frame));
   }
   filled_.notify_one();
   return true;

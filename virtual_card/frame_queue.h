@@ -11,6 +11,7 @@
 #include <cstdint>
 #include <deque>
 #include <mutex>
+#include <new>
 #include <optional>
 #include <vector>
 
@@ -25,6 +26,15 @@ class FrameQueue {
 
   /// False when the frame was lost.
   bool push(ReadyFrame frame);
+  /// Pushes the frame that `make` returns. One for which memory is short is lost.
+  template <typename Make>
+  void push_new(Make make) {
+    try {
+      push(make());
+    } catch (const std::bad_alloc &) {
+      missed(1);
+    }
+  }
   /// The oldest frame, waiting for one at most `wait`; none after the wait or a wake().
   std::optional<ReadyFrame> pop(std::chrono::microseconds wait);
   /// Ends the waits of pop() now in progress.

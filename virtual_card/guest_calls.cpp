@@ -10,6 +10,8 @@
 #include <cstring>
 #include <exception>
 #include <new>
+#include <string_view>
+#include <system_error>
 
 #include "card.h"
 #include "descriptors.h"
@@ -21,10 +23,9 @@ namespace {
 using descriptors::owner;
 using descriptors::Owner;
 
-constexpr char kPrefix[] = "/dev/zarvo_";
-
 bool is_node(const char *path) {
-  return path != nullptr && std::strncmp(path, kPrefix, sizeof kPrefix - 1) == 0;
+  constexpr std::string_view kPrefix = driver::kNodePrefix;
+  return path != nullptr && std::strncmp(path, kPrefix.data(), kPrefix.size()) == 0;
 }
 
 /// Runs a call of the card, whose results below zero are negated error numbers as a driver's are.
@@ -38,6 +39,8 @@ long answer(Call call) {
     result = call();
   } catch (const std::bad_alloc &) {
     result = -ENOMEM;
+  } catch (const std::system_error &error) {
+    result = -error.code().value();
   } catch (const std::exception &) {
     result = -EIO;
   }
@@ -51,6 +54,7 @@ long answer(Call call) {
 
 int open_node(const char *path, int flags) {
   return static_cast<int>(answer([&]() -> long {
+    if (!descriptors::at_home()) return -ENODEV;
     const Device device = device_of(path);
     const long fd = Card::instance().open(device, flags);
     if (fd < 0) return fd;
@@ -101,8 +105,27 @@ void close_nodes(unsigned first, unsigned last) {
     if (owner(static_cast<int>(fd)).ours) guest::close(static_cast<int>(fd));
 }
 
+/// Goes over the parts of a range that lie before and between the card's own numbers; where the last
+/// part, behind them all, begins.
+template <typename Part>
+unsigned around_inner(unsigned first, unsigned last, Part part) {
+  for (unsigned fd = first; fd <= last && fd < descriptors::kTableSize; ++fd) {
+    if (!owner(static_cast<int>(fd)).inner) continue;
+    if (fd > first) part(first, fd - 1);
+    first = fd + 1;
+  }
+  return first;
+}
+
+/// What dup2 and dup3 answer for a number that is the card's own.
+int busy() {
+  errno = EBUSY;
+  return -1;
+}
+
 struct AtLoad {
   AtLoad() {
+    descriptors::settle();
     leave_preload_list();
     pthread_atfork(
         [] {
@@ -132,18 +155,25 @@ int openat(real::Name spelling, int directory, const char *path, int flags, mode
 }
 
 int close(int fd) {
-  if (!owner(fd).ours) return real::close(fd);
+  const Owner node = owner(fd);
+  if (node.inner) return real::close(-1);
+  if (!node.ours) return real::close(fd);
   return static_cast<int>(answer([&] { return close_node(fd); }));
 }
 
 int close_range(unsigned first, unsigned last, int flags) {
   if ((flags & CLOSE_RANGE_CLOEXEC) == 0) close_nodes(first, last);
-  return real::close_range(first, last, flags);
+  const unsigned rest =
+      around_inner(first, last, [&](unsigned from, unsigned to) { real::close_range(from, to, flags); });
+  return rest > last && rest > first ? 0 : real::close_range(rest, last, flags);
 }
 
 void closefrom(int first) {
-  close_nodes(static_cast<unsigned>(std::max(first, 0)), descriptors::kTableSize);
-  real::closefrom(first);
+  const auto from = static_cast<unsigned>(std::max(first, 0));
+  close_nodes(from, descriptors::kTableSize);
+  real::closefrom(
+      static_cast<int>(around_inner(from, descriptors::kTableSize,
+                                    [](unsigned begin, unsigned end) { real::close_range(begin, end, 0); })));
 }
 
 int ioctl(int fd, unsigned long code, void *argument) {
@@ -198,6 +228,7 @@ int dup(int fd) {
 int dup2(int fd, int to) {
   const Owner source = owner(fd);
   const Owner target = owner(to);
+  if (target.inner) return busy();
   const int result = real::dup2(fd, to);
   if (fd == to) return result;
   replaced(target, to, result);
@@ -207,6 +238,7 @@ int dup2(int fd, int to) {
 int dup3(int fd, int to, int flags) {
   const Owner source = owner(fd);
   const Owner target = owner(to);
+  if (target.inner) return busy();
   const int result = real::dup3(fd, to, flags);
   replaced(target, to, result);
   return duplicated(source, result);

@@ -1,8 +1,12 @@
 #include "runner.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <cstdio>
+#include <new>
+#include <system_error>
 
+#include "card_thread.h"
 #include "encoded_picture.h"
 
 namespace virtual_card {
@@ -25,9 +29,9 @@ std::uint64_t pictures_between(const EncoderSettings &encoder, std::int64_t firs
 
 }  // namespace
 
-void Runner::start() {
+long Runner::start() {
   stop();
-  if (board_.clock.mode() == ClockMode::manual) return;
+  if (board_.clock.mode() == ClockMode::manual) return 0;
   {
     const std::lock_guard lock(run_mutex_);
     const nanoseconds now = board_.clock.now();
@@ -35,17 +39,27 @@ void Runner::start() {
     audio_block_ = std::max(audio_block_, audio_block_at(now));
   }
   stopping_ = false;
-  thread_ = std::thread([this] { loop(); });
+  try {
+    thread_ = start_thread([this] { loop(); });
+  } catch (const std::system_error &error) {
+    return -error.code().value();
+  } catch (const std::bad_alloc &) {
+    return -ENOMEM;
+  }
+  return 0;
 }
 
 void Runner::stop() {
-  if (!thread_.joinable()) return;
-  {
-    const std::lock_guard lock(stop_mutex_);
-    stopping_ = true;
+  if (thread_.joinable()) {
+    {
+      const std::lock_guard lock(stop_mutex_);
+      stopping_ = true;
+    }
+    stop_signal_.notify_all();
+    thread_.join();
   }
-  stop_signal_.notify_all();
-  thread_.join();
+  const std::lock_guard lock(run_mutex_);
+  board_.engine.rest();
 }
 
 void Runner::power_up() {
@@ -129,12 +143,20 @@ nanoseconds Runner::pace_due(Pace &pace, const CardState &state) {
 }
 
 void Runner::run(const Next &next) {
+  try {
+    run_event(next.event);
+  } catch (const std::bad_alloc &) {
+    // Its turn has been counted: the card goes on with what is due next.
+  }
+}
+
+void Runner::run_event(Event event) {
   const auto supply = [](Pace &pace) {
     ++pace.count;
     for (Stream *stream : pace.streams)
       if (stream != nullptr) stream->supply_due();
   };
-  switch (next.event) {
+  switch (event) {
     case Event::field:
       return run_field();
     case Event::audio:
@@ -151,22 +173,21 @@ void Runner::run_field() {
   CardState state = snapshot(&session);
   const bool supplied = board_.supplied;
   if (supplied) state.encoding = false;
-  const nanoseconds due = fields_.due(field_);
-  board_.engine.field(state, {field_, board_.clock.wall(due)});
-  if (state.encoding) board_.drop_frames_of_other_session(session);
-  if (field_ % 2 != 0 && state.display.on) compose(state);
-  ++field_;
+  const std::int64_t field = field_++;
+  const nanoseconds due = fields_.due(field);
   watch(due);
+  board_.engine.field(state, {field, board_.clock.wall(due)});
+  if (state.encoding) board_.drop_frames_of_other_session(session);
+  if (field % 2 != 0 && state.display.on) compose(state);
 }
 
 void Runner::run_audio_block() {
   u32 session = 0;
   const CardState state = snapshot(&session);
-  if (state.encoding && !board_.supplied) {
-    board_.engine.audio_block(state, audio_block_);
-    board_.drop_frames_of_other_session(session);
-  }
-  ++audio_block_;
+  const std::int64_t block = audio_block_++;
+  if (!state.encoding || board_.supplied) return;
+  board_.engine.audio_block(state, block);
+  board_.drop_frames_of_other_session(session);
 }
 
 void Runner::compose(const CardState &state) {

@@ -21,8 +21,9 @@ class Runner {
   Runner &operator=(const Runner &) = delete;
 
   /// Begins the thread, unless the clock is manual. What was due while it did not run is not made up for.
-  void start();
-  /// Ends and joins it. Calling it twice is harmless.
+  /// A negated error number when there is no thread to be had.
+  long start();
+  /// Ends and joins it, and those of the engine. Calling it twice is harmless.
   void stop();
   /// After a power-up of the clock: everything is due from card time 0 again.
   void power_up();
@@ -46,7 +47,9 @@ class Runner {
   void loop();
   /// What is due first.
   Next next();
+  /// What memory is short for is left out.
   void run(const Next &next);
+  void run_event(Event event);
   void run_until(nanoseconds time);
   void run_field();
   void run_audio_block();

@@ -30,7 +30,7 @@ const ReadyFrame *Stream::next_supplied() {
 
 void Stream::supply_due() {
   const std::lock_guard lock(mutex_);
-  if (const ReadyFrame *frame = next_supplied()) queue.push(*frame);
+  if (const ReadyFrame *frame = next_supplied()) queue.push_new([&] { return *frame; });
 }
 
 }  // namespace virtual_card

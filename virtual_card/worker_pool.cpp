@@ -1,21 +1,33 @@
 #include "worker_pool.h"
 
+#include <utility>
+
+#include "card_thread.h"
+
 namespace virtual_card {
 
-WorkerPool::WorkerPool(unsigned threads) {
-  for (unsigned i = 1; i < threads; ++i) threads_.emplace_back([this] { serve(); });
+void WorkerPool::grow() {
+  try {
+    threads_.reserve(most_);
+    while (threads_.size() + 1 < most_) threads_.push_back(start_thread([this] { serve(); }));
+  } catch (const std::exception &) {
+    // The next run() tries again.
+  }
 }
 
-WorkerPool::~WorkerPool() {
+void WorkerPool::stop() {
   {
     const std::lock_guard lock(mutex_);
     ending_ = true;
   }
   wanted_.notify_all();
   for (std::thread &thread : threads_) thread.join();
+  threads_.clear();
+  ending_ = false;
 }
 
 void WorkerPool::run(std::size_t count, const std::function<void(std::size_t)> &job) {
+  if (count > 1 && threads_.size() + 1 < most_) grow();
   std::unique_lock lock(mutex_);
   job_ = &job;
   next_ = 0;
@@ -24,6 +36,7 @@ void WorkerPool::run(std::size_t count, const std::function<void(std::size_t)> &
   work(lock);
   finished_.wait(lock, [this] { return busy_ == 0; });
   job_ = nullptr;
+  if (failure_) std::rethrow_exception(std::exchange(failure_, nullptr));
 }
 
 void WorkerPool::serve() {
@@ -40,8 +53,14 @@ void WorkerPool::work(std::unique_lock<std::mutex> &lock) {
     const std::size_t mine = next_++;
     ++busy_;
     lock.unlock();
-    (*job_)(mine);
+    std::exception_ptr failure;
+    try {
+      (*job_)(mine);
+    } catch (...) {
+      failure = std::current_exception();
+    }
     lock.lock();
+    if (failure) failure_ = failure;
     if (--busy_ == 0 && next_ == count_) finished_.notify_all();
   }
 }

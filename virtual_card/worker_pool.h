@@ -8,6 +8,7 @@
 #include <condition_variable>
 #include <cstddef>
 #include <cstdint>
+#include <exception>
 #include <functional>
 #include <mutex>
 #include <thread>
@@ -17,16 +18,21 @@ namespace virtual_card {
 
 class WorkerPool {
  public:
-  /// `threads` work on a job list, the caller of run() included.
-  explicit WorkerPool(unsigned threads);
-  ~WorkerPool();
+  /// `threads` at most work on a job list, the caller of run() included. The others begin with the first
+  /// list; where they cannot, those there are do it all.
+  explicit WorkerPool(unsigned threads) : most_(threads) {}
+  ~WorkerPool() { stop(); }
   WorkerPool(const WorkerPool &) = delete;
   WorkerPool &operator=(const WorkerPool &) = delete;
 
-  /// Does job(0) to job(count - 1), in any order, and returns when all are done. A job must not throw.
+  /// Does job(0) to job(count - 1), in any order, and returns when all are done. What a job throws is
+  /// thrown then.
   void run(std::size_t count, const std::function<void(std::size_t)> &job);
+  /// Ends and joins the threads, until the next run(). Calling it twice is harmless.
+  void stop();
 
  private:
+  void grow();
   void serve();
   /// Takes jobs until none is left; the lock is held on entry and on return.
   void work(std::unique_lock<std::mutex> &lock);
@@ -39,6 +45,8 @@ class WorkerPool {
   std::size_t count_ = 0;
   std::size_t busy_ = 0;
   bool ending_ = false;
+  std::exception_ptr failure_;  ///< what a job of this run() threw
+  unsigned most_;
   std::vector<std::thread> threads_;
 };
 
