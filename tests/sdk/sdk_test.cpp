@@ -5,7 +5,6 @@
 #include <time.h>
 
 #include <cerrno>
-#include <condition_variable>
 #include <filesystem>
 #include <mutex>
 #include <thread>
@@ -22,13 +21,11 @@ Words words_of(const vc::Command &command) {
   const Bytes &bytes = command.argument;
   const bool map = command.code == kSetMotionMap;
   if (!map && bytes.size() % 4 != 0) return Words(bytes.begin(), bytes.end());
-  Words words;
-  for (std::size_t i = 0; i < (map ? 20 : bytes.size()); i += 4)
-    words.push_back(bytes[i] | bytes[i + 1] << 8 | bytes[i + 2] << 16 | std::uint32_t{bytes[i + 3]} << 24);
+  Words words((map ? 20 : bytes.size()) / 4);
+  std::copy_n(bytes.data(), words.size() * 4, reinterpret_cast<u8 *>(words.data()));
   if (!map) return words;
   const std::size_t record = sizeof(void *) == 8 ? 32 : 24;
-  bool same = true;
-  for (std::size_t i = record + 2; i < bytes.size(); ++i) same = same && bytes[i] == bytes[i - 2];
+  const bool same = std::equal(bytes.begin() + record + 2, bytes.end(), bytes.begin() + record);
   words.push_back(static_cast<std::uint32_t>((bytes.size() - record) / 2));
   words.push_back(same ? bytes[record] | std::uint32_t{bytes[record + 1]} << 8 : ~0u);
   return words;
@@ -43,22 +40,18 @@ std::string describe(const vc::Command &command) {
 }
 
 std::mutex delivery_mutex;
-std::condition_variable delivered;
 std::vector<Delivery> delivery_list;
-
-void keep(const char *stream, const u8 *area, u32 channel, const u8 *data, i32 length, i32 flags) {
-  char summary[80];
-  std::snprintf(summary, sizeof summary, "%s %u %td %d %x", stream, channel, data - area, length, flags);
-  const Delivery delivery{summary, Bytes(data, data + length)};
-  if (on_delivery) on_delivery(delivery);
-  const std::lock_guard lock(delivery_mutex);
-  delivery_list.push_back(delivery);
-  delivered.notify_all();
-}
 
 bool strikes(int &countdown) {
   if (countdown == 0 || --countdown > 0) return false;
   return faults.struck = true;
+}
+
+template <typename... Arguments>
+void *allocate(void *(*real)(Arguments...), Arguments... arguments) {
+  if (strikes(faults.malloc_countdown)) return nullptr;
+  ++faults.live_allocations;
+  return real(arguments...);
 }
 
 }  // namespace
@@ -112,8 +105,8 @@ bool eventually(const std::function<bool()> &condition) {
   return true;
 }
 
-std::size_t process_descriptors() {
-  const std::filesystem::directory_iterator list("/proc/self/fd");
+std::size_t entries(const char *directory) {
+  const std::filesystem::directory_iterator list(directory);
   return static_cast<std::size_t>(std::distance(begin(list), end(list)));
 }
 
@@ -125,12 +118,6 @@ std::string printed(const std::function<void()> &action) {
 
 Faults faults;
 
-void Faults::reset() {
-  malloc_countdown = thread_countdown = live_allocations = 0;
-  clock_reads = 0;
-  struck = false;
-}
-
 extern "C" {
 void *__real_malloc(std::size_t size);
 void *__real_memalign(std::size_t alignment, std::size_t size);
@@ -139,14 +126,10 @@ int __real_pthread_create(pthread_t *, const pthread_attr_t *, void *(*)(void *)
 int __real_clock_gettime(clockid_t clock, timespec *now);
 
 void *__wrap_malloc(std::size_t size) {
-  if (strikes(faults.malloc_countdown)) return nullptr;
-  ++faults.live_allocations;
-  return __real_malloc(size);
+  return allocate(__real_malloc, size);
 }
 void *__wrap_memalign(std::size_t alignment, std::size_t size) {
-  if (strikes(faults.malloc_countdown)) return nullptr;
-  ++faults.live_allocations;
-  return __real_memalign(alignment, size);
+  return allocate(__real_memalign, alignment, size);
 }
 void __wrap_free(void *memory) {
   if (memory != nullptr) --faults.live_allocations;
@@ -167,6 +150,15 @@ int __wrap_clock_gettime(clockid_t clock, timespec *now) {
 
 std::function<void(const Delivery &)> on_delivery;
 
+void keep(char stream, const u8 *area, u32 channel, const u8 *data, i32 length, i32 flags) {
+  char summary[80];
+  std::snprintf(summary, sizeof summary, "%c %u %td %d %x", stream, channel, data - area, length, flags);
+  const Delivery delivery{summary, Bytes(data, data + length)};
+  if (on_delivery) on_delivery(delivery);
+  const std::lock_guard lock(delivery_mutex);
+  delivery_list.push_back(delivery);
+}
+
 std::vector<Delivery> deliveries() {
   const std::lock_guard lock(delivery_mutex);
   return delivery_list;
@@ -179,18 +171,7 @@ Lines summaries() {
 }
 
 bool wait_for_deliveries(std::size_t number) {
-  std::unique_lock lock(delivery_mutex);
-  return delivered.wait_for(lock, std::chrono::seconds(30), [&] { return delivery_list.size() >= number; });
-}
-
-void mpeg4_callback(u32 channel, u8 *data, i32 length, i32 flags) {
-  keep("m", zarvo::mpeg4_buf, channel, data, length, flags);
-}
-void mjpeg_callback(u32 channel, u8 *data, i32 length, i32 flags) {
-  keep("j", zarvo::mjpeg_buf, channel, data, length, flags);
-}
-void audio_callback(u32 channel, u8 *data, i32 length, i32 flags) {
-  keep("a", zarvo::audio_buf, channel, data, length, flags);
+  return eventually([&] { return deliveries().size() >= number; });
 }
 
 void CardTest::SetUp() {
@@ -199,10 +180,21 @@ void CardTest::SetUp() {
   faults.reset();
   on_delivery = nullptr;
   delivery_list.clear();
-  descriptors_before = process_descriptors();
-  ASSERT_EQ(zv_Open(&handle), ZV_OK);
-  ASSERT_EQ(zv_RegisterCallBack(handle, mpeg4_callback, mjpeg_callback, audio_callback), ZV_OK);
+  descriptors_before = entries("/proc/self/fd");
+  open_card();
   vc::record_log(true);
+}
+
+void CardTest::open_card() {
+  ASSERT_EQ(zv_Open(&handle), ZV_OK);
+  ASSERT_EQ(zv_RegisterCallBack(handle, callback<'m'>, callback<'j'>, callback<'a'>), ZV_OK);
+}
+
+void CardTest::close_leaving_nothing() {
+  EXPECT_EQ(zv_Close(handle), ZV_OK);
+  EXPECT_EQ(vc::open_descriptors(), 0);
+  EXPECT_EQ(vc::open_mappings(), 0);
+  EXPECT_EQ(entries("/proc/self/fd"), descriptors_before);
 }
 
 void CardTest::TearDown() {
@@ -211,10 +203,7 @@ void CardTest::TearDown() {
   if (zarvo::card_of(handle) != nullptr) {
     EXPECT_EQ(zv_DisableWatchDog(handle), ZV_OK);
   }
-  EXPECT_EQ(zv_Close(handle), ZV_OK);
-  EXPECT_EQ(vc::open_descriptors(), 0);
-  EXPECT_EQ(vc::open_mappings(), 0);
-  EXPECT_EQ(process_descriptors(), descriptors_before);
+  close_leaving_nothing();
 }
 
 void CardTest::enable(u32 mask, ZV_SCALE_VALUE scale) {

@@ -43,7 +43,8 @@ std::size_t count(const Lines &lines, const std::string &line);
 
 /// Waits for a condition, half a minute at most.
 bool eventually(const std::function<bool()> &condition);
-std::size_t process_descriptors();
+/// The number of entries, as in /proc/self/fd.
+std::size_t entries(const char *directory);
 /// What `action` prints.
 std::string printed(const std::function<void()> &action);
 
@@ -55,7 +56,7 @@ struct Faults {
   int live_allocations = 0;         ///< since reset()
   std::atomic<int> clock_ahead{0};  ///< seconds on the SDK's monotonic clock
   std::atomic<int> clock_reads{0};
-  void reset();
+  void reset() { malloc_countdown = thread_countdown = live_allocations = 0, struck = false; }
 };
 extern Faults faults;
 
@@ -70,14 +71,19 @@ std::vector<Delivery> deliveries();
 Lines summaries();
 bool wait_for_deliveries(std::size_t number);
 extern std::function<void(const Delivery &)> on_delivery;
-void mpeg4_callback(u32 channel, u8 *data, i32 length, i32 flags);
-void mjpeg_callback(u32 channel, u8 *data, i32 length, i32 flags);
-void audio_callback(u32 channel, u8 *data, i32 length, i32 flags);
+void keep(char stream, const u8 *area, u32 channel, const u8 *data, i32 length, i32 flags);
+template <char kStream>
+void callback(u32 channel, u8 *data, i32 length, i32 flags) {
+  u8 *const area = kStream == 'm' ? zarvo::mpeg4_buf : kStream == 'j' ? zarvo::mjpeg_buf : zarvo::audio_buf;
+  keep(kStream, area, channel, data, length, flags);
+}
 
 class CardTest : public testing::Test {
  protected:
   void SetUp() override;
   void TearDown() override;
+  void open_card();
+  void close_leaving_nothing();
   /// Stores settings for the channels of `mask`, enables them, and forgets the log.
   void enable(u32 mask, ZV_SCALE_VALUE scale = SCALE_ZV_CIF);
   zarvo::ZV_CARD &card() { return *zarvo::card_of(handle); }

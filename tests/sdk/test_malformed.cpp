@@ -53,31 +53,20 @@ class Malformed : public CardTest {
   static inline std::atomic<int> outside, delivered, last_seen;
 };
 
-Bytes mjpeg_area(std::uint32_t channel, const Bytes &scan) {
-  Bytes area(16 + scan.size());
-  for (std::size_t i = 0; i < 4; ++i) area[i] = static_cast<std::uint8_t>(channel >> 8 * i);
-  std::copy(scan.begin(), scan.end(), area.begin() + 16);
-  return area;
+Bytes bytes_of(std::uint32_t word) {
+  const auto *bytes = reinterpret_cast<const u8 *>(&word);
+  return Bytes(bytes, bytes + sizeof word);
 }
 
 /// Lengths, results and channels at and just beyond each limit.
 TEST_F(Malformed, LimitsOfEveryField) {
-  struct Length {
-    std::uint32_t length;
-    int delivered;
-  };
   int expected = 2;  // the markers
-  for (const Length &test : {Length{0, 1}, Length{0xFFFC0, 1}, Length{0xFFFC1, 0}, Length{0xFFFFF, 0}})
+  for (const std::uint32_t length : {0u, 0xFFFC0u, 0xFFFC1u, 0xFFFFFu})
     for (std::uint32_t type : {0x00, 0x40, 0xC0}) {
-      Bytes area(64, 0);
-      area[0] = static_cast<std::uint8_t>(test.length);
-      area[1] = static_cast<std::uint8_t>(test.length >> 8);
-      area[2] = static_cast<std::uint8_t>(test.length >> 16 | type | 0x30u);  // the unused bits are set
-      area[3] = 0xF5;
-      vc::queue_mpeg4({area, 1});
-      vc::queue_mpeg4({area, 0});
-      vc::queue_mpeg4({area, LONG_MIN});
-      expected += test.delivered;
+      Bytes area = bytes_of(length | type << 16 | 0xF5300000);  // the unused bits are set
+      area.resize(64);
+      for (const long result : {1L, 0L, LONG_MIN}) vc::queue_mpeg4({area, result});
+      expected += length <= 0xFFFC0;
     }
   const Bytes scan = {1, 2, 3, 0xFF, 0xD9};
   struct Jpeg {
@@ -90,7 +79,10 @@ TEST_F(Malformed, LimitsOfEveryField) {
        {Jpeg{15, scan, 21, 1}, Jpeg{16, scan, 21, 0}, Jpeg{0xFFFFFFFF, scan, 21, 0}, Jpeg{1, scan, 16, 0},
         Jpeg{1, scan, 19, 0}, Jpeg{1, {0xD9}, 17, 1}, Jpeg{1, scan, 0xFFC00, 1}, Jpeg{1, scan, 0xFFC01, 0},
         Jpeg{1, scan, kHuge, 0}, Jpeg{1, scan, -7, 0}, Jpeg{1, {0xFF, 0, 0xFF}, 19, 0}}) {
-    vc::queue_mjpeg({mjpeg_area(test.channel, test.scan), test.result});
+    Bytes area = bytes_of(test.channel);
+    area.resize(16);
+    area.insert(area.end(), test.scan.begin(), test.scan.end());
+    vc::queue_mjpeg({area, test.result});
     expected += test.delivered;
   }
   capture();
@@ -100,11 +92,10 @@ TEST_F(Malformed, LimitsOfEveryField) {
 /// Any bytes at all.
 TEST_F(Malformed, AnyBytes) {
   std::mt19937 random(20240229);
-  const auto any_byte = [&] { return static_cast<std::uint8_t>(random()); };
   const long results[] = {1, 16, 17, 64, 700, 0xFFBFF, 0xFFC00, 0x100000, kLarge, INT_MIN, -1};
   for (int i = 0; i < 400; ++i) {
     Bytes area(64 + random() % 64);
-    for (std::uint8_t &byte : area) byte = any_byte();
+    for (std::uint8_t &byte : area) byte = static_cast<std::uint8_t>(random());
     if (area.size() > 8 && i % 2 == 0) area[1] = area[2] = area[3] = 0;  // half of them with a fair channel
     const long result = results[random() % std::size(results)];
     vc::queue_mpeg4({area, result});

@@ -82,21 +82,15 @@ class CardTest : public ::testing::Test {
 
   long read_mpeg4() { return read_node(encoder, nullptr, driver::kMpeg4ReadSize); }
   long read_mjpeg() { return read_node(encoder, nullptr, driver::kMjpegReadSize); }
-  u32 codec_register(u32 address) {
-    driver::Register record{address, 0xDEADBEEF};
-    EXPECT_EQ(send(display, driver::DISP_IOC_READ_REG, record), 0);
-    return record.value;
+  /// What the node answers in the second word of a record.
+  static u32 ask(int fd, u32 code, u32 first) {
+    std::array<u32, 2> record{first, 0xFF};
+    EXPECT_EQ(send(fd, code, record), 0);
+    return record[1];
   }
-  u32 video_input_register(u32 address) {
-    driver::Register record{address, 0xDEADBEEF};
-    EXPECT_EQ(send(video_input, driver::VIN_IOC_READ_REG, record), 0);
-    return record.value;
-  }
-  u32 board_command(u32 command) {
-    driver::BoardCommand record{command, 0xFF};
-    EXPECT_EQ(send(video_input, driver::VIN_IOC_BOARD_CMD, record), 0);
-    return record.reply;
-  }
+  u32 codec_register(u32 address) { return ask(display, driver::DISP_IOC_READ_REG, address); }
+  u32 video_input_register(u32 address) { return ask(video_input, driver::VIN_IOC_READ_REG, address); }
+  u32 board_command(u32 command) { return ask(video_input, driver::VIN_IOC_BOARD_CMD, command); }
   /// One channel in CIF at 30 frames a second.
   void encode_channel(u32 channel) {
     EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_SCALE, driver::ChannelValue{channel, 2}), 0);

@@ -29,18 +29,13 @@ TEST(FieldTimes, AStandardChangeKeepsTheNextFieldsTime) {
   EXPECT_EQ(times.due(81 + 60000), due + 1s + 1001s);
 }
 
-class ManualClock : public CardTest {
- protected:
-  void start(u32 standard) {
-    EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_STANDARD, standard), 0);
-    encode_channel(3);
-    EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
-  }
-};
+using ManualClock = CardTest;
 
 // Advancing in pieces must give the same frames as advancing at once, whatever the pieces.
 TEST_F(ManualClock, FramesAndBlocksComeAtTheirTimes) {
-  start(VIDEO_STANDARD_ZV_NTSC);
+  encode_channel(3);
+  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+  EXPECT_EQ(read_mpeg4(), 0);
   card::advance(1001ms);
   EXPECT_EQ(card::counters().mpeg4.made, 30u);
   EXPECT_EQ(card::counters().audio.made, 63u);  // at 0, 16, ... 992 ms
@@ -56,31 +51,19 @@ TEST_F(ManualClock, FramesAndBlocksComeAtTheirTimes) {
   EXPECT_EQ(card::counters().mpeg4.lost, 0u);
 }
 
-TEST_F(ManualClock, NothingMovesOnItsOwn) {
-  start(VIDEO_STANDARD_ZV_PAL);
-  EXPECT_EQ(read_mpeg4(), 0);
-  EXPECT_EQ(card::counters().mpeg4.made, 0u);
-  card::advance_frames(1);
-  EXPECT_GT(read_mpeg4(), 0);
-  EXPECT_EQ(read_mpeg4(), 0);
-}
-
 TEST_F(ManualClock, TheWatchdogCountsDownUnlessFed) {
-  using ::testing::internal::CaptureStderr;
-  using ::testing::internal::GetCapturedStderr;
   EXPECT_EQ(board_command(driver::kBoardWatchdogOn), driver::kBoardWatchdogOnReply);
   for (int feed = 0; feed < 3; ++feed) {
     card::advance(59s);
     EXPECT_EQ(board_command(driver::kBoardWatchdogOn), driver::kBoardWatchdogOnReply);
   }
   EXPECT_TRUE(card::counters().watchdog_running);
-  EXPECT_EQ(card::counters().watchdog_kicks, 4u);
   EXPECT_EQ(card::counters().watchdog_resets, 0u);
 
-  CaptureStderr();
-  card::advance(60s);
-  card::advance(60s);
-  EXPECT_EQ(GetCapturedStderr(), "virtual card: the watchdog would have reset the machine\n");
+  ::testing::internal::CaptureStderr();
+  for (int minute = 0; minute < 2; ++minute) card::advance(60s);
+  EXPECT_EQ(::testing::internal::GetCapturedStderr(),
+            "virtual card: the watchdog would have reset the machine\n");
   EXPECT_EQ(card::counters().watchdog_resets, 1u);
   EXPECT_FALSE(card::counters().watchdog_running);
 
@@ -90,20 +73,20 @@ TEST_F(ManualClock, TheWatchdogCountsDownUnlessFed) {
   EXPECT_EQ(card::counters().watchdog_resets, 1u);
 }
 
-/// A card whose time runs by itself.
+/// A card whose time runs by itself, and that encodes all channels.
 class RunningClock : public CardTest {
  protected:
   void run(card::ClockMode mode, double speed) {
     close_nodes();
     card::set_clock(mode, speed);
     open_nodes();
+    for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) encode_channel(channel);
   }
 };
 
 TEST_F(RunningClock, FramesComeByThemselvesAndEndWithTheLastClose) {
   for (const auto mode : {card::ClockMode::real_time, card::ClockMode::fast}) {
     run(mode, 4.0);
-    encode_channel(0);
     const auto made = card::counters().mpeg4.made;
     EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
     EXPECT_TRUE(wait_for([&] { return card::counters().mpeg4.made >= made + 10; }));
@@ -119,7 +102,6 @@ TEST_F(RunningClock, FramesComeByThemselvesAndEndWithTheLastClose) {
 // before it.
 TEST_F(RunningClock, AStopInTheMiddleOfAFieldLeavesNoFrameBehind) {
   run(card::ClockMode::fast, 4.0);
-  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) encode_channel(channel);
   for (int round = 0; round < 10; ++round) {
     const auto made = card::counters().mpeg4.made;
     EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
@@ -135,14 +117,12 @@ TEST_F(RunningClock, AStopInTheMiddleOfAFieldLeavesNoFrameBehind) {
 // A card that cannot keep up must lose frames and count them, not fall further and further behind.
 TEST_F(RunningClock, WhatComesTooLateIsLostAndCounted) {
   run(card::ClockMode::fast, 1000);
-  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) encode_channel(channel);
   EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
   EXPECT_TRUE(wait_for([&] {
     read_mpeg4();
     read_mjpeg();
     return card::counters().mpeg4.lost > 10000;
   }));
-  EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0);
 }
 
 }  // namespace

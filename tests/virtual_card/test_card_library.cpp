@@ -29,34 +29,33 @@ const std::set<std::string> kTakenNames = {
     "munmap", "dup",    "dup2",   "dup3",     "fcntl",       "fcntl64"};
 
 /// The lines of a listing that `wanted` picks out.
-template <typename Wanted>
-std::vector<std::string> lines_of(const std::string &listing, Wanted wanted) {
+std::vector<std::string> lines_of(const std::string &listing, bool (*wanted)(const std::string &)) {
   std::istringstream lines(listing);
   std::vector<std::string> found;
   for (std::string text; std::getline(lines, text);)
     if (wanted(text)) found.push_back(text);
   return found;
 }
+bool taken(const std::string &name) {
+  return kTakenNames.count(name) != 0;
+}
 
 // A symbol too many can take a call of the host's, or of another library's, for good.
 TEST(Library, ExportsTheTakenNamesAndTheControlInterfaceOnly) {
   const std::string listing = output_of(NM " -D --defined-only --format=just-symbols " CARD_LIBRARY);
-  const auto taken = [](const std::string &name) { return kTakenNames.count(name) != 0; };
   EXPECT_THAT(lines_of(listing, taken), SizeIs(kTakenNames.size()));
   EXPECT_THAT(listing, HasSubstr("_ZN12virtual_card7advance"));
-  EXPECT_THAT(lines_of(listing,
-                       [&](const std::string &name) {
-                         return !taken(name) && name.rfind("_ZN12virtual_card", 0) != 0;
-                       }),
-              IsEmpty());
+  const auto foreign = [](const std::string &name) {
+    return !taken(name) && name.rfind("_ZN12virtual_card", 0) != 0;
+  };
+  EXPECT_THAT(lines_of(listing, foreign), IsEmpty());
 }
 
 // A plain name in the card's own code would lead back into the card. real_calls finds its way by dlsym.
 TEST(Library, TheCardCallsNoNameThatItTakes) {
   const std::string listing = output_of(NM " -u --format=just-symbols " CARD_CORE);
   EXPECT_THAT(listing, HasSubstr("memfd_create"));
-  EXPECT_THAT(lines_of(listing, [](const std::string &name) { return kTakenNames.count(name) != 0; }),
-              IsEmpty());
+  EXPECT_THAT(lines_of(listing, taken), IsEmpty());
 }
 
 /// Runs the probe with the library in front of it; its standard output, or error.

@@ -18,33 +18,10 @@ TEST(FrameQueue, AFullQueueLosesTheNewFrameAndCountsIt) {
   EXPECT_FALSE(queue.push(frame(2, 41)));
   EXPECT_TRUE(queue.push(frame(3, 40)));
   EXPECT_FALSE(queue.push(frame(4, 1)));
-  EXPECT_EQ(queue.pop(0us)->result, 1);
-  EXPECT_TRUE(queue.push(frame(5, 60)));
-  EXPECT_EQ(queue.pop(0us)->result, 3);
-  EXPECT_EQ(queue.pop(0us)->result, 5);
+  for (const long result : {1, 3}) EXPECT_EQ(queue.pop(0us)->result, result);
   EXPECT_FALSE(queue.pop(0us));
-  EXPECT_EQ(queue.counters().made, 5u);
-  EXPECT_EQ(queue.counters().delivered, 3u);
-  EXPECT_EQ(queue.counters().lost, 2u);
-}
-
-TEST(FrameQueue, APushAndAWakeEndTheWait) {
-  card::FrameQueue queue(100);
-  for (const bool push : {true, false}) {
-    std::atomic<bool> done{false};
-    std::optional<ReadyFrame> got;
-    std::thread reader([&] {
-      got = queue.pop(1h);
-      done = true;
-    });
-    if (push) queue.push({{1}, 1});
-    EXPECT_TRUE(wait_for([&] {
-      if (!push) queue.wake();
-      return done.load();
-    }));
-    reader.join();
-    EXPECT_EQ(got.has_value(), push);
-  }
+  const auto [made, delivered, lost] = queue.counters();
+  EXPECT_THAT((std::array{made, delivered, lost}), ElementsAre(4u, 2u, 2u));
 }
 
 class Streams : public CardTest {
@@ -108,17 +85,6 @@ TEST_F(Streams, AudioGoesToTheHostsBuffer) {
   EXPECT_EQ(read_node(audio, buffer.data(), 192), -EINVAL);
 }
 
-TEST_F(Streams, AStopForgetsWhatWasEncoded) {
-  encode_channel(0);
-  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
-  card::advance_frames(5);
-  EXPECT_GT(read_mpeg4(), 0);
-  EXPECT_EQ(answer(ioctl(encoder, driver::ENC_IOC_STOP, 0)), 0);
-  EXPECT_EQ(read_mpeg4(), 0);
-  card::advance_frames(5);
-  EXPECT_EQ(card::counters().mpeg4.made, 5u);
-}
-
 // The host's slowness must never hold up the card, only cost frames, and each of them is counted.
 TEST_F(Streams, AHostThatDoesNotReadLosesFrames) {
   card::Supply supply;
@@ -133,9 +99,6 @@ TEST_F(Streams, AHostThatDoesNotReadLosesFrames) {
   EXPECT_EQ(card::counters().mpeg4.lost, 37u);
   EXPECT_EQ(card::counters().audio.made, 250u);
   EXPECT_EQ(card::counters().audio.lost, 250u - 64u);
-  int delivered = 0;
-  while (read_mpeg4() > 0) ++delivered;
-  EXPECT_EQ(delivered, 3);
 }
 
 TEST_F(Streams, ASupplyIsDeliveredRoundAndRoundUpToItsLimit) {
@@ -160,6 +123,8 @@ TEST_F(Streams, ASupplyIsDeliveredRoundAndRoundUpToItsLimit) {
   EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
   card::advance_frames(2);
   EXPECT_EQ(card::counters().mjpeg.made, 2u);
+  EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0);
+  EXPECT_EQ(read_mjpeg(), 0) << "a stop forgets what was encoded";
 }
 
 }  // namespace

@@ -1,0 +1,94 @@
+// The card's manners in a program it does not know: its threads, its own descriptors, its children.
+
+#include <sys/wait.h>
+
+#include <csignal>
+#include <filesystem>
+#include <fstream>
+#include <set>
+
+#include "card_fixture.h"
+
+namespace {
+
+using Manners = CardTest;
+
+std::set<std::filesystem::path> tasks() {
+  const std::filesystem::directory_iterator all("/proc/self/task");
+  return {begin(all), end(all)};
+}
+
+bool blocks(const std::filesystem::path &task, int signal) {
+  std::ifstream status(task / "status");
+  for (std::string line; std::getline(status, line);)
+    if (line.rfind("SigBlk:", 0) == 0) return std::stoull(line.substr(7), nullptr, 16) >> (signal - 1) & 1;
+  return false;
+}
+
+// A handler on a card thread runs under the card's locks; a thread that is left over outlives the library.
+TEST_F(Manners, ThreadsTakeNoSignalsAndEndWithTheLastClose) {
+  close_nodes();
+  card::set_clock(card::ClockMode::real_time);
+  const auto before = tasks();
+  open_nodes();
+  EXPECT_EQ(send(display, driver::DISP_IOC_PREVIEW_ON), 0);
+  ASSERT_TRUE(wait_for([] { return card::counters().previews > 0; }));
+  EXPECT_GT(tasks().size(), before.size());
+  for (const auto &task : tasks())
+    for (const int signal : {SIGTERM, SIGINT, SIGALRM, SIGCHLD, SIGUSR1})
+      EXPECT_TRUE(before.count(task) != 0 || blocks(task, signal)) << task << " takes signal " << signal;
+  close_nodes();
+  EXPECT_TRUE(wait_for([&] { return tasks() == before; }));
+}
+
+// Programs close all numbers before they start others: the card must not lose its memory with them.
+TEST_F(Manners, ClosingEveryNumberLeavesTheRegionsWhole) {
+  auto *area = static_cast<u8 *>(
+      mmap(nullptr, driver::kStreamRegionSize, PROT_READ | PROT_WRITE, MAP_SHARED, encoder, 0));
+  for (u8 way = 0; way < 3; ++way) {
+    if (way == 0) close_range(3, ~0u, 0);
+    if (way == 1) closefrom(3);
+    for (int fd = 3; fd < 2000; ++fd) close(fd);
+    ASSERT_EQ(card::open_descriptors(), 0) << int{way};
+    open_nodes();
+    EXPECT_EQ(answer(ftruncate(encoder, 0)), -EPERM);
+    card::queue_mpeg4({{way, 2, 3}, 64});
+    EXPECT_EQ(read_mpeg4(), 64);
+    EXPECT_EQ(area[0], way);
+  }
+  munmap(area, driver::kStreamRegionSize);
+}
+
+// No fork handler runs for such a child, which has the parent's memory: a close there is not the parent's.
+TEST_F(Manners, AVforkChildDoesNotTouchTheParentsCard) {
+  const pid_t child = vfork();
+  if (child == 0) {
+    dup2(display, audio);
+    closefrom(3);
+    _exit(close(encoder));
+  }
+  ASSERT_EQ(waitpid(child, nullptr, 0), child);
+  EXPECT_EQ(card::open_descriptors(), 4);
+  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+}
+
+// A system without a thread to spare must not end the host.
+TEST_F(Manners, ThreadsThatCannotBeHadAreAnErrorOrDoneWithout) {
+  pthread_attr_t usual, impossible;
+  pthread_getattr_default_np(&usual);
+  pthread_getattr_default_np(&impossible);
+  pthread_attr_setstacksize(&impossible, std::size_t{1} << 46);
+  ASSERT_EQ(pthread_setattr_default_np(&impossible), 0);
+  encode_channel(0);
+  encode_channel(1);
+  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+  card::advance_frames(1);
+  EXPECT_EQ(card::counters().mpeg4.made, 2u);
+  close_nodes();
+  card::set_clock(card::ClockMode::real_time);
+  EXPECT_EQ(answer(open(driver::kEncoderNode, O_RDWR)), -EAGAIN);
+  ASSERT_EQ(pthread_setattr_default_np(&usual), 0);
+  open_nodes();
+}
+
+}  // namespace
