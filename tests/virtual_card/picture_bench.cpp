@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
+#include <memory>
 
 #include "zv_lib/stream_headers.h"
 
@@ -33,31 +34,30 @@ std::vector<u8> mpeg4_header(u32 width, u32 height, bool interlaced) {
 /// A libavcodec decoder that takes no error for a trifle.
 class Decoder {
  public:
-  explicit Decoder(AVCodecID id) : context_(avcodec_alloc_context3(avcodec_find_decoder(id))) {
+  explicit Decoder(AVCodecID id) : context_(avcodec_alloc_context3(avcodec_find_decoder(id)), &free_context) {
     context_->err_recognition = AV_EF_EXPLODE | AV_EF_BITSTREAM | AV_EF_BUFFER | AV_EF_CRCCHECK;
     context_->thread_count = 1;
     context_->flags |= AV_CODEC_FLAG_LOW_DELAY;
+    context_->sample_rate = 8000;  // for sound
+    context_->bits_per_coded_sample = 3;
+    context_->ch_layout.nb_channels = 1;
+    EXPECT_EQ(avcodec_open2(context_.get(), nullptr, nullptr), 0);
   }
-  ~Decoder() {
-    avcodec_free_context(&context_);
-    av_frame_free(&frame_);
-    av_packet_free(&packet_);
-  }
-  AVCodecContext *context() { return context_; }
-  void open() { ASSERT_EQ(avcodec_open2(context_, nullptr, nullptr), 0); }
   /// Null when the bytes do not decode.
   const AVFrame *decode(const std::vector<u8> &bytes) {
-    av_packet_unref(packet_);
-    if (av_new_packet(packet_, static_cast<int>(bytes.size())) != 0) return nullptr;
-    std::memcpy(packet_->data, bytes.data(), bytes.size());
-    if (avcodec_send_packet(context_, packet_) != 0) return nullptr;
-    return avcodec_receive_frame(context_, frame_) == 0 ? frame_ : nullptr;
+    AVPacket *packet = av_packet_alloc();
+    av_new_packet(packet, static_cast<int>(bytes.size()));
+    std::memcpy(packet->data, bytes.data(), bytes.size());
+    const int sent = avcodec_send_packet(context_.get(), packet);
+    av_packet_free(&packet);
+    return sent == 0 && avcodec_receive_frame(context_.get(), frame_.get()) == 0 ? frame_.get() : nullptr;
   }
 
  private:
-  AVCodecContext *context_;
-  AVFrame *frame_ = av_frame_alloc();
-  AVPacket *packet_ = av_packet_alloc();
+  static void free_context(AVCodecContext *context) { avcodec_free_context(&context); }
+  static void free_frame(AVFrame *frame) { av_frame_free(&frame); }
+  std::unique_ptr<AVCodecContext, decltype(&free_context)> context_;
+  std::unique_ptr<AVFrame, decltype(&free_frame)> frame_{av_frame_alloc(), &free_frame};
 };
 
 std::vector<u8> plane(const AVFrame &frame, int index) {
@@ -75,13 +75,9 @@ Decoded to_decoded(const AVFrame *frame) {
     ADD_FAILURE() << "a frame does not decode";
     return {};
   }
-  return {static_cast<u32>(frame->width),
-          static_cast<u32>(frame->height),
-          frame->pict_type == AV_PICTURE_TYPE_I,
-          frame->interlaced_frame != 0,
-          plane(*frame, 0),
-          plane(*frame, 1),
-          plane(*frame, 2)};
+  const auto width = static_cast<u32>(frame->width), height = static_cast<u32>(frame->height);
+  const bool intra = frame->pict_type == AV_PICTURE_TYPE_I, interlaced = frame->interlaced_frame != 0;
+  return {width, height, intra, interlaced, plane(*frame, 0), plane(*frame, 1), plane(*frame, 2)};
 }
 
 }  // namespace
@@ -89,7 +85,6 @@ Decoded to_decoded(const AVFrame *frame) {
 std::vector<Decoded> decode_mpeg4(const std::vector<Encoded> &frames, u32 width, u32 height,
                                   bool interlaced) {
   Decoder decoder(AV_CODEC_ID_MPEG4);
-  decoder.open();
   std::vector<Decoded> pictures;
   for (const Encoded &frame : frames) {
     std::vector<u8> bytes = frame.intra ? mpeg4_header(width, height, interlaced) : std::vector<u8>{};
@@ -101,7 +96,6 @@ std::vector<Decoded> decode_mpeg4(const std::vector<Encoded> &frames, u32 width,
 
 Decoded decode_jpeg(const Encoded &frame) {
   Decoder decoder(AV_CODEC_ID_MJPEG);
-  decoder.open();
   zarvo::JpegHeader header = zarvo::jpeg_header_template();
   zarvo::jpeg_set_sof(header, frame.width, frame.height);
   std::vector<u8> bytes(header.begin(), header.end());
@@ -111,10 +105,6 @@ Decoded decode_jpeg(const Encoded &frame) {
 
 std::vector<std::int16_t> decode_g726(const std::vector<u8> &bytes) {
   Decoder decoder(AV_CODEC_ID_ADPCM_G726);
-  decoder.context()->sample_rate = 8000;
-  decoder.context()->bits_per_coded_sample = 3;
-  decoder.context()->ch_layout.nb_channels = 1;
-  decoder.open();
   const AVFrame *frame = decoder.decode(bytes);
   if (frame == nullptr) return {};
   const auto *samples = reinterpret_cast<const std::int16_t *>(frame->data[0]);
@@ -129,12 +119,8 @@ std::vector<Encoded> PictureBench::take_mpeg4() {
     EXPECT_EQ(first & 0xFFFFF, area.size() - driver::kMpeg4DescriptorSize);
     const auto time = std::int64_t{word(area, driver::kMpeg4TimeSeconds)} * 1'000'000 +
                       word(area, driver::kMpeg4TimeMicroseconds);
-    frames.push_back({first >> 24 & 0xF,
-                      (first >> 22 & 3) == 0,
-                      0,
-                      0,
-                      time,
-                      {area.begin() + driver::kMpeg4DescriptorSize, area.end()}});
+    const std::vector<u8> bytes(area.begin() + driver::kMpeg4DescriptorSize, area.end());
+    frames.push_back({first >> 24 & 0xF, (first >> 22 & 3) == 0, 0, 0, time, bytes});
   }
   return frames;
 }
@@ -143,12 +129,8 @@ std::vector<Encoded> PictureBench::take_jpeg() {
   std::vector<Encoded> frames;
   while (const auto ready = mjpeg.pop(std::chrono::microseconds{0})) {
     const std::vector<u8> &area = ready->area;
-    frames.push_back({word(area, 0),
-                      true,
-                      word(area, 4),
-                      word(area, 8),
-                      0,
-                      {area.begin() + driver::kMjpegDescriptorSize, area.end()}});
+    const std::vector<u8> bytes(area.begin() + driver::kMjpegDescriptorSize, area.end());
+    frames.push_back({word(area, 0), true, word(area, 4), word(area, 8), 0, bytes});
   }
   return frames;
 }
@@ -156,9 +138,8 @@ std::vector<Encoded> PictureBench::take_jpeg() {
 Decoded PictureBench::look(unsigned channel) {
   fields(next % 2 == 0 ? 2 : 1);
   std::optional<Encoded> newest;
-  for (Encoded &frame : take_jpeg()) {
+  for (Encoded &frame : take_jpeg())
     if (frame.channel == channel) newest = std::move(frame);
-  }
   take_mpeg4();
   return newest ? decode_jpeg(*newest) : Decoded{};
 }

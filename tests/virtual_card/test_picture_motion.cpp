@@ -17,6 +17,7 @@ class Motion : public testing::Test {
     bench_.fields(fields);
     return bench_.engine.motion();
   }
+  bool moves(int fields) { return (motion_after(fields) & kBit) != 0; }
   void set_area(u32 column, u32 row, u32 columns, u32 rows, u16 level) {
     const std::vector<u16> levels(std::size_t{columns} * rows, level);
     bench_.engine.set_thresholds({kChannel, column, row, columns, rows, levels.data()});
@@ -38,45 +39,45 @@ TEST_F(Motion, ChangesOfSettingsAreNoMotion) {
   bench_.state.motion_enable = kBit;
   bench_.state.channel[kChannel].scene = Scene::still;
   const auto expect_quiet = [&] {
-    for (int look = 0; look < 4; ++look) ASSERT_EQ(motion_after(kLook) & kBit, 0u);
+    for (int look = 0; look < 4; ++look) ASSERT_FALSE(moves(kLook));
   };
   expect_quiet();
   bench_.state.channel[kChannel].picture.brightness = 255;
   expect_quiet();
   bench_.state.channel[kChannel].mask = {kChannel, 0, 720, 0, 240};
   expect_quiet();
-  bench_.state.channel[kChannel].lost = true;
-  expect_quiet();
-  bench_.state.channel[kChannel].lost = false;
-  expect_quiet();
+  for (const bool lost : {true, false}) {
+    bench_.state.channel[kChannel].lost = lost;
+    expect_quiet();
+  }
 }
 
 // Levels that work the wrong way round, and areas beside the place they were set for.
 TEST_F(Motion, LevelsAreasAndMasksDecideBlockByBlock) {
   bench_.state.motion_enable = kBit;
-  EXPECT_EQ(motion_after(3 * kLook) & kBit, kBit);
+  EXPECT_TRUE(moves(3 * kLook));
   bench_.engine.set_threshold(kChannel, 250);
-  EXPECT_EQ(motion_after(5 * kLook) & kBit, 0u);
+  EXPECT_FALSE(moves(5 * kLook));
   bench_.engine.set_threshold(kChannel, 0);
-  EXPECT_EQ(motion_after(3 * kLook) & kBit, kBit);
+  EXPECT_TRUE(moves(3 * kLook));
   bench_.engine.set_threshold(kChannel, 0xFFFF);
-  EXPECT_EQ(motion_after(5 * kLook) & kBit, 0u);
+  EXPECT_FALSE(moves(5 * kLook));
   set_area(0, 0, 45, 4, 0);  // the bars: nothing ever moves there
-  EXPECT_EQ(motion_after(20 * kLook) & kBit, 0u);
+  EXPECT_FALSE(moves(20 * kLook));
   set_area(40, 28, 64, 64, 0);  // the end of the mark, and far over the map's edge
-  EXPECT_EQ(motion_after(3 * kLook) & kBit, kBit);
+  EXPECT_TRUE(moves(3 * kLook));
   bench_.state.channel[kChannel].mask = {kChannel, 0, 720, 440, 480};
-  EXPECT_EQ(motion_after(5 * kLook) & kBit, 0u);
+  EXPECT_FALSE(moves(5 * kLook));
 }
 
 // A report that flickers between looks, never ends, or survives a restart.
 TEST_F(Motion, ReportIsHeldThenEndsAndStartsAfresh) {
   bench_.state.motion_enable = kBit;
   motion_after(5 * kLook);
-  for (int field = 0; field < 3 * kLook; ++field) ASSERT_EQ(motion_after(1) & kBit, kBit);
+  for (int field = 0; field < 3 * kLook; ++field) ASSERT_TRUE(moves(1));
   bench_.engine.set_threshold(kChannel, 0xFFFF);
   int held = 0;
-  while (held < 100 && (motion_after(1) & kBit) != 0) ++held;
+  while (held < 100 && moves(1)) ++held;
   EXPECT_GE(held, 2 * kLook - 1);
   EXPECT_LE(held, 3 * kLook);
   bench_.engine.set_threshold(kChannel, kDefaultMotionLevel);

