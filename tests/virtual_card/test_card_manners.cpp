@@ -64,7 +64,6 @@ TEST_F(Manners, AVforkChildDoesNotTouchTheParentsCard) {
   const pid_t child = vfork();
   if (child == 0) {
     dup2(display, audio);
-    closefrom(3);
     _exit(close(encoder));
   }
   ASSERT_EQ(waitpid(child, nullptr, 0), child);
@@ -75,12 +74,10 @@ TEST_F(Manners, AVforkChildDoesNotTouchTheParentsCard) {
 // A system without a thread to spare must not end the host.
 TEST_F(Manners, ThreadsThatCannotBeHadAreAnErrorOrDoneWithout) {
   pthread_attr_t usual, impossible;
-  pthread_getattr_default_np(&usual);
-  pthread_getattr_default_np(&impossible);
+  for (pthread_attr_t *each : {&usual, &impossible}) pthread_getattr_default_np(each);
   pthread_attr_setstacksize(&impossible, std::size_t{1} << 46);
   ASSERT_EQ(pthread_setattr_default_np(&impossible), 0);
-  encode_channel(0);
-  encode_channel(1);
+  for (const u32 channel : {0u, 1u}) encode_channel(channel);
   EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
   card::advance_frames(1);
   EXPECT_EQ(card::counters().mpeg4.made, 2u);
@@ -88,7 +85,6 @@ TEST_F(Manners, ThreadsThatCannotBeHadAreAnErrorOrDoneWithout) {
   card::set_clock(card::ClockMode::real_time);
   EXPECT_EQ(answer(open(driver::kEncoderNode, O_RDWR)), -EAGAIN);
   ASSERT_EQ(pthread_setattr_default_np(&usual), 0);
-  open_nodes();
 }
 
 }  // namespace
