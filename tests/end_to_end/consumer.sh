@@ -1,18 +1,50 @@
 #!/usr/bin/env bash
-# The ten-line project of the README: by add_subdirectory, and by find_package after an install into an
-# empty prefix. Both programs run on the virtual card, the installed one on the installed card.
+# The project that README.md shows, word for word: with this tree as a subfolder, and found after an
+# install into an empty prefix, with the SDK as static and as shared library. Each build records on the
+# virtual card; the installed programs run from a tree that has been moved.
 . "$(dirname "$0")/common.sh"
 
-run_consumer() { # BUILD-FOLDER CARD
-  use_card "$2"
-  expect_equal "channels with video that $1 sees" "16 channels with video" "$("${ON_CARD[@]}" "$1/consumer")"
+# quietly COMMAND...: its output is shown when it fails.
+quietly() { "$@" >"$FOLDER/log" 2>&1 || die "$*: $(cat "$FOLDER/log")"; }
+
+# block LANGUAGE: the code block of the README in that language.
+block() { awk -v begin="\`\`\`$1" '$0 == "```" { inside = 0 } inside; $0 == begin { inside = 1 }' "$ZARVO_ROOT/README.md"; }
+
+# project NAME [SED-SCRIPT]: the README's project in a folder of that name.
+project() {
+  mkdir "$FOLDER/$1"
+  block cmake | sed "${2:-}" >"$FOLDER/$1/CMakeLists.txt"
+  block cpp >"$FOLDER/$1/main.cpp"
 }
 
-cmake -G Ninja -S "$HERE/consumer" -B "$FOLDER/sub" -DZARVO_SOURCE="$ZARVO_ROOT" >"$FOLDER/log" || die "$(cat "$FOLDER/log")"
-cmake --build "$FOLDER/sub" >"$FOLDER/log" || die "$(cat "$FOLDER/log")"
-run_consumer "$FOLDER/sub" "$CARD"
+# build_and_record NAME CARD [CMAKE-OPTION...]
+build_and_record() {
+  local folder=$FOLDER/$1 frames
+  use_card "$2"
+  quietly cmake -G Ninja -S "$folder" -B "$folder/build" "${@:3}"
+  quietly cmake --build "$folder/build"
+  (cd "$folder" && quietly "${ON_CARD[@]}" build/recorder)
+  frames=$(decoded_frames "$folder/camera1.m4v")
+  expect "the README's program ($1) has recorded $frames frames instead of 150" test "$frames" -ge 145 -a "$frames" -le 155
+}
 
-cmake --install "$ZARVO_BUILD" --prefix "$FOLDER/prefix" >"$FOLDER/log" || die "$(cat "$FOLDER/log")"
-cmake -G Ninja -S "$HERE/consumer" -B "$FOLDER/found" -DCMAKE_PREFIX_PATH="$FOLDER/prefix" >"$FOLDER/log" || die "$(cat "$FOLDER/log")"
-cmake --build "$FOLDER/found" >"$FOLDER/log" || die "$(cat "$FOLDER/log")"
-run_consumer "$FOLDER/found" "$(find "$FOLDER/prefix" -name libzarvo_virtual_card.so)"
+project sub "s|^find_package(.*|add_subdirectory(\"$ZARVO_ROOT\" zarvo)|"
+expect "the README's project does not find the package" grep -q add_subdirectory "$FOLDER/sub/CMakeLists.txt"
+build_and_record sub "$CARD"
+
+quietly cmake --install "$ZARVO_BUILD" --prefix "$FOLDER/static prefix"
+project static
+build_and_record static "$(find "$FOLDER/static prefix" -name libzarvo_virtual_card.so)" "-DCMAKE_PREFIX_PATH=$FOLDER/static prefix"
+
+options=(-DBUILD_SHARED_LIBS=ON)
+for part in VIRTUAL_CARD APP TESTS BENCH; do options+=("-DZARVO_BUILD_$part=OFF"); done
+quietly cmake -G Ninja -S "$ZARVO_ROOT" -B "$FOLDER/shared build" "${options[@]}"
+quietly cmake --build "$FOLDER/shared build"
+quietly cmake --install "$FOLDER/shared build" --prefix "$FOLDER/prefix"
+rm -r "$FOLDER/shared build"
+mv "$FOLDER/prefix" "$FOLDER/shared prefix"
+project shared
+build_and_record shared "$CARD" "-DCMAKE_PREFIX_PATH=$FOLDER/shared prefix"
+quietly "${ON_CARD[@]}" "$FOLDER/shared prefix/bin/zarvo_record" --seconds 1 --channels 1 --output "$FOLDER/out"
+expect "the installed zarvo_record does not use the shared SDK" \
+  grep -q 'libzarvo_sdk.so.* => /' <(ldd "$FOLDER/shared prefix/bin/zarvo_record")
