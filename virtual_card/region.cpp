@@ -5,6 +5,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <bit>
 #include <cerrno>
 #include <cstring>
 
@@ -18,7 +19,7 @@ namespace {
 constexpr std::intptr_t kFirstInner = 900;
 
 long fcntl(int fd, int command, std::intptr_t argument) {
-  const int result = real::fcntl(real::Name::fcntl, fd, command, reinterpret_cast<void *>(argument));
+  const int result = real::fcntl(real::Name::fcntl, fd, command, std::bit_cast<void *>(argument));
   return result < 0 ? -errno : result;
 }
 
