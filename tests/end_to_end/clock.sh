@@ -8,12 +8,6 @@ case $1 in
   day) change='2026-03-04 00:00:00' before=20260303/CH%02d/20260303-23 after=20260304/CH%02d/20260304-00 ;;
 esac
 
-# The program's wall clock reads the offset from a file, so that it runs right from the start and is put
-# just before the change when everything is ready. The clock of the card is another one and is left alone.
-ZARVO_PRELOAD=$(find /usr/lib -name libfaketimeMT.so.1 -print -quit)
-expect "libfaketime is missing" test -n "$ZARVO_PRELOAD"
-export FAKETIME_TIMESTAMP_FILE=$FOLDER/clock FAKETIME_NO_CACHE=1 FAKETIME_DONT_FAKE_MONOTONIC=1 DONT_FAKE_MONOTONIC=1
-set_clock() { printf '%+d\n' $(($(date -d "$1" +%s) - $(date +%s))) >"$FOLDER/clock"; }
 set_clock "$change 10 minutes ago"
 
 open_program

@@ -57,3 +57,12 @@ record_cif() {
   choose comboQualityMode 1
   click btnRecordStart
 }
+
+# set_clock TIME: the program's wall clock, before its start or while it runs; it reads the offset from a
+# file. The clock of the card is another one and is left alone.
+set_clock() {
+  ZARVO_PRELOAD=$(find /usr/lib -name libfaketimeMT.so.1 -print -quit)
+  expect "libfaketime is missing" test -n "$ZARVO_PRELOAD"
+  export FAKETIME_TIMESTAMP_FILE=$FOLDER/clock FAKETIME_NO_CACHE=1 FAKETIME_DONT_FAKE_MONOTONIC=1 DONT_FAKE_MONOTONIC=1
+  printf '%+d\n' $(($(date -d "$1" +%s) - $(date +%s))) >"$FOLDER/clock"
+}

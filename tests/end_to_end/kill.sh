@@ -25,6 +25,7 @@ packets() {
     -of csv=p=0 "${STREAM[@]}"
 }
 
+set_clock '2026-03-03 14:10:00' # far from a change of the hour
 mkdir -p "$FOLDER/work/Data"
 open_display
 trap clean_up EXIT

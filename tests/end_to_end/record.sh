@@ -10,6 +10,7 @@ case $1 in
   d1) row='--scale d1 --channels 1-4|4|mpeg4,720,480|150' ;;
   half_d1) row='--scale half-d1 --channels 3,5-11|8|mpeg4,720,240|150' ;;
   pal) row='--standard pal|16|mpeg4,352,288|125' ;;
+  mjpeg_d1_pal) row='--codec mjpeg --scale d1 --standard pal|4|mjpeg,720,576|125' ;;
   film) row='--channels 2,3|2|mpeg4,352,240|150' ;;
 esac
 IFS='|' read -r options files format frames <<<"$row"

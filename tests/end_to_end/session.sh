@@ -7,6 +7,7 @@ mkdir -p "$FOLDER/work"
 printf '#!/bin/sh\nprintf "%%s\\n" "$#" "$1" >player.log\n' >"$FOLDER/work/Videoplayer"
 chmod +x "$FOLDER/work/Videoplayer"
 
+set_clock '2026-03-03 14:10:00' # far from a change of the hour
 open_program
 click btnPreviewStart
 wait_preview
