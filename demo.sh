@@ -23,6 +23,7 @@ TEXT
 BUILD=$ZARVO_ROOT/build/release
 RESULTS=$ZARVO_ROOT/build/demo
 SHOTS=$RESULTS/screenshots
+TOUR=$RESULTS/tour # the scripted operator's working directory; what the user records is elsewhere
 CARD=$BUILD/virtual_card/libzarvo_virtual_card.so
 PROGRAM=$BUILD/app/zarvo_demo
 WIDGET_MAP=$BUILD/tests/end_to_end/widget_map
@@ -36,45 +37,47 @@ prepare() {
   if [ -e /dev/zarvo_enc0 ]; then say "Using the card of this machine"; else say "No card here: using the virtual card"; fi
 }
 
-# The program expects the players beside its working directory and a root for its recordings.
+# prepare_working_folder FOLDER: the program expects the players and a root for its recordings in it.
 prepare_working_folder() {
-  mkdir -p "$RESULTS/Data"
-  cp "$BUILD/players/Videoplayer" "$BUILD/players/Audioplayer" "$RESULTS/"
+  mkdir -p "$1/Data"
+  cp "$BUILD/players/Videoplayer" "$BUILD/players/Audioplayer" "$1/"
 }
 
 run_window() {
-  prepare_working_folder
+  prepare_working_folder "$RESULTS"
   say "Opening the program in $RESULTS; its recordings go to $RESULTS/Data. Close the dialog to end."
   cd "$RESULTS"
   exec "${ON_CARD[@]}" "$PROGRAM"
 }
 
 run_record() {
-  local log=$RESULTS/record.log file frames files=() videos=()
+  local log=$RESULTS/record.log pictures=$RESULTS/record/pictures line file frames files=() saved=()
   say "Recording without the program: zarvo_record --seconds 5 $*"
   rm -rf "$RESULTS/record"
   "${ON_CARD[@]}" "$BUILD/examples/zarvo_record" --seconds 5 --output "$RESULTS/record" "$@" | tee "$log"
-  mapfile -t files < <(sed -nE 's/: [0-9]+ (frames|blocks), .*//p' "$log")
+  mapfile -t files < <(sed -nE 's/: [0-9]+ (frames|blocks), [0-9]+ bytes, .*//p' "$log")
   [ ${#files[@]} -gt 0 ] || return 0 # --help records nothing
 
   say "What ffprobe and ffmpeg say of each file (codec, width, height, frames; audio: codec, rate, blocks)"
   report_streams "${files[@]}" || FAILED=1
-  mapfile -t videos < <(sed -nE 's/: [0-9]+ frames, .*//p' "$log")
-  for file in "${videos[@]}"; do
-    frames=$(sed -nE "s|^$file: ([0-9]+) frames, .*|\\1|p" "$log")
+  mkdir -p "$pictures"
+  while read -r line; do
+    [[ $line =~ ^(.*):\ ([0-9]+)\ frames,\ [0-9]+\ bytes, ]] || continue
+    file=${BASH_REMATCH[1]} frames=${BASH_REMATCH[2]}
     [ "$(decoded_frames "$file")" = "$frames" ] || fail "$file: not all of its $frames frames decode"
     [ $# -gt 0 ] || { [ "$frames" -ge 148 ] && [ "$frames" -le 152 ]; } || fail "$file: $frames frames instead of 150"
-    save_frame "$file" "$((frames / 2))" "$file.png" || fail "$file: no frame to save"
-  done
-  montage "${videos[@]/%/.png}" -geometry 352x240+2+2 "$RESULTS/record/frames.png"
+    saved+=("$pictures/$(basename "$file").png")
+    save_frame "$file" "$((frames / 2))" "${saved[-1]}" || fail "$file: no frame to save"
+  done <"$log"
+  montage "${saved[@]}" -geometry 352x240+2+2 "$RESULTS/record/frames.png"
   echo "A frame of each channel: $RESULTS/record/frames.png"
 }
 
 # shot NAME [WINDOW]: a screenshot of the window (or the whole screen), and one frame of the tour.
 shot() {
   picture "${2:-root}" "$SHOTS/$1.png"
-  TOUR=$((TOUR + 1))
-  import -silent -window root -crop 1530x890+0+0 +repage -resize 60% "$SHOTS/tour-$(printf '%02d' "$TOUR").png"
+  STEP=$((STEP + 1))
+  import -silent -window root -crop 1530x890+0+0 +repage -resize 60% "$SHOTS/tour-$(printf '%02d' "$STEP").png"
 }
 
 tour_preview() {
@@ -86,8 +89,8 @@ tour_preview() {
     click "btnSplit$split"
     sleep 1.2 # for the eye: the card changes the layout with the next picture
     shot "preview-split-$split" "$PREVIEW"
+    wait_until 10 rate_near 30 || fail "the preview in $split runs at $(preview_rate) pictures a second, not 30"
   done
-  wait_until 10 rate_near 30 || fail "the preview runs at $(preview_rate) pictures a second, not 30"
   echo "  caption: $(preview_caption)"
 }
 
@@ -140,6 +143,7 @@ tour_recording() {
   click radioEnAudio
   click checkCh1
   click checkCh2
+  shot dialog-quality-chosen "$DIALOG"
   click btnRecordStart
   wait_line kbps 6 30
   shot dialog-recording "$DIALOG"
@@ -149,26 +153,57 @@ tour_recording() {
   wait_until 10 preview_gone || fail "the preview window did not close"
 
   say "The recorded files: header, contents (codec, width, height, frames) and ffmpeg's verdict"
-  mapfile -t files < <(find "$RESULTS/Data" -name '*.rec' -o -name '*.aud' | sort)
+  mapfile -t files < <(find "$TOUR/Data" -name '*.rec' -o -name '*.aud' | sort)
   [ ${#files[@]} -eq 18 ] || fail "${#files[@]} files instead of 16 video and 2 audio files"
   report_streams "${files[@]}" || FAILED=1
 }
 
+tour_playback() {
+  local file chooser player
+  say "Playing a recording"
+  file=$(find "$TOUR/Data" -path '*CH07*' -name '*.rec' -print -quit)
+  click btnPlayback
+  wait_until 10 xdotool search --onlyvisible --name 'Choose a file to playback' || die "no file dialog appeared"
+  chooser=$(xdotool search --onlyvisible --name 'Choose a file to playback' | head -n 1)
+  xdotool windowactivate --sync "$chooser" type --delay 5 -- "$file"
+  shot playback-chooser "$chooser"
+  xdotool key Return
+  wait_until 20 xdotool search --onlyvisible --name "^Channel 7 - ${file##*/}" || die "no player appeared"
+  player=$(xdotool search --onlyvisible --name "^Channel 7 - ${file##*/}" | head -n 1)
+  sleep 0.5 # for the eye: the first picture of the film
+  shot player "$player"
+  wait_until 30 player_gone "$file" || fail "the player does not end"
+}
+player_gone() { ! xdotool search --onlyvisible --name "^Channel 7 - ${1##*/}"; }
+
+# The dialog with a font of 125 %, as it opens and made larger by hand.
+tour_sizes() {
+  say "The dialog with larger letters, and enlarged"
+  QT_FONT_DPI=120 start_program "$TOUR"
+  shot dialog-125-percent "$DIALOG"
+  xdotool windowsize --sync "$DIALOG" 1500 950
+  sleep 0.5 # for the eye: the last repaint
+  shot dialog-enlarged "$DIALOG"
+  close_program
+}
+
 run_tour() {
   say "A scripted operator uses the program on an invisible display"
-  rm -rf "$RESULTS/Data" "$SHOTS"
+  rm -rf "$TOUR" "$SHOTS"
   mkdir -p "$SHOTS"
-  prepare_working_folder
-  TOUR=0
+  prepare_working_folder "$TOUR"
+  STEP=0
   open_display
-  start_program "$RESULTS"
+  start_program "$TOUR"
   shot dialog "$DIALOG"
   tour_preview
   tour_panels
   tour_pal
   tour_recording
+  tour_playback
   close_program
   [ "$STATUS" -eq 0 ] || fail "the program ended with status $STATUS"
+  tour_sizes
   close_display
 
   say "Picture-in-picture and zoom, with the example zarvo_motion"
@@ -219,5 +254,5 @@ case $mode in
     run_tour
     ;;
 esac
-finish "  recordings    record/ (zarvo_record), Data/ (the program)" \
-  "  screenshots   screenshots/, zoom/" "  program's log output.log"
+finish "  recordings    record/ (zarvo_record), tour/Data/ (the scripted operator)" \
+  "  screenshots   screenshots/, zoom/" "  program's log tour/output.log"
