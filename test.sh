@@ -17,7 +17,6 @@ fi
 
 export CTEST_OUTPUT_ON_FAILURE=1
 export ASAN_OPTIONS=strict_string_checks=1:detect_stack_use_after_return=1
-export LSAN_OPTIONS=suppressions=$ZARVO_ROOT/tests/lsan.supp:print_suppressions=0
 export UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1
 export TSAN_OPTIONS=halt_on_error=1:second_deadlock_stack=1:suppressions=$ZARVO_ROOT/tests/tsan.supp
 
@@ -42,6 +41,12 @@ build_and_test() { # PRESET CTEST-OPTION...
   ctest --test-dir "build/$preset" -j "$(nproc)" "$@"
 }
 
+# What a newcomer runs first; the folder has a blank on purpose.
+smoke_demo() {
+  say "Recording with demo.sh"
+  ./demo.sh record --seconds 3 --output "build/smoke test"
+}
+
 run_tidy() {
   build release
   say "clang-tidy"
@@ -61,6 +66,7 @@ case $mode in
     check_format
     build_and_test asan -LE real_time
     build_and_test tsan -LE real_time
+    smoke_demo
     build_and_test release
     ;;
 esac
