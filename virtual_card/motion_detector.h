@@ -48,7 +48,7 @@ class MotionDetector {
 
  private:
   std::mutex mutex_;  ///< guards the map, which commands write while the card looks
-  std::array<u16, driver::kMotionMapSide * driver::kMotionMapSide> map_{};
+  std::array<u16, std::size_t{driver::kMotionMapSide} * driver::kMotionMapSide> map_{};
   Picture seen_;  ///< luma lines of the field looked at before; empty: none
   MovedBlocks blocks_;
   std::int64_t moving_until_ = INT64_MIN;
