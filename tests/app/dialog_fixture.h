@@ -6,6 +6,7 @@
 #ifndef DIALOG_FIXTURE_H
 #define DIALOG_FIXTURE_H
 
+#include <dlfcn.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -33,14 +34,8 @@ bool wait_until(Condition condition) {
 /// The dialog with its protected functions in reach.
 class OpenDialog : public DemoDialog {
  public:
-  using DemoDialog::CheckCheckBox;
-  using DemoDialog::CheckDiskSpace;
-  using DemoDialog::CloseFile;
-  using DemoDialog::languageChange;
-  using DemoDialog::OpenFile;
-  using DemoDialog::UpdateUI;
-  using DemoDialog::WriteEnableCh;
-  using DemoDialog::WriteVideoRecordConfig;
+  using DemoDialog::CheckCheckBox, DemoDialog::CloseFile, DemoDialog::OpenFile, DemoDialog::UpdateUI,
+      DemoDialog::WriteVideoRecordConfig;
 };
 
 inline void reset_module_state() {
@@ -49,15 +44,12 @@ inline void reset_module_state() {
   zv_mode = MUX_MODE_ZV_1CH;
   zv_record_mode = VIDEO_CODEC_ZV_MPEG4;
   g_finish_preview = g_finish_record = 1;
-  g_width = 720;
-  g_height = 480;
+  g_width = g_record_width = 720;
+  g_height = g_record_height = 480;
   g_preview_ch = 0xFFFF;
-  g_record_ch = g_audio_ch = g_video_ch = g_motion_ch = 0;
-  g_valid_record_ch = 0;
+  g_record_ch = g_audio_ch = 0;
   g_channel_mode = ENABLE_PREVIEW;
   zv_config = {};
-  g_record_width = 720;
-  g_record_height = 480;
   std::strcpy(g_filepath, "./Data");
   g_min_diskspace = 10;
   g_time_interval = 10000;
@@ -90,15 +82,11 @@ inline void choose(QComboBox *combo, int index) {
   emit combo->activated(index);
 }
 
-/// Texts an operator may type where a number belongs, and the number they count as.
-struct TypedNumber {
-  const char *text;
-  int value;
-};
-inline constexpr TypedNumber kTypedNumbers[] = {
-    {"", 0},           {"text", 0},        {"   ", 0},
-    {"-", 0},          {"-1", -1},         {" 5 ", 5},
-    {"2147483648", 0}, {"99999999999", 0}, {"-2147483648", -2147483647 - 1}};
+/// The function that one of this program passes its calls on to.
+template <typename Function>
+Function *real(const char *name, Function &) {
+  return reinterpret_cast<Function *>(dlsym(RTLD_NEXT, name));
+}
 
 /// What `action` and the threads that end within it print.
 template <typename Action>

@@ -1,18 +1,8 @@
 // The wall clock, the disk, the pause and the shell as a test of the recording wants them; these names come
 // before libc's in the program that links this.
-#include <dlfcn.h>
 #include <sys/vfs.h>
 
 #include "recording_fixture.h"
-
-namespace {
-
-template <typename Function>
-Function *real(const char *name, Function *) {
-  return reinterpret_cast<Function *>(dlsym(RTLD_NEXT, name));
-}
-
-}  // namespace
 
 extern "C" {
 

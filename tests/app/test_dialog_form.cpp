@@ -1,6 +1,7 @@
 // The form as the operator sees and uses it, compared with form.txt, which is written from the
 // operator's view and not from the form's file.
 #include <QApplication>
+#include <QFile>
 #include <QGridLayout>
 #include <QMetaMethod>
 #include <QTest>
@@ -9,12 +10,21 @@
 #include <map>
 
 #include "dialog_fixture.h"
-#include "form_table.h"
 
 namespace {
 
 using testing::ElementsAreArray;
 using Names = std::vector<std::string>;
+
+// The lines of form.txt that begin with `kind`, without it.
+Names lines_of_form(const QString &kind) {
+  QFile file(QStringLiteral(FORM_TABLE));
+  EXPECT_TRUE(file.open(QIODevice::ReadOnly));
+  Names lines;
+  for (const QString &line : QString::fromUtf8(file.readAll()).split('\n'))
+    if (line.startsWith(kind + '|')) lines.push_back(line.mid(kind.size() + 1).toStdString());
+  return lines;
+}
 
 bool is_group(const QWidget *widget) {
   return qobject_cast<const QGroupBox *>(widget) != nullptr;
@@ -39,9 +49,9 @@ QString text_of(const QWidget *widget) {
 }
 
 QString special_of(const QWidget *widget) {
-  QString words;
+  QStringList words;
   const auto add = [&](bool holds, const QString &word) {
-    words += holds ? (words.isEmpty() ? "" : " ") + word : "";
+    words += holds ? QStringList(word) : QStringList();
   };
   add(!widget->isEnabled(), "disabled");
   // A colour nobody sees is no colour: the disabled palette counts for what is always disabled.
@@ -55,22 +65,19 @@ QString special_of(const QWidget *widget) {
         QString("%1..%2 at %3").arg(slider->minimum()).arg(slider->maximum()).arg(slider->value()));
   add(widget->property("checked").toBool(), "checked");
   add(!widget->toolTip().isEmpty(), "tip " + widget->toolTip());
-  return words;
+  return words.join(' ');
 }
 
 TEST_F(DialogTest, ShowsTheFormOfTheTable) {
   Names found, stops;
-  const auto describe = [&](const QWidget *widget) {
-    const QStringList columns = {widget->objectName(), widget->metaObject()->className(),
-                                 place_of(widget, dialog->DemoDialogLayout), text_of(widget),
-                                 special_of(widget)};
-    found.push_back(columns.join('|').toStdString());
-  };
-  for (const QGroupBox *group : children_of<QGroupBox>(dialog.get())) {
-    describe(group);
-    for (const QWidget *child : children_of(group)) describe(child);
-  }
-  EXPECT_THAT(found, ElementsAreArray(lines_of_form("")));
+  for (QWidget *group : children_of<QGroupBox>(dialog.get()))
+    for (const QWidget *widget : QWidgetList{group} + children_of(group)) {
+      const QStringList columns = {widget->objectName(), widget->metaObject()->className(),
+                                   place_of(widget, dialog->DemoDialogLayout), text_of(widget),
+                                   special_of(widget)};
+      found.push_back(columns.join('|').toStdString());
+    }
+  EXPECT_THAT(found, ElementsAreArray(lines_of_form("widget")));
   EXPECT_EQ(dialog->windowTitle() + dialog->objectName(), "Tarn DemoDemoDialog");
   EXPECT_EQ(dialog->DemoDialogLayout->contentsMargins(), QMargins(11, 11, 11, 11));
   EXPECT_EQ(dialog->DemoDialogLayout->spacing(), 6);
@@ -111,13 +118,12 @@ using ConnectionTest = DialogTestOf<ListeningDialog>;
 void use(QWidget *widget) {
   widget->setEnabled(true);
   if (auto *button = qobject_cast<QAbstractButton *>(widget)) return button->click();
-  const bool typed = qobject_cast<QLineEdit *>(widget) != nullptr;
-  QTest::keyClick(widget, typed                                        ? Qt::Key_7
-                          : qobject_cast<QSlider *>(widget) != nullptr ? Qt::Key_Left
-                                                                       : Qt::Key_End);
+  if (qobject_cast<QLineEdit *>(widget) != nullptr) return QTest::keyClicks(widget, "7\r");
+  QTest::keyClick(widget, qobject_cast<QSlider *>(widget) != nullptr ? Qt::Key_Left : Qt::Key_End);
 }
 
-// A connection made twice, by name and by the form, or one left out would show here.
+// A connection made twice, by name and by the form, or one left out would show here; so would a button
+// that Return presses out of an edit.
 TEST_F(ConnectionTest, EachSenderReachesItsSlotOnceAndTheOthersNone) {
   std::map<std::string, Names> connections;
   for (const std::string &line : lines_of_form("connect"))
@@ -195,6 +201,29 @@ TEST_F(DialogTest, ClipsNothingAtAnyFontAndSize) {
   EXPECT_NE(dialog->btnGetShield->geometry(), place);
   dialog->setFont(font);
   EXPECT_EQ(dialog->btnGetShield->geometry(), place);
+}
+
+// The widgets that `status` switches when all of them were switched the other way before.
+QString switched(OpenDialog &dialog, int status, bool to) {
+  QStringList names;
+  const auto widgets = dialog.findChildren<QWidget *>();
+  for (QWidget *widget : widgets) widget->setEnabled(is_group(widget) || !to);
+  dialog.UpdateUI(static_cast<UI_STATUS>(status));
+  for (const QWidget *widget : widgets)
+    if (!is_group(widget) && widget->isEnabled() == to) names << widget->objectName();
+  names.sort();
+  return names.join(' ');
+}
+
+TEST_F(DialogTest, SwitchesTheWidgetsOfEachActivityWhateverElseRuns) {
+  for (const std::string &line : lines_of_form("state")) {
+    const QStringList row = QString::fromStdString(line).split('|');
+    g_finish_preview = row[1] != "preview";
+    g_finish_record = row[1] != "recording";
+    g_channel_mode = row[1] == "audio" ? ENABLE_AUDIO : ENABLE_RECORD;
+    EXPECT_EQ(switched(*dialog, row[0].toInt(), true), row[2]) << line;
+    EXPECT_EQ(switched(*dialog, row[0].toInt(), false), row[3]) << line;
+  }
 }
 
 }  // namespace

@@ -9,46 +9,37 @@ enum { kNone, kCif, kHalfD1, kD1 };
 TEST_F(EncodePanel, QualityAndFieldModeDecideTheChannels) {
   const struct {
     int quality, fields;
-    unsigned record;
-    int valid;
-    u32 scale, twofield;
+    unsigned record, valid, scale, twofield;
   } rows[] = {{kCif, 0, 0xFFFF, 16, 2, 0},   {kCif, 1, 0x00FF, 8, 2, 1}, {kHalfD1, 0, 0x00FF, 8, 1, 0},
               {kHalfD1, 1, 0x000F, 4, 1, 1}, {kD1, 1, 0x000F, 4, 3, 0},  {kNone, 1, 0, 0, 3, 0}};
-  for (const auto &row : rows) {
-    SCOPED_TRACE(testing::Message() << row.quality << " " << row.fields);
-    dialog->combowTwoField->setCurrentIndex(row.fields);
-    choose(dialog->comboQualityMode, row.quality);
-    const bool on = row.quality != kNone;
-    EXPECT_EQ(g_record_ch, row.record);
-    EXPECT_EQ(g_valid_record_ch, row.valid);
-    EXPECT_EQ(dialog->CheckCheckBox(), row.record);
-    EXPECT_EQ(zv_config.scale, row.scale);
-    EXPECT_EQ(zv_config.twofield, row.twofield);
-    EXPECT_EQ(dialog->combowTwoField->isEnabled(), row.quality != kD1);
-    EXPECT_EQ(dialog->combowTwoField->currentIndex(), row.quality == kD1 ? 0 : row.fields);
-    EXPECT_EQ(dialog->btnRecordStart->isEnabled(), on);
-    EXPECT_EQ(dialog->radioEnRecord->isChecked(), on);
-    EXPECT_EQ(g_channel_mode, on ? ENABLE_RECORD : INITIAL_CASE);
+  for (const auto &[quality, fields, record, valid, scale, twofield] : rows) {
+    SCOPED_TRACE(testing::Message() << quality << " " << fields);
+    dialog->combowTwoField->setCurrentIndex(fields);
+    choose(dialog->comboQualityMode, quality);
+    const unsigned found[] = {g_record_ch, static_cast<unsigned>(g_valid_record_ch), zv_config.scale,
+                              zv_config.twofield, dialog->CheckCheckBox()};
+    EXPECT_THAT(found, testing::ElementsAre(record, valid, scale, twofield, record));
+    EXPECT_EQ(dialog->combowTwoField->isEnabled(), quality != kD1);
+    EXPECT_EQ(dialog->combowTwoField->currentIndex(), quality == kD1 ? 0 : fields);
+    EXPECT_EQ(dialog->btnRecordStart->isEnabled(), quality != kNone);
+    EXPECT_EQ(dialog->radioEnRecord->isChecked(), quality != kNone);
+    EXPECT_EQ(g_channel_mode, quality != kNone ? ENABLE_RECORD : INITIAL_CASE);
   }
 }
 
 // Choosing a quantiser or a bit rate puts the other back.
 TEST_F(EncodePanel, ItemsStandForTheirValues) {
+  const auto stored = [] { return std::tuple(zv_config.qp, zv_config.CBREnable, zv_config.CBRValue); };
   for (int n = 1; n < dialog->comboCBRValue->count(); ++n) {
-    choose(dialog->comboQPvalue, 3);
     choose(dialog->comboCBRValue, n);
-    QString text = dialog->comboCBRValue->itemText(n);
-    const int unit = text.endsWith('k') ? 1024 : 1048576;
-    text.chop(1);
-    EXPECT_EQ(zv_config.CBRValue, text.toInt() * unit);
-    EXPECT_EQ(zv_config.CBREnable, 1u);
-    EXPECT_EQ(zv_config.qp, 4u);
     EXPECT_EQ(dialog->comboQPvalue->currentIndex(), 0);
-  }
-  for (int n = 1; n < dialog->comboQPvalue->count(); ++n) {
-    choose(dialog->comboQPvalue, n);
-    EXPECT_EQ(zv_config.qp, dialog->comboQPvalue->itemText(n).toUInt());
-    EXPECT_EQ(zv_config.CBREnable, 0u);
+    const std::string rate = dialog->comboCBRValue->itemText(n).toStdString();
+    EXPECT_EQ(stored(), std::tuple(4u, 1u, std::stoi(rate) * (rate.back() == 'k' ? 1024 : 1048576)));
+    const int item = (n - 1) % 8 * 2 + 1;
+    for (const int next : {item, item + 1}) {
+      choose(dialog->comboQPvalue, next);
+      EXPECT_EQ(stored(), std::tuple(dialog->comboQPvalue->itemText(next).toUInt(), 0u, 0));
+    }
     EXPECT_EQ(dialog->comboCBRValue->currentIndex(), 0);
   }
   for (int n = 0; n < dialog->comboGOPValue->count(); ++n) {
@@ -56,11 +47,10 @@ TEST_F(EncodePanel, ItemsStandForTheirValues) {
     dialog->SetGOP();
     EXPECT_EQ(zv_config.gop, n ? dialog->comboGOPValue->itemText(n).toUInt() : 30u);
   }
-  choose(dialog->comboJpegQuality, 1);
-  choose(dialog->comboFrameRate, 15);
-  for (QComboBox *none : {dialog->comboJpegQuality, dialog->comboFrameRate}) choose(none, -1);
-  EXPECT_EQ(zv_config.jpeg_qp, JPEG_QP_ZV_HIGH);
-  EXPECT_EQ(zv_config.interval, INTERVAL_ZV_1FPS_NTSC);
+  for (const int index : {1, -1}) choose(dialog->comboJpegQuality, index);
+  for (const int index : {15, -1}) choose(dialog->comboFrameRate, index);
+  EXPECT_EQ(std::pair(zv_config.jpeg_qp, zv_config.interval),
+            std::pair(JPEG_QP_ZV_HIGH, INTERVAL_ZV_1FPS_NTSC));
 }
 
 TEST_F(EncodePanel, QuantiserRangeFollowsWhatIsTyped) {
@@ -87,10 +77,9 @@ TEST_F(EncodePanel, SettingsAreHandedOverAndShownAsReadBack) {
   choose(dialog->comboQPvalue, 9);
   choose(dialog->comboFrameRate, 6);
   EXPECT_EQ(printed_by([&] { EXPECT_EQ(dialog->WriteVideoRecordConfig(), 1); }), "");
-  EXPECT_EQ(dialog->edtScale->text(), "Half D1");
-  EXPECT_EQ(dialog->edtFrameRate->text(), "30");
-  EXPECT_EQ(dialog->edtQuallity->text(), "9");
-  EXPECT_EQ(dialog->edtBitRate->text(), "6");
+  EXPECT_EQ(dialog->edtScale->text() + " " + dialog->edtFrameRate->text() + " " +
+                dialog->edtQuallity->text() + " " + dialog->edtBitRate->text(),
+            "Half D1 30 9 6");
   ZV_VIDEO_CONFIG stored{};
   zv_GetVideoEncodeConfig(zv_handle, 3, &stored);  // not recorded: the clean settings
   EXPECT_EQ(stored.scale, SCALE_ZV_NO_ENCODE);

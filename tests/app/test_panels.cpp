@@ -4,13 +4,21 @@ namespace {
 
 using Panels = DialogTest;
 
+// Texts an operator may type where a number belongs, and the number they count as.
+constexpr struct {
+  const char *text;
+  int value;
+} kTyped[] = {{"", 0},           {"text", 0},        {"   ", 0},
+              {"-", 0},          {"-1", -1},         {" 5 ", 5},
+              {"2147483648", 0}, {"99999999999", 0}, {"-2147483648", -2147483647 - 1}};
+
 TEST_F(Panels, WhatIsTypedReachesTheSdkOrIsRefused) {
   dialog->comboMotionArea->setCurrentIndex(4);
   dialog->checkMotionArea->setChecked(true);
   QLineEdit *const edits[] = {dialog->edtLeft,  dialog->edtRight,      dialog->edtTop,  dialog->edtBottom,
                               dialog->edtMLeft, dialog->edtMRight,     dialog->edtMTop, dialog->edtMBottom,
                               dialog->edtFocus, dialog->edtSensitivity};
-  for (const auto &[text, value] : kTypedNumbers) {
+  for (const auto &[text, value] : kTyped) {
     SCOPED_TRACE(text);
     for (QLineEdit *edit : edits) edit->setText(text);
     const std::string number = std::to_string(value);
@@ -31,6 +39,21 @@ TEST_F(Panels, WhatIsTypedReachesTheSdkOrIsRefused) {
     }
     expect(dialog->btnSetMotionArea, lines, "MarkMotionArea", value < 0);
     for (const QLineEdit *edit : edits) EXPECT_EQ(edit->text(), text);
+  }
+}
+
+TEST_F(Panels, RecordSettingsOutOfRangeBecomeTen) {
+  const struct {
+    const char *text;
+    int limit, seconds;
+  } rows[] = {{"", 10, 10},   {"0", 10, 10},  {"-1", 10, 10},   {"x", 10, 10},   {" 1", 10, 1},  {"9", 10, 9},
+              {"59", 59, 59}, {"60", 60, 10}, {"100", 100, 10}, {"101", 10, 10}, {"1.5", 10, 10}};
+  for (const auto &[text, limit, seconds] : rows) {
+    for (QLineEdit *edit : {dialog->edtDiskLimit, dialog->edtTime}) edit->setText(text);
+    dialog->btnFolder->click();
+    EXPECT_EQ(std::pair(g_min_diskspace, g_time_interval), std::pair(limit, seconds * 1000)) << text;
+    EXPECT_EQ(dialog->edtDiskLimit->text(), limit == 10 ? "10" : text);
+    EXPECT_EQ(dialog->edtTime->text(), seconds == 10 ? "10" : text);
   }
 }
 

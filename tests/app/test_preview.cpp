@@ -1,7 +1,6 @@
 // The preview thread and its controls, and the dialog's way of opening and leaving the card. SDL's calls
 // pass through this program on their way, so that a test sees what reached the window.
 #include <SDL.h>
-#include <dlfcn.h>
 
 #include <QTest>
 #include <atomic>
@@ -16,11 +15,12 @@
 #include "zv_driver.h"
 #include "zv_lib.h"
 
+extern SDL_Overlay *overlay;  // the preview window's
+
 namespace {
 
 struct Window {
   bool no_window = false, no_overlay = false;
-  int padding = 0;  // pixels that each row of the overlay has in excess
   std::atomic<int> pictures = 0;
   std::mutex mutex;  // guards what follows
   std::vector<std::string> captions;
@@ -28,27 +28,20 @@ struct Window {
   int width = 0, height = 0;
 } window;
 
-template <typename Function>
-Function *real(Function &, const char *name) {
-  return reinterpret_cast<Function *>(dlsym(RTLD_NEXT, name));
-}
-
 }  // namespace
 
 extern "C" {
 SDL_Surface *SDL_SetVideoMode(int width, int height, int bits, Uint32 flags) {
-  return window.no_window ? nullptr : real(SDL_SetVideoMode, "SDL_SetVideoMode")(width, height, bits, flags);
+  return window.no_window ? nullptr : real("SDL_SetVideoMode", SDL_SetVideoMode)(width, height, bits, flags);
 }
 SDL_Overlay *SDL_CreateYUVOverlay(int width, int height, Uint32 format, SDL_Surface *surface) {
-  if (window.no_overlay) return nullptr;
-  const auto create = real(SDL_CreateYUVOverlay, "SDL_CreateYUVOverlay");
-  SDL_Overlay *overlay = create(width + window.padding, height, format, surface);
-  overlay->w = width;
-  return overlay;
+  return window.no_overlay
+             ? nullptr
+             : real("SDL_CreateYUVOverlay", SDL_CreateYUVOverlay)(width, height, format, surface);
 }
-int SDL_DisplayYUVOverlay(SDL_Overlay *overlay, SDL_Rect *rect) {
+int SDL_DisplayYUVOverlay(SDL_Overlay *shown, SDL_Rect *rect) {
   const std::lock_guard lock(window.mutex);
-  window.plane.assign(overlay->pixels[0], overlay->pixels[0] + overlay->pitches[0] * overlay->h);
+  window.plane.assign(shown->pixels[0], shown->pixels[0] + shown->pitches[0] * shown->h);
   window.width = rect->w;
   window.height = rect->h;
   ++window.pictures;
@@ -104,26 +97,21 @@ TEST_F(PreviewTest, ShowsTheCardsPictureInAWindowOfTheChosenSize) {
 
 // The card is left alone when it does not do what the operator chose, or when there is no window.
 TEST_F(PreviewTest, EndsAtOnceWhenAStartUpCheckFails) {
-  zv_format = VIDEO_STANDARD_ZV_PAL;
-  EXPECT_EQ(printed_by_thread(), "ERROR:format does not match\n" + kEnd);
-  zv_format = VIDEO_STANDARD_ZV_NTSC;
-  zv_mode = MUX_MODE_ZV_INVALID;
-  EXPECT_EQ(printed_by_thread(), "ERROR:zv_SetPreviewMode Error\nERROR:mode does not match!\n" + kEnd);
-  zv_mode = MUX_MODE_ZV_9CH;
-  zv_resolution = RESOLUTION_ZV_704;
-  EXPECT_EQ(printed_by_thread(), "ERROR:resolution does not match!\n" + kEnd);
-  zv_resolution = RESOLUTION_ZV_720;
-
+  const auto expect = [this](auto &&word, auto wrong, auto right, const std::string &printed) {
+    word = wrong;
+    EXPECT_THAT(printed_by_thread(), testing::MatchesRegex(printed + "\n" + kEnd));
+    word = right;
+  };
+  expect(zv_format, VIDEO_STANDARD_ZV_PAL, VIDEO_STANDARD_ZV_NTSC, "ERROR:format does not match");
+  expect(zv_mode, MUX_MODE_ZV_INVALID, MUX_MODE_ZV_9CH,
+         "ERROR:zv_SetPreviewMode Error\nERROR:mode does not match!");
+  expect(zv_resolution, RESOLUTION_ZV_704, RESOLUTION_ZV_720, "ERROR:resolution does not match!");
   virtual_card::record_log(true);
   qputenv("SDL_VIDEODRIVER", "missing");
   EXPECT_THAT(printed_by_thread(), testing::MatchesRegex("Initial SDL error: .+\n" + kEnd));
   qputenv("SDL_VIDEODRIVER", "dummy");
-  window.no_window = true;
-  EXPECT_THAT(printed_by_thread(), testing::MatchesRegex("Unable to set video mode: .*\n" + kEnd));
-  window.no_window = false;
-  window.no_overlay = true;
-  EXPECT_THAT(printed_by_thread(), testing::MatchesRegex("Unable to create YUV overlay: .*\n" + kEnd));
-  window.no_overlay = false;
+  expect(window.no_window, true, false, "Unable to set video mode: .*");
+  expect(window.no_overlay, true, false, "Unable to create YUV overlay: .*");
   EXPECT_TRUE(virtual_card::log().empty());
 }
 
@@ -183,8 +171,8 @@ TEST_F(PreviewTest, CopiesRowByRowIntoAPaddedOverlay) {
   constexpr std::size_t kWidth = 16, kHeight = 4, kRow = kWidth * 2;
   std::vector<Uint8> picture(kRow * kHeight, 200);
   for (const std::size_t padding : {0, 16}) {
-    window.padding = static_cast<int>(padding);
-    ASSERT_EQ(InitialSDL(kWidth, kHeight), 0);
+    ASSERT_EQ(InitialSDL(static_cast<int>(kWidth + padding), kHeight), 0);
+    overlay->w = kWidth;
     UpDataYUVScreen(picture.data(), kRow * 2 + 6);
     const std::size_t pitch = kRow + padding * 2;
     for (std::size_t n = 0; n < pitch * kHeight; ++n)
@@ -192,7 +180,6 @@ TEST_F(PreviewTest, CopiesRowByRowIntoAPaddedOverlay) {
     UpDataYUVScreen(picture.data(), 1 << 30);
     CloseSDL();
   }
-  window.padding = 0;
 }
 
 TEST_F(PreviewTest, KeepsTheOperatorsChoiceWhenTheCardRefusesIt) {
