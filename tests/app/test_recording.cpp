@@ -142,6 +142,28 @@ TEST_F(Recording, AChangedHourRotatesTheFilesAtTheNextTick) {
   EXPECT_EQ(files().size(), 4u);
 }
 
+// The hour 2 that comes twice in autumn goes on in one file; the one that spring leaves out has none.
+TEST_F(Recording, DaylightSavingFollowsTheLocalHour) {
+  setenv("TZ", "CET-1CEST,M3.5.0,M10.5.0/3", 1);
+  tzset();
+  struct {
+    std::time_t start;  // ten minutes before the clocks change
+    bool rotates;
+    const char *file;
+  } const changes[] = {{1256432400 - 600, false, "20091025/CH01/20091025-02"},
+                       {1238288400 - 600, true, "20090329/CH01/20090329-03"}};
+  for (const auto &[start_time, rotates, file] : changes) {
+    fake_system::clock_now = start_time;
+    start(kCif, 1);
+    fake_system::clock_now += 1200;
+    EXPECT_EQ(printed_by([&] { dialog->TimerTick(); }).find("Hour changed") != std::string::npos, rotates);
+    EXPECT_TRUE(files().contains("./Data/Video/" + std::string(file) + ".rec")) << file;
+    dialog->StopRecord();
+  }
+  unsetenv("TZ");
+  tzset();
+}
+
 TEST_F(Recording, AFullOrVanishedDiskStopsTheRecording) {
   choose(dialog->comboCodec, 1);  // its deliveries print nothing
   for (const bool vanished : {false, true}) {
