@@ -10,26 +10,14 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <chrono>
 #include <cstring>
 #include <memory>
 #include <string>
-#include <thread>
 
 #include "app_state.h"
 #include "demodialog.h"
+#include "support.h"
 #include "virtual_card.h"
-
-/// Waits for a condition, half a minute at most.
-template <typename Condition>
-bool wait_until(Condition condition) {
-  const auto limit = std::chrono::steady_clock::now() + std::chrono::seconds(30);
-  while (!condition()) {
-    if (std::chrono::steady_clock::now() > limit) return false;
-    std::this_thread::sleep_for(std::chrono::milliseconds(1));
-  }
-  return true;
-}
 
 /// The dialog with its protected functions in reach.
 class OpenDialog : public DemoDialog {
@@ -86,14 +74,6 @@ inline void choose(QComboBox *combo, int index) {
 template <typename Function>
 Function *real(const char *name, Function &) {
   return reinterpret_cast<Function *>(dlsym(RTLD_NEXT, name));
-}
-
-/// What `action` and the threads that end within it print.
-template <typename Action>
-std::string printed_by(Action action) {
-  testing::internal::CaptureStdout();
-  action();
-  return testing::internal::GetCapturedStdout();
 }
 
 #endif

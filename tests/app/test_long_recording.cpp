@@ -86,7 +86,7 @@ std::string hash_of_files(const fs::path &root, const std::string &kind, unsigne
 bool delivered(std::uint64_t due) {
   const auto handed_out = [] { return virtual_card::counters().mpeg4.delivered; };
   for (std::uint64_t seen = handed_out(); seen < due; seen = handed_out())
-    if (!wait_until([&] { return handed_out() > seen; })) return false;
+    if (!eventually([&] { return handed_out() > seen; })) return false;
   return true;
 }
 

@@ -66,7 +66,7 @@ class PreviewTest : public DialogTest {
   void press(QPushButton *button) { QTest::mouseClick(button, Qt::LeftButton); }
   void wait_for_pictures(int number) {
     const int before = window.pictures;
-    ASSERT_TRUE(wait_until([&] { return window.pictures >= before + number; }));
+    ASSERT_TRUE(eventually([&] { return window.pictures >= before + number; }));
   }
   // What the thread prints when it is started and ends by itself.
   std::string printed_by_thread() {
@@ -85,7 +85,7 @@ TEST_F(PreviewTest, ShowsTheCardsPictureInAWindowOfTheChosenSize) {
     window.captions.clear();
     press(dialog->btnPreviewStart);
     EXPECT_FALSE(dialog->radioPAL->isEnabled());
-    ASSERT_TRUE(wait_until([] { return std::lock_guard(window.mutex), window.captions.size() >= 2; }));
+    ASSERT_TRUE(eventually([] { return std::lock_guard(window.mutex), window.captions.size() >= 2; }));
     press(dialog->btnPreviewStop);
     join_preview_thread();
     EXPECT_EQ(std::pair(window.width, window.height), pal ? std::pair(720, 576) : std::pair(704, 480));

@@ -7,7 +7,6 @@
 #include <cerrno>
 #include <filesystem>
 #include <mutex>
-#include <thread>
 
 namespace vc = virtual_card;
 
@@ -96,24 +95,9 @@ std::size_t count(const Lines &lines, const std::string &line) {
   return static_cast<std::size_t>(std::count(lines.begin(), lines.end(), line));
 }
 
-bool eventually(const std::function<bool()> &condition) {
-  const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(30);
-  while (!condition()) {
-    if (std::chrono::steady_clock::now() > end) return false;
-    std::this_thread::sleep_for(std::chrono::milliseconds(1));
-  }
-  return true;
-}
-
 std::size_t entries(const char *directory) {
   const std::filesystem::directory_iterator list(directory);
   return static_cast<std::size_t>(std::distance(begin(list), end(list)));
-}
-
-std::string printed(const std::function<void()> &action) {
-  testing::internal::CaptureStdout();
-  action();
-  return testing::internal::GetCapturedStdout();
 }
 
 Faults faults;

@@ -9,11 +9,11 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <chrono>
 #include <functional>
 #include <string>
 #include <vector>
 
+#include "support.h"
 #include "virtual_card.h"
 #include "zv_card.h"
 #include "zv_lib.h"
@@ -41,12 +41,8 @@ std::string sent();
 Lines operations();
 std::size_t count(const Lines &lines, const std::string &line);
 
-/// Waits for a condition, half a minute at most.
-bool eventually(const std::function<bool()> &condition);
 /// The number of entries, as in /proc/self/fd.
 std::size_t entries(const char *directory);
-/// What `action` prints.
-std::string printed(const std::function<void()> &action);
 
 // Faults between the SDK and libc. A fault strikes the `countdown`-th call from now, once.
 struct Faults {

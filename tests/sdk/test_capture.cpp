@@ -91,13 +91,13 @@ TEST_F(Capture, StartAndStopSendTheirCommandsOnce) {
 TEST_F(Capture, StartRefusesAndRecovers) {
   for (u32 channel = 0; channel < 5; ++channel) card().config[channel].scale = SCALE_ZV_D1;
   int status = -1;
-  EXPECT_NE(printed([&] { status = zv_Start(handle); }), "");
+  EXPECT_NE(printed_by([&] { status = zv_Start(handle); }), "");
   EXPECT_EQ(status, ZV_ERR_CONFIG);
   EXPECT_EQ(zarvo::start_flag, 0);
   for (int thread : {1, 2}) {
     enable(1);
     faults.thread_countdown = thread;
-    EXPECT_EQ(printed([&] { status = zv_Start(handle); }), "Zarvo SDK: Start Error! Error Code = 12.\n");
+    EXPECT_EQ(printed_by([&] { status = zv_Start(handle); }), "Zarvo SDK: Start Error! Error Code = 12.\n");
     EXPECT_EQ(status, ZV_ERR_THREAD_CREATE);
     EXPECT_EQ(card().config[0].scale, SCALE_ZV_NO_ENCODE);
     EXPECT_EQ(count(issued(), "00006510"), 1u);
@@ -158,6 +158,7 @@ TEST_F(Capture, StopFromACallbackEndsCaptureAndItStartsAgain) {
   }
   start_endless();
   EXPECT_TRUE(wait_for_deliveries(deliveries().size() + 10));
+  EXPECT_EQ(zv_Stop(handle), ZV_OK);  // while what the callbacks look at is still there
 }
 
 /// A close that waits for threads it has not told to end, or takes the card from under them.

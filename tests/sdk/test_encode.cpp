@@ -65,7 +65,7 @@ TEST_F(Encode, BudgetCountsWholeFrames) {
     for (const Load &load : test.loads)
       for (u32 i = 0; i < load.channels; ++i) zv_SetVideoEncodeConfig(handle, channel++, &load.config);
     int status = -1;
-    EXPECT_EQ(printed([&] { status = zv_CheckVideoEncodeConfig(handle); }), test.output);
+    EXPECT_EQ(printed_by([&] { status = zv_CheckVideoEncodeConfig(handle); }), test.output);
     EXPECT_EQ(status, test.status);
   }
 }
@@ -73,13 +73,13 @@ TEST_F(Encode, BudgetCountsWholeFrames) {
 TEST_F(Encode, RefusedSettingsAreStored) {
   ZV_VIDEO_CONFIG stored{}, slow = settings(SCALE_ZV_CIF, 6, TWOFIELD_ENABLE);
   int status = -1;
-  EXPECT_EQ(printed([&] { status = zv_SetVideoEncodeConfig(handle, 2, &slow); }), "");
+  EXPECT_EQ(printed_by([&] { status = zv_SetVideoEncodeConfig(handle, 2, &slow); }), "");
   EXPECT_EQ(status, ZV_ERR_CONFIG);
   EXPECT_EQ(zv_GetVideoEncodeConfig(handle, 2, &stored), ZV_OK);
   EXPECT_EQ(std::memcmp(&stored, &slow, sizeof slow), 0);
   slow.enable = 1;
   slow.scale = SCALE_ZV_NO_ENCODE;
-  EXPECT_EQ(printed([&] { status = zv_SetVideoEncodeConfig(handle, 2, &slow); }),
+  EXPECT_EQ(printed_by([&] { status = zv_SetVideoEncodeConfig(handle, 2, &slow); }),
             "Error: zv_SetVideoEncodeConfig--invalid scale value.\n");
   EXPECT_EQ(status, ZV_ERR_CONFIG);
   EXPECT_EQ(zv_SetVideoEncodeConfig(handle, 16, &slow), ZV_ERR_CHANNEL);
@@ -160,7 +160,7 @@ TEST_F(Encode, EnablingSendsQualityThenEveryChannel) {
   // A channel without a scale stops the call; the channels before it are wiped already.
   int status = -1;
   EXPECT_EQ(
-      printed([&] { status = zv_EnableVideoRecordChannels(handle, 0x0210); }),
+      printed_by([&] { status = zv_EnableVideoRecordChannels(handle, 0x0210); }),
       "ZarvoSDK: Error: zv_EnableVideoRecordChannels--invalid scale value of Channel4. Please confirm  video "
       "config first.\n");
   EXPECT_EQ(status, ZV_ERR_CONFIG);

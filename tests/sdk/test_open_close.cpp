@@ -53,7 +53,7 @@ void Opening::fail_each(int status, const std::function<void(int)> &arm, int exp
     arm(countdown);
     handle = nullptr;
     int result = -1;
-    const std::string output = printed([&] { result = zv_Open(&handle); });
+    const std::string output = printed_by([&] { result = zv_Open(&handle); });
     if (vc::fault_hits() == 0 && !faults.struck) {
       EXPECT_EQ(result, ZV_OK);
       break;

@@ -42,7 +42,7 @@ TEST_F(Watchdog, HandshakesTryTenTimes) {
 
   vc::record_log(true);
   vc::script_board_replies(0x2B, wrong(10));
-  EXPECT_EQ(printed([&] {
+  EXPECT_EQ(printed_by([&] {
               EXPECT_EQ(zv_EnableWatchDog(handle), ZV_OK);
               EXPECT_TRUE(thread_ended());
             }),
@@ -53,7 +53,7 @@ TEST_F(Watchdog, HandshakesTryTenTimes) {
 
   enable_watchdog();
   vc::script_board_replies(0x2B, wrong(10));
-  EXPECT_EQ(printed([&] {
+  EXPECT_EQ(printed_by([&] {
               faults.clock_ahead += 30;
               EXPECT_TRUE(thread_ended());
             }),
@@ -86,7 +86,7 @@ TEST_F(Watchdog, StatusAndVersion) {
 TEST_F(Watchdog, RegistersPrintTheirLine) {
   u32 word = 0xABCD;
   u8 byte = 0x5E;
-  EXPECT_EQ(printed([&] {
+  EXPECT_EQ(printed_by([&] {
               zv_SetTarnRegisterValue(handle, 0x268, &word);
               zv_GetTarnRegisterValue(handle, 0x268, &(word = 0));
               zv_SetTW2815RegisterValue(handle, 2, 0x17, &byte);

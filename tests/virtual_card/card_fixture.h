@@ -10,8 +10,8 @@
 
 #include <cerrno>
 #include <span>
-#include <thread>
 
+#include "support.h"
 #include "virtual_card.h"
 #include "zv_driver.h"
 
@@ -42,16 +42,6 @@ long send(int fd, u32 code, const Record &record) {
 }
 inline long send(int fd, u32 code) {
   return answer(ioctl(fd, code));
-}
-
-/// Waits for a condition, and gives up after a time that only a fault can use up.
-template <typename Condition>
-bool wait_for(Condition condition) {
-  for (int tries = 0; tries < 20000; ++tries) {
-    if (condition()) return true;
-    std::this_thread::sleep_for(1ms);
-  }
-  return false;
 }
 
 /// A card as built whose time only the test moves, with its four nodes open.

@@ -89,7 +89,7 @@ TEST_F(RunningClock, FramesComeByThemselvesAndEndWithTheLastClose) {
     run(mode, 4.0);
     const auto made = card::counters().mpeg4.made;
     EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
-    EXPECT_TRUE(wait_for([&] { return card::counters().mpeg4.made >= made + 10; }));
+    EXPECT_TRUE(eventually([&] { return card::counters().mpeg4.made >= made + 10; }));
     close_nodes();
     const auto at_close = card::counters().mpeg4.made;
     open_nodes();
@@ -105,7 +105,7 @@ TEST_F(RunningClock, AStopInTheMiddleOfAFieldLeavesNoFrameBehind) {
   for (int round = 0; round < 10; ++round) {
     const auto made = card::counters().mpeg4.made;
     EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
-    EXPECT_TRUE(wait_for([&] { return card::counters().mpeg4.made > made; }));
+    EXPECT_TRUE(eventually([&] { return card::counters().mpeg4.made > made; }));
     EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0);
     close_nodes();  // returns when the field is finished
     open_nodes();
@@ -118,7 +118,7 @@ TEST_F(RunningClock, AStopInTheMiddleOfAFieldLeavesNoFrameBehind) {
 TEST_F(RunningClock, WhatComesTooLateIsLostAndCounted) {
   run(card::ClockMode::fast, 1000);
   EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
-  EXPECT_TRUE(wait_for([&] {
+  EXPECT_TRUE(eventually([&] {
     read_mpeg4();
     read_mjpeg();
     return card::counters().mpeg4.lost > 10000;

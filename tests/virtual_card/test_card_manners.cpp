@@ -32,13 +32,13 @@ TEST_F(Manners, ThreadsTakeNoSignalsAndEndWithTheLastClose) {
   const auto before = tasks();
   open_nodes();
   EXPECT_EQ(send(display, driver::DISP_IOC_PREVIEW_ON), 0);
-  ASSERT_TRUE(wait_for([] { return card::counters().previews > 0; }));
+  ASSERT_TRUE(eventually([] { return card::counters().previews > 0; }));
   EXPECT_GT(tasks().size(), before.size());
   for (const auto &task : tasks())
     for (const int signal : {SIGTERM, SIGINT, SIGALRM, SIGCHLD, SIGUSR1})
       EXPECT_TRUE(before.count(task) != 0 || blocks(task, signal)) << task << " takes signal " << signal;
   close_nodes();
-  EXPECT_TRUE(wait_for([&] { return tasks() == before; }));
+  EXPECT_TRUE(eventually([&] { return tasks() == before; }));
 }
 
 // Programs close all numbers before they start others: the card must not lose its memory with them.

@@ -34,24 +34,6 @@ TEST_F(Motion, MovingCamerasAreReportedAndNoOthers) {
   for (int look = 0; look < 16; ++look) ASSERT_EQ(motion_after(kLook), 0xFFF0u);
 }
 
-// Settings of the card that would look like a burglar.
-TEST_F(Motion, ChangesOfSettingsAreNoMotion) {
-  bench_.state.motion_enable = kBit;
-  bench_.state.channel[kChannel].scene = Scene::still;
-  const auto expect_quiet = [&] {
-    for (int look = 0; look < 4; ++look) ASSERT_FALSE(moves(kLook));
-  };
-  expect_quiet();
-  bench_.state.channel[kChannel].picture.brightness = 255;
-  expect_quiet();
-  bench_.state.channel[kChannel].mask = {kChannel, 0, 720, 0, 240};
-  expect_quiet();
-  for (const bool lost : {true, false}) {
-    bench_.state.channel[kChannel].lost = lost;
-    expect_quiet();
-  }
-}
-
 // Levels that work the wrong way round, and areas beside the place they were set for.
 TEST_F(Motion, LevelsAreasAndMasksDecideBlockByBlock) {
   bench_.state.motion_enable = kBit;
