@@ -165,8 +165,8 @@ tour_playback() {
   click btnPlayback
   wait_until 10 xdotool search --onlyvisible --name 'Choose a file to playback' || die "no file dialog appeared"
   chooser=$(xdotool search --onlyvisible --name 'Choose a file to playback' | head -n 1)
-  xdotool windowactivate --sync "$chooser" type --delay 5 -- "$file"
   shot playback-chooser "$chooser"
+  xdotool windowactivate --sync "$chooser" type --delay 5 -- "$file"
   xdotool key Return
   wait_until 20 xdotool search --onlyvisible --name "^Channel 7 - ${file##*/}" || die "no player appeared"
   player=$(xdotool search --onlyvisible --name "^Channel 7 - ${file##*/}" | head -n 1)

@@ -38,7 +38,9 @@ unsigned parse_number(const std::string &option, const std::string &text, unsign
   const char *const text_end = text.data() + text.size();
   const auto [end, error] = std::from_chars(text.data(), text_end, number);
   if (error != std::errc{} || end != text_end || number < 1 || number > highest) {
-    throw UsageError(option + ": '" + text + "' is not a number from 1 to " + std::to_string(highest));
+    std::string message = option;
+    message.append(": '").append(text).append("' is not a number from 1 to ").append(std::to_string(highest));
+    throw UsageError(message);
   }
   return number;
 }

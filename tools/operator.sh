@@ -11,7 +11,7 @@ declare -A WIDGET=()  # object name to "x y" in the dialog
 open_display() {
   OPERATOR_FOLDER=$(mktemp -d)
   trap close_display EXIT
-  Xvfb -displayfd 3 -screen 0 1680x1050x24 -nolisten tcp 3>"$OPERATOR_FOLDER/display" >"$OPERATOR_FOLDER/xvfb.log" 2>&1 &
+  Xvfb -displayfd 3 -screen 0 1680x1200x24 -nolisten tcp 3>"$OPERATOR_FOLDER/display" >"$OPERATOR_FOLDER/xvfb.log" 2>&1 &
   XVFB=$!
   wait_until 20 test -s "$OPERATOR_FOLDER/display" || die "Xvfb did not start: $(cat "$OPERATOR_FOLDER/xvfb.log")"
   DISPLAY=:$(cat "$OPERATOR_FOLDER/display")
