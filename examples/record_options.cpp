@@ -38,9 +38,7 @@ unsigned parse_number(const std::string &option, const std::string &text, unsign
   const char *const text_end = text.data() + text.size();
   const auto [end, error] = std::from_chars(text.data(), text_end, number);
   if (error != std::errc{} || end != text_end || number < 1 || number > highest) {
-    std::string message = option;
-    message.append(": '").append(text).append("' is not a number from 1 to ").append(std::to_string(highest));
-    throw UsageError(message);
+    throw UsageError(option + ": '" + text + "' is not a number from 1 to " + std::to_string(highest));
   }
   return number;
 }
@@ -55,7 +53,9 @@ u32 parse_list(const std::string &option, const std::string &text, unsigned high
     const unsigned first = parse_number(option, item.substr(0, dash), highest);
     const unsigned last =
         dash == std::string::npos ? first : parse_number(option, item.substr(dash + 1), highest);
-    if (last < first) throw UsageError(option + ": the range '" + item + "' runs backwards");
+    if (last < first) {
+      throw UsageError(std::string(option).append(": the range '").append(item).append("' runs backwards"));
+    }
     for (unsigned number = first; number <= last; ++number) mask |= 1u << (number - 1);
   }
   return mask;
