@@ -45,7 +45,7 @@ void preview_picture(benchmark::State &state) {
         [&] {
           const double before = bench::thread_cpu_ns();
           for (int i = 0; i < kPictures; ++i) {
-            std::memcpy(overlay->pixels[0], picture, 720 * 480 * 2);
+            std::memcpy(overlay->pixels[0], picture, std::size_t{720} * 480 * 2);
             SDL_DisplayYUVOverlay(overlay, &whole);
           }
           return (bench::thread_cpu_ns() - before) / kPictures;

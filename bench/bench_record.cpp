@@ -32,7 +32,6 @@ extern char **environ;
 
 namespace {
 
-using virtual_card::ClockMode;
 using virtual_card::Supply;
 namespace fs = std::filesystem;
 
@@ -219,6 +218,7 @@ double ffmpeg_ns(std::uint64_t frames, bool mjpeg, bool paced) {
     words.push_back(folder.path() / ("out" + std::to_string(i) + suffix));
   }
   std::vector<char *> arguments;
+  arguments.reserve(words.size() + 1);
   for (std::string &word : words) arguments.push_back(word.data());
   arguments.push_back(nullptr);
   rusage before{};
@@ -335,7 +335,7 @@ BENCHMARK(rotation)->Iterations(1)->Unit(benchmark::kSecond);
 extern "C" time_t time(time_t *result) noexcept {
   timespec now{};
   clock_gettime(CLOCK_REALTIME_COARSE, &now);
-  now.tv_sec += hours_ahead * 3600;
+  now.tv_sec += time_t{hours_ahead} * 3600;
   if (result != nullptr) *result = now.tv_sec;
   return now.tv_sec;
 }

@@ -10,15 +10,12 @@
 
 #include "measure.h"
 #include "report.h"
-#include "zv_driver.h"
 #include "zv_lib.h"
 
 namespace {
 
-namespace driver = zarvo::driver;
-
 constexpr std::uint64_t kFrames = 1000;
-constexpr std::size_t kFrameSize = 10 * 1024;
+constexpr std::size_t kFrameSize = 10240;
 
 /// What the callbacks see; they run on the video thread alone.
 struct Watch {

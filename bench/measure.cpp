@@ -127,9 +127,11 @@ virtual_card::Supply encoded_supply(int frames) {
           {{area, data + length}, static_cast<long>(length + driver::kMjpegDescriptorSize)});
       ++taken;
     };
-    for (int pass = 0; pass < 64 && taken < 2 * ZV_CHANNELS; ++pass) driver.pass(keep_mpeg4, keep_mjpeg);
+    for (int pass = 0; pass < 64 && taken < std::size_t{2} * ZV_CHANNELS; ++pass)
+      driver.pass(keep_mpeg4, keep_mjpeg);
     if (const u8 *blocks = driver.audio())
-      supply.audio.push_back({{blocks, blocks + ZV_AUDIO_CHANNELS * driver::kAudioBlockSize}, 192});
+      supply.audio.push_back(
+          {{blocks, blocks + std::size_t{ZV_AUDIO_CHANNELS} * driver::kAudioBlockSize}, 192});
   }
   driver.stop();
   zv_Stop(card);
