@@ -60,16 +60,15 @@ const Supply &streams() {
   return supply;
 }
 
-void need_application() {
-  static int argc = 1;
-  static char name[] = "bench_record";
-  static char *argv[] = {name, nullptr};
-  setenv("QT_QPA_PLATFORM", "offscreen", 1);
-  static const QApplication application(argc, argv);
-}
-
+/// The one Qt application of the process, which stands before the first dialog and never ends.
 struct Application {
-  Application() { need_application(); }
+  Application() {
+    static int argc = 1;
+    static char name[] = "bench_record";
+    static char *argv[] = {name, nullptr};
+    setenv("QT_QPA_PLATFORM", "offscreen", 1);
+    static const QApplication application(argc, argv);
+  }
 };
 
 /// The program's own recording: sixteen CIF channels and four audio inputs under a root of its own.

@@ -57,11 +57,12 @@ void DemoDialog::PreviewSplit16() {
 }
 
 void DemoDialog::CheckFormat() {
-  show_standard(radioNTSC->isChecked() ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL);
+  const ZV_VIDEO_STANDARD standard = radioNTSC->isChecked() ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL;
   comboFrameRate->clear();
-  comboFrameRate->addItems(frame_rate_labels(zv_format));
+  comboFrameRate->addItems(frame_rate_labels(standard));
   zv_config.interval = static_cast<ZV_INTERVAL_VALUE>(0);
   comboFrameRate->setCurrentIndex(0);
+  show_standard(standard);
 }
 
 void DemoDialog::ChangeResolution() {
