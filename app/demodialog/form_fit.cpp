@@ -82,12 +82,14 @@ QWidgetList children_of(const QGroupBox *group) {
 
 Factors factors_for(const QList<QGroupBox *> &groups) {
   Factors factors;
-  for (const QGroupBox *group : groups)
+  for (const QGroupBox *group : groups) {
+    const QSize title(0, title_bottom(group));
     for (QWidget *child : children_of(group)) {
       const QRect place = place_in_form(child);
       factors.make_room(room_for_text(child), place.size());
-      factors.make_room({0, title_bottom(group)}, {1, place.y()});
+      factors.make_room(title, {1, place.y()});
     }
+  }
   return factors;
 }
 
