@@ -16,6 +16,9 @@ struct PictureSize {
   u32 height;
 };
 PictureSize input_picture(const ZV_CARD &card);
+constexpr u32 input_width(u32 resolution) {
+  return resolution == RESOLUTION_ZV_720 ? 720 : 704;
+}
 /// Whether a rectangle lies inside the input picture and is not reversed. Edges may touch the limits.
 bool fits_input(const ZV_CARD &card, const ZV_RECT &rect);
 

@@ -180,14 +180,13 @@ void zv_display_close(ZV_DISPLAY *) {}
 
 int zv_display_mux_mode(ZV_DISPLAY *display, u32 mode, u32 resolution) {
   if (display == nullptr || mode >= kLayouts || frozen(*display)) return -1;
-  const u32 input_width = resolution == RESOLUTION_ZV_720 ? 720 : 704;
   issue(display->fd, driver::DISP_IOC_BEGIN_UPDATE);
   driver::Grid grid = even_grid(*display, disp_div[mode]);
   for (u32 i = 0; i < kWindows; ++i) {
     lay_out(*display, mode, i, grid);
     send_window(*display, display->window[i]);
   }
-  if (disp_div[mode] == 3 && display->width == input_width) {
+  if (disp_div[mode] == 3 && display->width == input_width(resolution)) {
     send_source(*display, kThirdSource);
     grid.column[1] += 4;
     grid.column[2] += 4;

@@ -142,6 +142,18 @@ struct Mask {
   u32 y_start;
   u32 y_end;
 };
+inline constexpr u32 kMaskUnit = 8;  ///< pixels and lines of a step of a mask register
+
+/// A mask register: the edges in units, a byte each, from the highest.
+constexpr u32 packed_mask(const Mask &units) {
+  return units.x_start << 24 | units.x_end << 16 | units.y_start << 8 | units.y_end;
+}
+
+/// The mask of a register, in pixels and lines.
+constexpr Mask unpacked_mask(u32 channel, u32 packed) {
+  return {channel, (packed >> 24) * kMaskUnit, (packed >> 16 & 0xFF) * kMaskUnit,
+          (packed >> 8 & 0xFF) * kMaskUnit, (packed & 0xFF) * kMaskUnit};
+}
 
 /// Thresholds of a block rectangle. The natural layout of the caller's pointer width: 32 bytes on a
 /// 64-bit machine, though the code's size field stays 24.
@@ -153,8 +165,9 @@ struct MotionMap {
   u32 rows;
   const u16 *thresholds;  ///< columns x rows values
 };
-inline constexpr u32 kMotionBlock = 16;    ///< pixels and lines of a motion block
-inline constexpr u32 kMotionMapSide = 64;  ///< blocks a side of a whole map
+inline constexpr u32 kMotionBlock = 16;     ///< pixels and lines of a motion block
+inline constexpr u32 kMotionMapSide = 64;   ///< blocks a side of a whole map
+inline constexpr u16 kNeverMoves = 0xFFFF;  ///< the threshold of a block that never reports motion
 
 /// A TW2815 register.
 struct DecoderRegister {
@@ -194,6 +207,19 @@ inline constexpr std::size_t kMjpegAreaSize = kStreamRegionSize - kMjpegAreaOffs
 // MPEG-4 area: descriptor, then the bitstream.
 inline constexpr std::size_t kMpeg4DescriptorSize = 64;
 inline constexpr std::size_t kMpeg4ReadSize = 0x100000;
+/// The first word of the descriptor.
+struct Mpeg4Head {
+  u32 channel;
+  u32 type;    ///< 0 intra
+  u32 length;  ///< bytes of the bitstream
+};
+inline constexpr u32 kMpeg4LengthMask = 0xFFFFF;
+constexpr u32 packed_head(const Mpeg4Head &head) {
+  return (head.length & kMpeg4LengthMask) | (head.type & 3) << 22 | (head.channel & 0xF) << 24;
+}
+constexpr Mpeg4Head unpacked_head(u32 word) {
+  return {word >> 24 & 0xF, word >> 22 & 3, word & kMpeg4LengthMask};
+}
 inline constexpr std::size_t kMpeg4TimeSeconds = 20;       ///< u32 in the descriptor
 inline constexpr std::size_t kMpeg4TimeMicroseconds = 24;  ///< u32 in the descriptor
 
@@ -240,6 +266,7 @@ inline constexpr u32 kDecoderChips = 4;
 inline constexpr u32 kChannelsPerChip = 4;
 inline constexpr u8 kDecoderProperty = 0x07;  ///< + 16 * (channel mod 4): hue, then the others
 inline constexpr u8 kDecoderChannelStride = 0x10;
+inline constexpr u8 kDecoderSetup[][2] = {{0x72, 0x00}, {0x73, 0x11}, {0x74, 0x11}};  ///< at open, chip 0
 inline constexpr u8 kDecoderStatus = 0x5A;  ///< bits 0-3 video, 4-7 audio present
 
 // Board controller.
@@ -248,6 +275,8 @@ inline constexpr u32 kBoardWatchdogOff = 0x2D;
 inline constexpr u32 kBoardVersion = 0x3A;
 inline constexpr u32 kBoardWatchdogOnReply = 0xA3;
 inline constexpr u32 kBoardWatchdogOffReply = 0xA5;
+inline constexpr u32 kBoardVersionReplies[] = {0xBB, 0xCC,
+                                               0xDD};  ///< by hardware version; 0 is the first, too
 
 }  // namespace zarvo::driver
 

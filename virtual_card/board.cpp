@@ -68,9 +68,8 @@ void Board::write_codec(u32 address, u32 value) {
 void Board::write_video_input(u32 address, u32 value) {
   settings.video_input.write(address, value);
   for (u32 n = 0; n < kChannels; ++n) {
-    const u32 mask = settings.video_input.read(driver::kRegPrivacyMask + 4 * n);
-    settings.state.channel[n].mask = {n, (mask >> 24) * kMaskUnit, (mask >> 16 & 0xFF) * kMaskUnit,
-                                      (mask >> 8 & 0xFF) * kMaskUnit, (mask & 0xFF) * kMaskUnit};
+    settings.state.channel[n].mask =
+        driver::unpacked_mask(n, settings.video_input.read(driver::kRegPrivacyMask + 4 * n));
     settings.state.display.routing[n] =
         settings.video_input.read(driver::kRegRouting + 4 * n) >> driver::kRoutingShift;
   }

@@ -33,7 +33,7 @@ class BoardController {
   void feed(nanoseconds now);
   void stop(nanoseconds now);
 
-  u32 version_ = 0xBB;
+  u32 version_ = driver::kBoardVersionReplies[0];
   std::map<u32, std::deque<u32>> scripts_;
   bool running_ = false;
   nanoseconds deadline_{0};

@@ -20,7 +20,6 @@ inline constexpr unsigned kAudioInputs = ZV_AUDIO_CHANNELS;
 inline constexpr u32 kMaxWidth = 720;
 inline constexpr u32 kNarrowWidth = 704;
 inline constexpr u32 kMaxLines = 576;
-inline constexpr u32 kMaskUnit = 8;  ///< pixels and lines of a step of a privacy mask's edge
 
 struct EncoderSettings {
   u32 scale_code = 0;     ///< 0 off, 1 half D1, 2 CIF, 9 D1

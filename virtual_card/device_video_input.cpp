@@ -48,12 +48,12 @@ std::span<const CommandRow> VideoInputDevice::commands() const {
 long VideoInputDevice::set_mask(driver::Mask &mask) {
   if (mask.x_end < mask.x_start || mask.y_end < mask.y_start) return -EINVAL;
   if (mask.x_end > kMaxWidth || mask.y_end > kMaxLines) return -EINVAL;
-  const auto down = [](u32 edge) { return edge / kMaskUnit; };
-  const auto up = [](u32 edge) { return (edge + kMaskUnit - 1) / kMaskUnit; };
+  const auto down = [](u32 edge) { return edge / driver::kMaskUnit; };
+  const auto up = [](u32 edge) { return (edge + driver::kMaskUnit - 1) / driver::kMaskUnit; };
   const bool empty = mask.x_end == mask.x_start || mask.y_end == mask.y_start;
-  const u32 packed = down(mask.x_start) << 24 | (empty ? down(mask.x_end) : up(mask.x_end)) << 16 |
-                     down(mask.y_start) << 8 | (empty ? down(mask.y_end) : up(mask.y_end));
-  board_.write_video_input(driver::kRegPrivacyMask + 4 * mask.channel, packed);
+  const driver::Mask units{mask.channel, down(mask.x_start), empty ? down(mask.x_end) : up(mask.x_end),
+                           down(mask.y_start), empty ? down(mask.y_end) : up(mask.y_end)};
+  board_.write_video_input(driver::kRegPrivacyMask + 4 * mask.channel, driver::packed_mask(units));
   return 0;
 }
 

@@ -63,7 +63,9 @@ bool set_speed(Options &options, std::string_view value) {
 }
 
 bool set_board(Options &options, std::string_view value) {
-  constexpr std::pair<std::string_view, u32> kBoards[] = {{"bb", 0xBB}, {"cc", 0xCC}, {"dd", 0xDD}};
+  constexpr std::pair<std::string_view, u32> kBoards[] = {{"bb", driver::kBoardVersionReplies[0]},
+                                                          {"cc", driver::kBoardVersionReplies[1]},
+                                                          {"dd", driver::kBoardVersionReplies[2]}};
   for (const auto &[name, version] : kBoards) {
     if (name != value) continue;
     options.board_version = version;

@@ -21,7 +21,7 @@ struct Options {
   std::map<unsigned, std::string> films;  ///< file in front of a camera
   bool nowait = false;                    ///< reads of an empty stream return at once
   bool absent = false;                    ///< there is no card
-  u32 board_version = 0xBB;
+  u32 board_version = driver::kBoardVersionReplies[0];
   std::string log_file;
   /// Card time in which opens and reads fail as if the card had been pulled out; empty: never.
   nanoseconds vanish_from{0};

@@ -17,7 +17,7 @@ ReadyFrame mpeg4_frame(unsigned channel, unsigned type, const std::vector<std::u
   const auto length = static_cast<u32>(bitstream.size());
   ReadyFrame frame;
   frame.area.resize(driver::kMpeg4DescriptorSize);
-  put_word(frame.area, 0, (length & 0xFFFFF) | (type & 3) << 22 | (channel & 0xF) << 24);
+  put_word(frame.area, 0, driver::packed_head({channel, type, length}));
   put_word(frame.area, driver::kMpeg4TimeSeconds, static_cast<u32>(time.count() / kSecond));
   put_word(frame.area, driver::kMpeg4TimeMicroseconds, static_cast<u32>(time.count() % kSecond));
   frame.area.insert(frame.area.end(), bitstream.begin(), bitstream.end());

@@ -37,10 +37,7 @@ struct VideoState {
   std::uint64_t next_poll = 0;  ///< capture time of the next look at motion and video loss
 };
 
-struct Mpeg4Frame {
-  u32 channel;
-  u32 type;  ///< 0 intra
-  u32 length;
+struct Mpeg4Frame : driver::Mpeg4Head {
   std::uint64_t time;  ///< microseconds
 };
 
@@ -53,12 +50,9 @@ u32 word_at(const u8 *bytes) {
 /// The one place where an MPEG-4 descriptor is believed. False when the frame would reach beyond
 /// the MPEG-4 area.
 bool parse_mpeg4(const u8 *area, Mpeg4Frame &frame) {
-  const u32 head = word_at(area);
-  frame.length = head & 0xFFFFF;
-  frame.type = head >> 22 & 3;
-  frame.channel = head >> 24 & 0xF;
-  frame.time = std::uint64_t{word_at(area + driver::kMpeg4TimeSeconds)} * 1000000 +
-               word_at(area + driver::kMpeg4TimeMicroseconds);
+  frame = {driver::unpacked_head(word_at(area)),
+           std::uint64_t{word_at(area + driver::kMpeg4TimeSeconds)} * 1000000 +
+               word_at(area + driver::kMpeg4TimeMicroseconds)};
   return frame.length <= driver::kMpeg4AreaSize - driver::kMpeg4DescriptorSize;
 }
 

@@ -12,11 +12,7 @@
 
 namespace zarvo {
 
-namespace {
-
-constexpr u32 kNeverMoves = 0xFFFF;
-
-}  // namespace
+namespace {}  // namespace
 
 void write_motion_control(const ZV_CARD &card) {
   write_codec(card, driver::kRegMotionControl, driver::kMotionControlAll);
@@ -46,7 +42,7 @@ int get_sensitivity(ZV_CARD &card, u32 channel, u32 *sensitivity) {
 
 int set_sensitivity(ZV_CARD &card, u32 channel, u32 sensitivity) {
   if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;
-  if (sensitivity > kNeverMoves) return ZV_ERR_PARAM;
+  if (sensitivity > driver::kNeverMoves) return ZV_ERR_PARAM;
   card.motion_sensitivity[channel] = sensitivity;
   const driver::MotionMap whole{channel, 0, 0, driver::kMotionMapSide, driver::kMotionMapSide, nullptr};
   const int status = send_thresholds(card, whole, sensitivity);
@@ -70,7 +66,7 @@ int mark_area(ZV_CARD &card, u32 channel, const ZV_RECT *rect, u32 mark) {
                                blocks_of(rect->y_end - rect->y_start),
                                nullptr};
   if (area.columns == 0 || area.rows == 0) return ZV_OK;
-  return send_thresholds(card, area, mark != 0 ? kNeverMoves : card.motion_sensitivity[channel]);
+  return send_thresholds(card, area, mark != 0 ? driver::kNeverMoves : card.motion_sensitivity[channel]);
 }
 
 int start_detection(ZV_CARD &card) {

@@ -146,7 +146,7 @@ ZV_CARD *acquire_memory(const Descriptors &fds) {
 void set_defaults(ZV_CARD &card) {
   card.display.fd = card.disp_fd;
   driver::MotionLevels levels{};
-  if (issue(card.vin_fd, driver::VIN_IOC_GET_MOTION_LEVELS, levels) != 0) levels = {};
+  if (issue(card.vin_fd, driver::VIN_IOC_GET_MOTION_LEVELS, levels) < 0) levels = {};
   for (u32 n = 0; n < ZV_CHANNELS; ++n) {
     ZV_DISPLAY_WINDOW &window = card.display.window[n];
     window.index = n;
@@ -160,8 +160,7 @@ void set_defaults(ZV_CARD &card) {
 
 /// The registers a card needs before anything else; motion detection is off on all channels.
 void set_up_chips(const ZV_CARD &card) {
-  constexpr u8 kDecoderSetup[][2] = {{0x72, 0x00}, {0x73, 0x11}, {0x74, 0x11}};
-  for (const auto &[address, value] : kDecoderSetup) write_decoder(card, 0, address, value);
+  for (const auto &[address, value] : driver::kDecoderSetup) write_decoder(card, 0, address, value);
   disable_motion(card);
   write_motion_control(card);
 }

@@ -23,12 +23,12 @@ int set_shield(ZV_CARD &card, u32 channel, const ZV_RECT *rect) {
 int get_shield(ZV_CARD &card, u32 channel, ZV_RECT *rect) {
   if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;
   if (rect == nullptr) return ZV_ERR_PARAM;
-  const u32 packed = read_video_input(card, driver::kRegPrivacyMask + 4 * channel);
-  const auto edge = [packed](u32 shift) { return (packed >> shift & 0xFF) * 8; };
-  rect->x_start = edge(24);
-  rect->x_end = edge(16);
-  rect->y_start = edge(8);
-  rect->y_end = edge(0);
+  const driver::Mask mask =
+      driver::unpacked_mask(channel, read_video_input(card, driver::kRegPrivacyMask + 4 * channel));
+  rect->x_start = mask.x_start;
+  rect->x_end = mask.x_end;
+  rect->y_start = mask.y_start;
+  rect->y_end = mask.y_end;
   return ZV_OK;
 }
 

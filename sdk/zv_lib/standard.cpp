@@ -15,8 +15,7 @@
 namespace zarvo {
 
 PictureSize input_picture(const ZV_CARD &card) {
-  return {card.resolution == RESOLUTION_ZV_720 ? 720u : 704u,
-          card.standard == VIDEO_STANDARD_ZV_NTSC ? 480u : 576u};
+  return {input_width(card.resolution), card.standard == VIDEO_STANDARD_ZV_NTSC ? 480u : 576u};
 }
 
 bool fits_input(const ZV_CARD &card, const ZV_RECT &rect) {

@@ -2,6 +2,9 @@
  * @file status.cpp
  * What the inputs and the board report.
  */
+#include <algorithm>
+#include <iterator>
+
 #include "command.h"
 #include "internal.h"
 #include "zv_card.h"
@@ -17,18 +20,14 @@ u32 audio_loss(ZV_CARD &card) {
   return ~(u32{read_decoder(card, 0, driver::kDecoderStatus)} >> 4) & kAllAudio;
 }
 
-constexpr u32 kUnknownVersion = 3;
+constexpr u32 kUnknownVersion = std::size(driver::kBoardVersionReplies);
 
 u32 hardware_version(ZV_CARD &card) {
-  struct Version {
-    u32 reply;
-    u32 version;
-  };
-  constexpr Version kVersions[] = {{0x00, 0}, {0xBB, 0}, {0xCC, 1}, {0xDD, 2}};
   const u32 reply = board_command(card, driver::kBoardVersion, 0xFF);
-  for (const Version &entry : kVersions)
-    if (entry.reply == reply) return entry.version;
-  return kUnknownVersion;
+  if (reply == 0) return 0;
+  const auto known =
+      std::find(std::begin(driver::kBoardVersionReplies), std::end(driver::kBoardVersionReplies), reply);
+  return static_cast<u32>(known - std::begin(driver::kBoardVersionReplies));
 }
 
 }  // namespace

@@ -115,12 +115,12 @@ std::vector<Encoded> PictureBench::take_mpeg4() {
   std::vector<Encoded> frames;
   while (const auto ready = mpeg4.pop(std::chrono::microseconds{0})) {
     const std::vector<u8> &area = ready->area;
-    const u32 first = word(area, 0);
-    EXPECT_EQ(first & 0xFFFFF, area.size() - driver::kMpeg4DescriptorSize);
+    const auto head = driver::unpacked_head(word(area, 0));
+    EXPECT_EQ(head.length, area.size() - driver::kMpeg4DescriptorSize);
     const auto time = std::int64_t{word(area, driver::kMpeg4TimeSeconds)} * 1'000'000 +
                       word(area, driver::kMpeg4TimeMicroseconds);
     const std::vector<u8> bytes(area.begin() + driver::kMpeg4DescriptorSize, area.end());
-    frames.push_back({first >> 24 & 0xF, (first >> 22 & 3) == 0, 0, 0, time, bytes});
+    frames.push_back({head.channel, head.type == 0, 0, 0, time, bytes});
   }
   return frames;
 }
