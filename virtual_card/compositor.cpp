@@ -12,21 +12,38 @@ constexpr unsigned kOne = 256;  ///< a whole sample in the weights of blends
 
 }  // namespace
 
+namespace {
+
+std::uint64_t size_of(const ZV_DISPLAY_WINDOW &window) {
+  return std::uint64_t{window.x_end - window.x_start} * (window.y_end - window.y_start);
+}
+
+/// The order of drawing: marked windows lie on top of the others, small ones on large ones. (A small picture
+/// may have lost its mark and stay on the screen.)
+bool below(const ZV_DISPLAY_WINDOW *a, const ZV_DISPLAY_WINDOW *b) {
+  const auto mark = [](const ZV_DISPLAY_WINDOW *window) { return window->flags & ZV_WINDOW_PIP; };
+  return mark(a) != mark(b) ? mark(a) < mark(b) : size_of(*a) > size_of(*b);
+}
+
+}  // namespace
+
 std::vector<View> views(const CardState &state) {
-  std::vector<View> result;
   const DisplayState &display = state.display;
-  for (const u32 pip : {0u, ZV_WINDOW_PIP}) {
-    for (std::size_t i = 0; i < display.window.size(); ++i) {
-      const ZV_DISPLAY_WINDOW &window = display.window[i];
-      if (window.scale == 0 || (window.flags & ZV_WINDOW_PIP) != pip) continue;
-      const Area area =
-          clip({window.x_start, window.y_start, window.x_end, window.y_end}, state.width, state.lines());
-      if (area.empty()) continue;
-      // A window that is switched off is black, also where it covers another.
-      const bool on = (window.flags & ZV_WINDOW_ENABLED) != 0;
-      result.push_back({on ? display.routing[i] % kChannels : kChannels, area,
-                        (area.y_end - area.y_start) * 2 > state.lines()});
-    }
+  std::vector<const ZV_DISPLAY_WINDOW *> shown;
+  for (const ZV_DISPLAY_WINDOW &window : display.window)
+    if (window.scale != 0) shown.push_back(&window);
+  std::stable_sort(shown.begin(), shown.end(), below);
+
+  std::vector<View> result;
+  for (const ZV_DISPLAY_WINDOW *window : shown) {
+    const Area area =
+        clip({window->x_start, window->y_start, window->x_end, window->y_end}, state.width, state.lines());
+    if (area.empty()) continue;
+    // A window that is switched off is black, also where it covers another.
+    const bool on = (window->flags & ZV_WINDOW_ENABLED) != 0;
+    const auto number = static_cast<std::size_t>(window - display.window.data());
+    result.push_back({on ? display.routing[number] % kChannels : kChannels, area,
+                      (area.y_end - area.y_start) * 2 > state.lines()});
   }
   return result;
 }

@@ -13,9 +13,6 @@ namespace {
 constexpr std::int64_t kFramesPerLook = 3;
 /// 300 ms of NTSC fields: an object that moves steadily is reported without gaps.
 constexpr std::int64_t kHoldFields = 18;
-/// One block alone may be a glitch of the cable.
-constexpr u32 kLeastBlocks = 2;
-constexpr u16 kNeverFires = 0xFFFF;
 constexpr u32 kBlockLines = driver::kMotionBlock / 2;  ///< lines of a block in one field
 constexpr u32 kBlockSamples = driver::kMotionBlock * kBlockLines;
 constexpr u32 kMostColumns = driver::kMotionMapSide;
@@ -28,13 +25,9 @@ MotionDetector::MotionDetector() {
 
 void MotionDetector::set_thresholds(const driver::MotionMap &map) {
   const std::lock_guard lock(mutex_);
-  constexpr u32 side = driver::kMotionMapSide;
-  if (map.column >= side || map.row >= side) return;
-  const u32 columns = std::min(map.columns, side - map.column);
-  const u32 rows = std::min(map.rows, side - map.row);
-  for (u32 row = 0; row < rows; ++row) {
-    std::copy_n(map.thresholds + std::size_t{row} * map.columns, columns,
-                map_.begin() + (map.row + row) * side + map.column);
+  for (u32 row = 0; row < map.rows; ++row) {
+    std::copy_n(map.thresholds + std::size_t{row} * map.columns, map.columns,
+                map_.begin() + (map.row + row) * driver::kMotionMapSide + map.column);
   }
 }
 
@@ -60,7 +53,6 @@ void MotionDetector::look(const Picture &picture, std::int64_t field) {
   }
 
   const std::lock_guard lock(mutex_);
-  u32 fired = 0;
   for (u32 row = 0; row < blocks_.rows; ++row) {
     std::array<u32, kMostColumns> sums{};
     for (u32 line = row * kBlockLines; line < (row + 1) * kBlockLines; ++line) {
@@ -70,12 +62,11 @@ void MotionDetector::look(const Picture &picture, std::int64_t field) {
     }
     for (u32 column = 0; column < blocks_.columns; ++column) {
       const u16 threshold = map_[row * driver::kMotionMapSide + column];
-      if (threshold == kNeverFires || sums[column] <= threshold * kBlockSamples) continue;
+      if (threshold == driver::kNeverMoves || sums[column] <= threshold * kBlockSamples) continue;
       blocks_.moved[std::size_t{row} * blocks_.columns + column] = 1;
-      ++fired;
+      moving_until_ = field + kHoldFields;
     }
   }
-  if (fired >= kLeastBlocks) moving_until_ = field + kHoldFields;
 }
 
 void MotionDetector::forget() {

@@ -30,7 +30,7 @@ class MotionDetector {
  public:
   MotionDetector();
 
-  /// Writes a rectangle of thresholds; what lies outside the map is left out. Any thread.
+  /// Writes a rectangle of thresholds, which must lie inside the map. Any thread.
   void set_thresholds(const driver::MotionMap &map);
   /// Sets the whole map. Any thread.
   void set_threshold(u16 level);

@@ -46,7 +46,9 @@ TEST_F(Motion, LevelsAreasAndMasksDecideBlockByBlock) {
   EXPECT_FALSE(moves(5 * kLook));
   set_area(0, 0, 45, 4, 0);  // the bars: nothing ever moves there
   EXPECT_FALSE(moves(20 * kLook));
-  set_area(40, 28, 64, 64, 0);  // the end of the mark, and far over the map's edge
+  set_area(41, 28, 1, 1, 0);  // one block of the frame number's last figures
+  EXPECT_TRUE(moves(3 * kLook));
+  set_area(40, 28, 24, 36, 0);  // to the end of the map, beyond the picture
   EXPECT_TRUE(moves(3 * kLook));
   bench_.state.channel[kChannel].mask = {kChannel, 0, 720, 440, 480};
   EXPECT_FALSE(moves(5 * kLook));
