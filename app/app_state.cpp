@@ -45,11 +45,6 @@ int lenlen = 0;
 
 int g_res = 0;
 
-const char *const ntsc_fps_str[] = {"30", "27", "25",   "24", "22.5", "20",  "15", "10",   "7.5",
-                                    "6",  "5",  "3.75", "3",  "2",    "1.2", "1",  nullptr};
-const char *const pal_fps_str[] = {"25",   "22.5", "20.83", "20",   "18.75", "16.67", "12.5", "8.33",
-                                   "6.25", "5",    "4.17",  "3.13", "2.5",   "1.67",  "1",    nullptr};
-
 QStringList frame_rate_labels(ZV_VIDEO_STANDARD standard) {
   QStringList labels;
   for (auto label = standard == VIDEO_STANDARD_ZV_NTSC ? ntsc_fps_str : pal_fps_str; *label != nullptr;

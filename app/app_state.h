@@ -17,6 +17,7 @@
 #include <ctime>
 #include <mutex>
 
+#include "frame_rates.h"
 #include "global.h"
 #include "zv_type.h"
 
@@ -72,10 +73,13 @@ extern int lenlen;
 /// Status of the most recent SDK call of the dialog.
 extern int g_res;
 
-extern const char *const ntsc_fps_str[];
-extern const char *const pal_fps_str[];
-/// The labels of a standard's list, without its closing null.
+/// The labels of a standard's frame rates, without the closing null.
 QStringList frame_rate_labels(ZV_VIDEO_STANDARD standard);
+
+/// Pixels across the input picture, as the operator chose.
+inline int input_width() {
+  return zv_resolution == RESOLUTION_ZV_720 ? 720 : 704;
+}
 
 /// A word that two threads share.
 template <typename T>

@@ -3,15 +3,14 @@
 #include "launch.h"
 
 int main(int argc, char **argv) {
-  const int file = players::open_argument(argc, argv);
-  if (file < 0) return 1;
-  const std::string title = players::base_name(argv[1]);
+  if (players::open_argument(argc, argv, 0) < 0) return 1;
+  const std::string file = argv[1];
+  const std::string title = players::base_name(file);
   return players::hand_over(
-      file, argv[1],
       {{"ffplay",
         {"-hide_banner", "-loglevel", "error", "-autoexit", "-window_title", title, "-f", "g726",
-         "-code_size", "3", "-sample_rate", "8000", "-i", "pipe:0"}},
+         "-code_size", "3", "-sample_rate", "8000", "-i", "file:" + file}},
        {"mpv",
         {"--title=" + title, "--force-window", "--demuxer=lavf", "--demuxer-lavf-format=g726",
-         "--demuxer-lavf-o=code_size=3,sample_rate=8000", "-"}}});
+         "--demuxer-lavf-o=code_size=3,sample_rate=8000", "--", file}}});
 }

@@ -21,39 +21,32 @@ void run(const Command &command) {
 
 }  // namespace
 
-int open_argument(int argc, char **argv) {
+int open_argument(int argc, char **argv, off_t header) {
   if (argc != 2) {
     std::fprintf(stderr, "Usage: %s FILE\n", argc > 0 ? argv[0] : "player");
     return -1;
   }
-  const int file = open(argv[1], O_RDONLY);
-  if (file < 0) {
-    std::fprintf(stderr, "%s: %s\n", argv[1], std::strerror(errno));
-    return -1;
-  }
+  const int file = open(argv[1], O_RDONLY | O_NONBLOCK);
   struct stat info {};
-  if (fstat(file, &info) != 0 || S_ISDIR(info.st_mode)) {
-    std::fprintf(stderr, "%s: not a recording but a folder\n", argv[1]);
-    close(file);
-    return -1;
+  const char *reason = nullptr;
+  if (file < 0 || fstat(file, &info) != 0) {
+    reason = std::strerror(errno);
+  } else if (!S_ISREG(info.st_mode)) {
+    reason = "not a recording";
+  } else if (info.st_size <= header) {
+    reason = "nothing is recorded in this file";
   }
-  return file;
+  if (!reason) return file;
+  std::fprintf(stderr, "%s: %s\n", argv[1], reason);
+  if (file >= 0) close(file);
+  return -1;
 }
 
 std::string base_name(const std::string &path) {
   return path.substr(path.rfind('/') + 1);
 }
 
-int hand_over(int file, const char *path, const std::vector<Command> &commands) {
-  struct stat info {};
-  if (fstat(file, &info) == 0 && S_ISREG(info.st_mode) && lseek(file, 0, SEEK_CUR) >= info.st_size) {
-    std::fprintf(stderr, "%s: nothing is recorded in this file\n", path);
-    return 1;
-  }
-  if (dup2(file, STDIN_FILENO) < 0) {
-    std::perror("dup2");
-    return 1;
-  }
+int hand_over(const std::vector<Command> &commands) {
   // Whoever started this program may have left its own descriptors open, the card's among them.
   closefrom(STDERR_FILENO + 1);
   bool installed = false;
