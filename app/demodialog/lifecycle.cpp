@@ -130,9 +130,12 @@ void DemoDialog::ExitDialog() {
 }
 
 void DemoDialog::destroy() {
-  // The thread uses the card and must not outlive it, even when the dialog goes without ExitDialog().
+  // What uses the card must not outlive it, even when the dialog goes without ExitDialog().
+  timer.stop();
   stop_preview_thread();
   join_preview_thread();
   zv_Close(zv_handle);
+  CloseFile();
+  g_finish_preview = g_finish_record = 1;
   std::puts("destroy");
 }

@@ -71,8 +71,7 @@ void audio_call_back(unsigned int ch, unsigned char *data, int length, int) {
 }
 
 void DemoDialog::StartRecord() {
-  // A second start would truncate the files that the capture threads are writing. The timer tells: it
-  // also stops when a dialog is left while it records, and g_finish_record keeps its 0 then.
+  // A second start would truncate the files that the capture threads are writing.
   if (timer.isActive()) return;
   if (std::strlen(g_filepath) > kMaxRootBytes || !CheckDiskSpace(g_filepath)) {
     std::puts(kNoSpace);

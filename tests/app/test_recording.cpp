@@ -106,18 +106,21 @@ TEST_F(Recording, RefusedStartsLeaveTheDialogIdle) {
   for (const auto &path : files()) EXPECT_EQ(fs::file_size(path), kHeader);
 }
 
-// A second start must leave the running recording alone; a dialog that is left while it records must not keep
-// the next one from recording. When the card does not start, the files are closed before the line tells.
+// A second start must leave the running recording alone; a dialog that is left or destroyed while it records
+// must not keep the next one from recording. When the card does not start, the files are closed before the
+// line tells.
 TEST_F(Recording, TheNextDialogRecordsAndAFailedStartClosesItsFiles) {
   class Telling : public OpenDialog {
     void WriteEnableCh() override { zv_handle = nullptr; }
     void CloseFile() override { OpenDialog::CloseFile(), std::puts("closed"); }
   };
-  start(kCif, 1);
-  EXPECT_EQ(printed_by([&] { dialog->StartRecord(); }).find("Write"), std::string::npos);
-  dialog->ExitDialog();
-  dialog.reset();
-  dialog = std::make_unique<Telling>();
+  for (const bool left : {true, false}) {
+    EXPECT_NE(start(kCif, 1).find("Write"), std::string::npos);
+    EXPECT_EQ(printed_by([&] { dialog->StartRecord(); }).find("Write"), std::string::npos);
+    if (left) dialog->ExitDialog();
+    dialog.reset();
+    dialog.reset(left ? new OpenDialog : new Telling);
+  }
   const HANDLE card = zv_handle;
   EXPECT_EQ(start(kCif, 1), std::string(kHalfFree) + "closed\nERROR:zv_Start Error!\n");
   zv_handle = card;
