@@ -8,23 +8,10 @@
 #include "app_state.h"
 #include "demodialog.h"
 #include "panel_helpers.h"
+#include "qualities.h"
 #include "zv_lib.h"
 
 namespace {
-
-/// comboQualityMode: the picture size, and how many channels the card encodes at the full rate with one
-/// field and with two. "None" is the first item; D1 has no field mode.
-struct QualityRow {
-  ZV_SCALE_VALUE scale;
-  int channels[2];
-};
-
-const QualityRow kQualities[] = {
-    {SCALE_ZV_NO_ENCODE, {0, 0}},
-    {SCALE_ZV_CIF, {16, 8}},
-    {SCALE_ZV_HALF_D1, {8, 4}},
-    {SCALE_ZV_D1, {4, 4}},
-};
 
 constexpr u32 kDefaultQp = 4;
 constexpr u32 kDefaultGop = 30;
@@ -86,7 +73,7 @@ void switch_recording_off(DemoDialog &dialog) {
 }
 
 /// Takes the picture size, and with it the field mode and the channels that may be recorded.
-void choose_quality(DemoDialog &dialog, const QualityRow &quality) {
+void choose_quality(DemoDialog &dialog, const Quality &quality) {
   const bool d1 = quality.scale == SCALE_ZV_D1;
   if (d1) dialog.combowTwoField->setCurrentIndex(0);
   dialog.combowTwoField->setEnabled(!d1);
@@ -158,7 +145,7 @@ void DemoDialog::InitEncodeConfig() {
 
 void DemoDialog::UpdateEncodeInfo() {
   for (QLineEdit *result : {edtScale, edtFrameRate, edtQuallity, edtBitRate}) result->setText(QString());
-  const QualityRow quality = item_value(kQualities, comboQualityMode->currentIndex(), kQualities[0]);
+  const Quality quality = quality_of(comboQualityMode->currentIndex());
   if (quality.scale == SCALE_ZV_NO_ENCODE) {
     switch_recording_off(*this);
     return;

@@ -68,6 +68,6 @@ void DemoDialog::CheckFormat() {
 void DemoDialog::ChangeResolution() {
   const std::lock_guard lock(layout_mutex);
   zv_resolution = radio720->isChecked() ? RESOLUTION_ZV_720 : RESOLUTION_ZV_704;
-  g_width = zv_resolution == RESOLUTION_ZV_720 ? 720 : 704;
+  g_width = input_width();
   sdk_ok(zv_SetResolution(zv_handle, zv_resolution), "ERROR:zv_zv_SetResolution Error!");
 }

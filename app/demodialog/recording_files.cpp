@@ -9,6 +9,7 @@
 
 #include "app_state.h"
 #include "demodialog.h"
+#include "qualities.h"
 #include "record_file_header.h"
 
 namespace {
@@ -58,14 +59,12 @@ void close_entry(FILE *&entry) {
   entry = nullptr;
 }
 
-/// Size of the picture that a quality records; "None" keeps the size recorded last.
-void update_record_size(int quality) {
-  enum { kCif = 1, kHalfD1 = 2, kD1 = 3 };
-  if (quality < kCif || quality > kD1) return;
+/// Size of the picture that is recorded; "None" keeps the size recorded last.
+void update_record_size(ZV_SCALE_VALUE scale) {
+  if (scale == SCALE_ZV_NO_ENCODE) return;
   const int lines = zv_format == VIDEO_STANDARD_ZV_NTSC ? 480 : 576;
-  const int pixels = zv_resolution == RESOLUTION_ZV_720 ? 720 : 704;
-  g_record_width = quality == kCif ? 352 : pixels;
-  g_record_height = quality == kD1 ? lines : lines / 2;
+  g_record_width = scale == SCALE_ZV_CIF ? 352 : input_width();
+  g_record_height = scale == SCALE_ZV_D1 ? lines : lines / 2;
 }
 
 }  // namespace
@@ -119,7 +118,7 @@ void DemoDialog::WriteHeader(FILE *fp, int ch) {
   header.frame_rate = static_cast<std::int32_t>(comboFrameRate->currentText().toDouble());
   const char *const tag = zv_record_mode == VIDEO_CODEC_ZV_MJPEG ? kMjpegTag : kMpeg4Tag;
   std::memcpy(header.codec_tag, tag, sizeof header.codec_tag);
-  update_record_size(comboQualityMode->currentIndex());
+  update_record_size(quality_of(comboQualityMode->currentIndex()).scale);
   header.record_width = g_record_width;
   header.record_height = g_record_height;
   const std::string label = "Channel " + std::to_string(ch + 1);
