@@ -1,7 +1,6 @@
 /// Hands a recording to a player outside this program.
-#include <unistd.h>
-
 #include <QFileDialog>
+#include <QLineEdit>
 #include <cstdio>
 #include <cstdlib>
 #include <string>
@@ -10,17 +9,40 @@
 
 namespace {
 
+/// Qt takes a double quote in a typed name for the end of a name. Here what stands in the edit is the name
+/// when there is such a file.
+class RecordingChooser : public QFileDialog {
+ public:
+  using QFileDialog::QFileDialog;
+
+  /// The chosen file, symbolic links resolved; empty before one was chosen.
+  QString chosen() const {
+    const QString file = typed_.isEmpty() ? selectedFiles().value(0) : typed_;
+    const QString resolved = QFileInfo(file).canonicalFilePath();
+    return resolved.isEmpty() ? file : resolved;
+  }
+
+ protected:
+  void accept() override {
+    const auto *edit = findChild<QLineEdit *>(QStringLiteral("fileNameEdit"));
+    const QFileInfo file(directory(), edit ? edit->text() : QString());
+    if (!file.isFile()) return QFileDialog::accept();
+    typed_ = file.filePath();
+    QDialog::accept();
+  }
+
+ private:
+  QString typed_;
+};
+
 /// Lets the operator choose a recording in the working directory; empty when the choice is cancelled.
 QByteArray choose_recording(QWidget *parent) {
-  char folder[256];
-  if (!getcwd(folder, sizeof folder)) folder[0] = '\0';
-  QFileDialog chooser(parent, DemoDialog::tr("Choose a file to playback"), QFile::decodeName(folder),
-                      QStringLiteral("Video (*.rec);; Audio (*.aud)"));
+  RecordingChooser chooser(parent, DemoDialog::tr("Choose a file to playback"), QDir::currentPath(),
+                           QStringLiteral("Video (*.rec);; Audio (*.aud)"));
   chooser.setObjectName("Playback");
   chooser.setFileMode(QFileDialog::ExistingFile);
   chooser.setOption(QFileDialog::DontUseNativeDialog);
-  if (chooser.exec() != QDialog::Accepted) return {};
-  return QFile::encodeName(chooser.selectedFiles().value(0));
+  return chooser.exec() == QDialog::Accepted ? QFile::encodeName(chooser.chosen()) : QByteArray();
 }
 
 /// The path as one word of the shell, whatever characters it has: single quotes keep everything but a

@@ -1,3 +1,4 @@
+#include <sys/stat.h>
 #include <sys/wait.h>
 
 #include <QFileDialog>
@@ -56,29 +57,73 @@ TEST_F(Playback, TheChosenFileReachesItsPlayerAsOneArgument) {
   EXPECT_EQ(play(fs::current_path() / "a.rec"), "Playback error!\n");
 }
 
-// The players themselves, with a stand-in for ffplay that tells its arguments and its input.
-TEST_F(Playback, PlayersHandTheStreamOver) {
+// A name with a double quote cannot be chosen through Qt's own reading of what is typed, and a link hides by
+// its name what kind of recording it leads to.
+TEST_F(Playback, TypedNamesAndLinksLeadToTheFile) {
+  for (const char *player : {"Videoplayer", "Audioplayer"}) {
+    write_program(player, "printf '%s|%s' \"$0\" \"$1\" > played");
+  }
+  const std::string name = "a \"b\".rec";
+  std::ofstream(name) << "x";
+  fs::create_symlink(name, "link.aud");
+  QTimer give_up;  // a name that is refused leaves a message on the screen
+  give_up.callOnTimeout([] {
+    if (QWidget *const refusal = QApplication::activeModalWidget()) refusal->close();
+  });
+  give_up.start(2000);
+  for (const std::string &typed : {name, (fs::current_path() / name).string(), std::string("link.aud")}) {
+    QTimer::singleShot(0, dialog.get(), [&] {
+      QWidget *const chooser = QApplication::activeModalWidget();
+      chooser->findChild<QLineEdit *>("fileNameEdit")->setText(QString::fromStdString(typed));
+      static_cast<QDialog *>(chooser)->accept();
+    });
+    dialog->btnPlayback->click();
+    EXPECT_EQ(content_of("played"), "./Videoplayer|" + (fs::current_path() / name).string()) << typed;
+    fs::remove("played");
+  }
+}
+
+std::string record_header(const char *tag, unsigned char lines, unsigned char rate) {
+  const unsigned char lines_high = lines < 128 ? 1 : 0;  // 288 or 240
+  std::string header = std::string(tag) + "\x60\1";
+  header.resize(32);
+  header[8] = static_cast<char>(lines);
+  header[9] = static_cast<char>(lines_high);
+  header[12] = static_cast<char>(rate);
+  return header.replace(16, 10, "Channel 12");
+}
+constexpr unsigned char kNtsc = 240;
+constexpr unsigned char kPal = 288 - 256;
+
+// The players themselves, with a stand-in for ffplay that tells its arguments.
+TEST_F(Playback, PlayersHandTheFileOver) {
   fs::create_directory("bin");
-  write_program("bin/ffplay", "printf '%s ' \"$@\"; exec /bin/cat");
-  const std::string header("MPG4\x60\1\0\0\xF0\0\0\0\x16\0\0\0Channel 12\0\0\0\0\0\0", 32);
-  std::ofstream("it's.rec") << header << "stream";
-  std::ofstream("j.rec") << "MJPG" << header.substr(4) << "jpegs";
-  std::ofstream("bad.rec") << "RIFF" << header;
-  std::ofstream("short.rec") << header.substr(1);
-  std::ofstream("a.aud") << "blocks";
+  write_program("bin/ffplay", "printf '%s ' \"$@\"");
+  const auto write = [](const char *name, const std::string &content) { std::ofstream(name) << content; };
+  write("it's.rec", record_header("MPG4", kNtsc, 30) + "stream");
+  write("pal.rec", record_header("MJPG", kPal, 16) + "stream");    // 16.67, cut
+  write("whole.rec", record_header("MJPG", kPal, 20) + "stream");  // 20 and not 20.83
+  write("header.rec", record_header("MPG4", kNtsc, 30));
+  write("bad.rec", "RIFF" + record_header("MPG4", kNtsc, 30));
+  write("a.aud", "blocks");
+  ASSERT_EQ(mkfifo("pipe.rec", 0600), 0);
+  const std::string video = " -skip_initial_bytes 32 -framerate ";
   const struct {
-    const char *command, *output;
+    const char *command;
+    std::string output;
     int status;
-  } rows[] = {
-      {VIDEOPLAYER " \"it's.rec\"", " - it's.rec -vf setdar=4/3 -f m4v -framerate 22 -i pipe:0 stream", 0},
-      {VIDEOPLAYER " j.rec", "Channel 12 - j.rec -vf setdar=4/3 -f mjpeg -framerate 22 -i pipe:0 jpegs", 0},
-      {AUDIOPLAYER " a.aud", "-f g726 -code_size 3 -sample_rate 8000 -i pipe:0 blocks", 0},
-      {VIDEOPLAYER " bad.rec", "bad.rec: no recording header\n", 1},
-      {VIDEOPLAYER " short.rec", "short.rec: no recording header\n", 1},
-      {VIDEOPLAYER " missing.rec", "missing.rec: No such file or directory\n", 1},
-      {AUDIOPLAYER " bin", "bin: not a recording but a folder\n", 1},
-      {AUDIOPLAYER " a b", " FILE\n", 1},
-      {"PATH=/nowhere; " AUDIOPLAYER " a.aud", "Install ffplay (package ffmpeg) or mpv.\n", 1}};
+  } rows[] = {{VIDEOPLAYER " \"it's.rec\"", " -f m4v" + video + "30 -i file:it's.rec ", 0},
+              {VIDEOPLAYER " pal.rec",
+               "Channel 12 - pal.rec -vf setdar=4/3 -f mjpeg" + video + "16.67 -i file:pal.rec ", 0},
+              {VIDEOPLAYER " whole.rec", video + "20 -i file:whole.rec ", 0},
+              {AUDIOPLAYER " a.aud", "-f g726 -code_size 3 -sample_rate 8000 -i file:a.aud ", 0},
+              {VIDEOPLAYER " bad.rec", "bad.rec: no recording header\n", 1},
+              {VIDEOPLAYER " header.rec", "header.rec: nothing is recorded in this file\n", 1},
+              {VIDEOPLAYER " missing.rec", "missing.rec: No such file or directory\n", 1},
+              {VIDEOPLAYER " pipe.rec", "pipe.rec: not a recording\n", 1},
+              {AUDIOPLAYER " bin", "bin: not a recording\n", 1},
+              {AUDIOPLAYER " a b", " FILE\n", 1},
+              {"PATH=/nowhere; " AUDIOPLAYER " a.aud", "Install ffplay (package ffmpeg) or mpv.\n", 1}};
   for (const auto &row : rows) {
     const int status =
         std::system((std::string("{ PATH=$PWD/bin; ") + row.command + "; } > out 2>&1").c_str());
