@@ -91,13 +91,18 @@ void save_ppm(const u8 *picture, const std::filesystem::path &path) {
   std::printf("saved %s\n", path.c_str());
 }
 
-/// Saves the preview as it looks now. Pictures that the card composed before the last change are let pass:
-/// a fifth of a second is six of them.
+/// Saves the preview as it looks now. Pictures that the card may have composed before the last change are
+/// let pass. Each new one comes in another of the card's buffers.
 void save_preview(HANDLE card, const std::filesystem::path &path) {
-  std::this_thread::sleep_for(std::chrono::milliseconds(200));
+  constexpr int kLetPass = 6;
   u8 *picture = nullptr;
-  wait_for("preview picture",
-           [&] { return zv_GetPreviewScreen(card, &picture) == static_cast<int>(kWidth * kHeight * 2); });
+  int pictures = 0;
+  wait_for("preview picture", [&] {
+    const u8 *const before = picture;
+    if (zv_GetPreviewScreen(card, &picture) == static_cast<int>(kWidth * kHeight * 2))
+      pictures += picture != before;
+    return pictures > kLetPass;
+  });
   save_ppm(picture, path);
 }
 

@@ -7,9 +7,9 @@
  * zv_EnableAudioChannels(), zv_Start(), zv_Stop(); at the end zv_Close().
  *
  * One card is open per process. A function with an int result answers ZV_OK or one of the statuses
- * named with it; on an error nothing has changed unless its comment says so. Every function with a
- * status answers ZV_ERR_PARAM for a handle that is null, dead or not from zv_Open(), and for a null
- * pointer where it needs a record. Channel masks have bit n for channel n.
+ * named with it; on an error nothing has changed unless its comment says so. A function with a
+ * status answers ZV_ERR_PARAM for a handle that is null, dead or not from zv_Open(), unless its comment
+ * says otherwise, and for a null pointer where it needs a record. Channel masks have bit n for channel n.
  *
  * The "Context" of a function tells which thread may call it, in which state, and whether it blocks.
  * The words used there (control thread, closed, open, capturing, blocks) are explained in
