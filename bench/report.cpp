@@ -32,8 +32,8 @@ double median(std::vector<double> values) {
   return values.size() % 2 != 0 ? values[middle] : (values[middle - 1] + values[middle]) / 2;
 }
 
-void compare(const std::string &name, int rounds, double limit, const std::function<double()> &ours,
-             const std::function<double()> &theirs) {
+Costs compare(const std::string &name, int rounds, double limit, const std::function<double()> &ours,
+              const std::function<double()> &theirs) {
   std::vector<double> our_costs;
   std::vector<double> their_costs;
   std::vector<double> ratios;
@@ -45,9 +45,11 @@ void compare(const std::string &name, int rounds, double limit, const std::funct
     ratios.push_back(our_costs.back() / their_costs.back());
   }
   const auto [low, high] = std::minmax_element(ratios.begin(), ratios.end());
-  lines.push_back({name, median(ratios), limit, "x",
-                   format("%.0f ns against %.0f ns, ratios %.2f to %.2f", median(our_costs),
-                          median(their_costs), *low, *high)});
+  const Costs costs{median(our_costs), median(their_costs)};
+  lines.push_back(
+      {name, median(ratios), limit, "x",
+       format("%.0f ns against %.0f ns, ratios %.2f to %.2f", costs.ours, costs.theirs, *low, *high)});
+  return costs;
 }
 
 void figure(const std::string &name, double value, double limit, const std::string &unit) {

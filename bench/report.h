@@ -9,10 +9,16 @@
 
 namespace bench {
 
+/// Medians of what both sides of a comparison cost.
+struct Costs {
+  double ours;
+  double theirs;
+};
+
 /// Runs `ours` and `theirs` in turn, `rounds` times, and reports the ratio of their results pair by pair.
 /// Both return a cost, e.g. processor nanoseconds a frame. The first pair only warms up.
-void compare(const std::string &name, int rounds, double limit, const std::function<double()> &ours,
-             const std::function<double()> &theirs);
+Costs compare(const std::string &name, int rounds, double limit, const std::function<double()> &ours,
+              const std::function<double()> &theirs);
 
 /// Reports a figure that has to stay at or below a limit.
 void figure(const std::string &name, double value, double limit, const std::string &unit);

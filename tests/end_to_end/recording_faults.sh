@@ -45,6 +45,25 @@ rm -r "$FOLDER/vanishing"
 wait_line '^No enough disk space$' 3
 expect "recordings of a deleted root stay open" wait_until 10 files_closed
 
+# The root turns read-only under a running recording: nothing can be opened at the change of the hour, and
+# everything at the next one, when it can be written again.
+rm -r "$FOLDER"/disk/*
+use_root "$FOLDER/disk"
+click btnRecordStart
+wait_line kbps $(($(lines kbps) + 2))
+mount --bind "$FOLDER/disk" "$FOLDER/disk"
+mount -o remount,bind,ro "$FOLDER/disk"
+set_clock '2026-03-03 15:10:00'
+wait_line '^Hour changed$' 1
+wait_line '^WriteEnableCh' $(($(lines '^WriteEnableCh') + 1)) # started again after the pause
+expect "recordings are open on a root that turned read-only" files_closed
+umount "$FOLDER/disk"
+set_clock '2026-03-03 16:10:00'
+wait_line '^Hour changed$' 2
+wait_line kbps $(($(lines kbps) + 2))
+click btnRecordStop
+expect_equal "files of the two hours that could be written" 32 "$(find "$FOLDER/disk" -name '*.rec' -size +0 | wc -l)"
+
 # Nothing can be made on a read-only disk: no file, and no crash on the missing ones.
 rm -r "$FOLDER"/disk/*
 mount -o remount,ro "$FOLDER/disk"
