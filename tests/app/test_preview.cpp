@@ -218,4 +218,19 @@ TEST(OpenCardDeathTest, EndsTheProgramWhenTheCardCannotBeOpened) {
         testing::ExitedWithCode(1), printed);
 }
 
+TEST(NoThreadDeathTest, EndsTheProgramWhenThePreviewThreadCannotBeMade) {
+  testing::GTEST_FLAG(death_test_style) = "threadsafe";
+  EXPECT_EXIT(
+      {
+        dup2(STDERR_FILENO, STDOUT_FILENO);
+        DemoDialog dialog;
+        pthread_attr_t huge;
+        pthread_attr_init(&huge);
+        pthread_attr_setstacksize(&huge, std::size_t{1} << 46);  // no room for such a thread
+        pthread_setattr_default_np(&huge);
+        dialog.StartPreview();
+      },
+      testing::ExitedWithCode(1), "Create pthread error\n$");
+}
+
 }  // namespace
