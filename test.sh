@@ -50,7 +50,7 @@ smoke_demo() {
 run_tidy() {
   build release
   say "clang-tidy"
-  run-clang-tidy -quiet -p build/release '/(app|bench|examples|players|sdk|virtual_card)/.*\.cpp$'
+  run-clang-tidy -quiet -p build/release '^(?!.*(_autogen|/headers/)).*/(app|bench|examples|players|sdk|virtual_card)/.*\.cpp$'
 }
 
 mode=${1:-all}

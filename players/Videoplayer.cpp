@@ -35,7 +35,7 @@ std::string window_title(const RECORD_FILE_HEADER &header, const std::string &pa
 /// is cut to it, as 22 for 22.5. The picture's height tells the list.
 std::string frame_rate(const RECORD_FILE_HEADER &header) {
   const bool ntsc = header.record_height % 240 == 0;
-  const std::string whole = std::to_string(header.frame_rate);
+  std::string whole = std::to_string(header.frame_rate);
   std::string cut;
   for (const char *const *label = ntsc ? ntsc_fps_str : pal_fps_str; *label != nullptr; ++label) {
     if (*label == whole) return whole;

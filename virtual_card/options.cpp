@@ -120,7 +120,9 @@ std::string possible_names() {
 
 /// Empty, or what is wrong with the item.
 std::string apply(Options &options, std::string_view item) {
-  const auto [name, value] = split(item, '=');
+  const auto parts = split(item, '=');
+  const std::string_view name = parts.first;
+  const std::string_view value = parts.second;
   if (name.substr(0, kCamera.size()) == kCamera) {
     unsigned number = 0;
     if (!to_number(name.substr(kCamera.size()), number) || number < 1 || number > kChannels || value.empty())

@@ -36,7 +36,7 @@ auto call(Name name, Arguments... arguments) -> decltype(next<Function>(name)(ar
   Function *function = next<Function>(name);
   if (function == nullptr) {
     errno = ENOSYS;
-    return decltype(function(arguments...))(-1);  // also MAP_FAILED
+    return decltype(function(arguments...))(-1);  // also MAP_FAILED NOLINT(performance-no-int-to-ptr)
   }
   return function(arguments...);
 }

@@ -14,7 +14,7 @@ namespace {
 /// itself.
 long transfer(long call, void *here, std::uintptr_t there, std::size_t size) {
   iovec local{here, size};
-  iovec remote{reinterpret_cast<void *>(there), size};
+  iovec remote{reinterpret_cast<void *>(there), size};  // NOLINT(performance-no-int-to-ptr)
   const long done = ::syscall(call, ::getpid(), &local, 1ul, &remote, 1ul, 0ul);
   if (done == static_cast<long>(size)) return 0;
   // A sandbox may forbid the call even on the own process. Then only null can be told apart.

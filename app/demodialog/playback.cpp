@@ -28,7 +28,7 @@ class RecordingChooser : public QFileDialog {
     const QFileInfo file(directory(), edit ? edit->text() : QString());
     if (!file.isFile()) return QFileDialog::accept();
     typed_ = file.filePath();
-    QDialog::accept();
+    done(Accepted);
   }
 
  private:

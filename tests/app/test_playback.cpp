@@ -27,7 +27,7 @@ class Playback : public RecordingTest {
       chooser->selectFile(QString::fromStdString(path));
       static_cast<QDialog *>(chooser)->accept();
     });
-    const std::string lines = printed_by([&] { dialog->btnPlayback->click(); });
+    std::string lines = printed_by([&] { dialog->btnPlayback->click(); });
     EXPECT_TRUE(dialog->btnRecordStart->isEnabled());
     return lines;
   }

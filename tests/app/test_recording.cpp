@@ -178,9 +178,9 @@ TEST_F(Recording, AFullOrVanishedDiskStopsTheRecording) {
       fake_system::disk_free = 50;
       if (vanished) fs::remove_all("Data");
       if (new_hour) set_clock("2009-03-03 15:00:00");
-      const std::string refused = (vanished ? "" : "Disk free percentage\t= 5.00%\n") + std::string(kNoSpace);
-      EXPECT_EQ(printed_by([&] { dialog->TimerTick(); }),
-                refused + (new_hour ? "Hour changed\n" + refused : ""));
+      std::string refused = (vanished ? "" : "Disk free percentage\t= 5.00%\n") + std::string(kNoSpace);
+      if (new_hour) refused += "Hour changed\n" + refused;
+      EXPECT_EQ(printed_by([&] { dialog->TimerTick(); }), refused);
       EXPECT_EQ(g_finish_record, 1);
       EXPECT_FALSE(timer.isActive());
       fs::create_directory("Data");

@@ -4,7 +4,6 @@
 #include "sdk_test.h"
 #include "zv_video.h"
 
-namespace vc = virtual_card;
 using testing::ElementsAre;
 
 namespace {

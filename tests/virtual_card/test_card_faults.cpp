@@ -5,7 +5,6 @@
 namespace {
 
 using card::Device;
-using card::Fault;
 using card::Operation;
 
 using Faults = CardTest;
