@@ -1,6 +1,7 @@
 /// The folder tree, the names, the header and the opening and closing of the recording files.
 #include "recording_files.h"
 
+#include <fcntl.h>
 #include <sys/stat.h>
 
 #include <cstdio>
@@ -49,7 +50,10 @@ void make_day(const std::string &day_path, unsigned channels, char (&kept)[256])
 /// no day folder.
 FILE *open_recording(const char *day_path, unsigned index, const std::string &name) {
   if (*day_path == '\0') return nullptr;
-  FILE *const stream = std::fopen((channel_folder(day_path, index) + "/" + name).c_str(), "w");
+  // Without O_NONBLOCK a pipe in the file's place would hold the dialog until somebody reads it.
+  const int file = open((channel_folder(day_path, index) + "/" + name).c_str(),
+                        O_WRONLY | O_CREAT | O_TRUNC | O_NONBLOCK | O_CLOEXEC, 0666);
+  FILE *const stream = file < 0 ? nullptr : fdopen(file, "w");
   if (stream) std::setvbuf(stream, nullptr, _IONBF, 0);
   return stream;
 }

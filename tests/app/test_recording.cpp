@@ -1,3 +1,5 @@
+#include <sys/stat.h>
+
 #include "recording_fixture.h"
 
 namespace {
@@ -55,10 +57,12 @@ TEST_F(Recording, HeaderTellsWhatThePanelShows) {
   }
 }
 
-// Fault: a buffered stream would keep what a callback was given from the disk until the stop.
+// Faults: a buffered stream would keep what a callback was given from the disk until the stop; a pipe in a file's
+// place would hold the dialog.
 TEST_F(Recording, CallbacksWriteOnlyOpenFilesAndMeterTheMpeg4Rate) {
-  g_record_ch = 1;
+  g_record_ch = 3;
   dialog->CheckFolder(g_filepath);
+  ASSERT_EQ(mkfifo("Data/Video/20090303/CH02/20090303-14.rec", 0600), 0);
   dialog->OpenFile();
   unsigned char data[1290] = {};
   const auto deliver = [&](auto callback, unsigned channel) {
