@@ -248,6 +248,7 @@ double per_frame(std::uint64_t frames, Run run) {
 /// the capture threads is collected apart: where it is much, it says little about the program.
 class RecordedCost {
  public:
+  /// Processor nanoseconds a frame, the pauses included.
   double measure(std::uint64_t frames, bool mjpeg, bool paced) {
     std::vector<double> paused;
     const double cost = per_frame(frames, [&](std::uint64_t n) {

@@ -1,6 +1,6 @@
 // The least a Qt dialog costs at its start: an empty one, shown, and out. With an argument Qt loads the font
-// as well, as it must for the first text of any dialog. Beside it bench_start times
-// the demo program's dialog on the virtual card.
+// as well, as it must for the first text of any dialog. Beside it bench_start times the demo program's dialog
+// on the virtual card.
 #include <QApplication>
 #include <QDialog>
 #include <QFontMetrics>

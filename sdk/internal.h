@@ -16,6 +16,7 @@ struct PictureSize {
   u32 height;
 };
 PictureSize input_picture(const ZV_CARD &card);
+/// Pixels of a ZV_RESOLUTION; whatever is not 720 is 704.
 constexpr u32 input_width(u32 resolution) {
   return resolution == RESOLUTION_ZV_720 ? 720 : 704;
 }

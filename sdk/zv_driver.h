@@ -214,6 +214,7 @@ struct Mpeg4Head {
   u32 length;  ///< bytes of the bitstream
 };
 inline constexpr u32 kMpeg4LengthMask = 0xFFFFF;
+/// What does not fit its field is cut off.
 constexpr u32 packed_head(const Mpeg4Head &head) {
   return (head.length & kMpeg4LengthMask) | (head.type & 3) << 22 | (head.channel & 0xF) << 24;
 }
@@ -275,8 +276,8 @@ inline constexpr u32 kBoardWatchdogOff = 0x2D;
 inline constexpr u32 kBoardVersion = 0x3A;
 inline constexpr u32 kBoardWatchdogOnReply = 0xA3;
 inline constexpr u32 kBoardWatchdogOffReply = 0xA5;
-inline constexpr u32 kBoardVersionReplies[] = {0xBB, 0xCC,
-                                               0xDD};  ///< by hardware version; 0 is the first, too
+/// By hardware version; the reply 0 is version 0, too.
+inline constexpr u32 kBoardVersionReplies[] = {0xBB, 0xCC, 0xDD};
 
 }  // namespace zarvo::driver
 

@@ -10,10 +10,6 @@ namespace {
 
 constexpr unsigned kOne = 256;  ///< a whole sample in the weights of blends
 
-}  // namespace
-
-namespace {
-
 std::uint64_t size_of(const ZV_DISPLAY_WINDOW &window) {
   return std::uint64_t{window.x_end - window.x_start} * (window.y_end - window.y_start);
 }

@@ -120,9 +120,7 @@ std::string possible_names() {
 
 /// Empty, or what is wrong with the item.
 std::string apply(Options &options, std::string_view item) {
-  const auto parts = split(item, '=');
-  const std::string_view name = parts.first;
-  const std::string_view value = parts.second;
+  const auto [name, value] = split(item, '=');
   if (name.substr(0, kCamera.size()) == kCamera) {
     unsigned number = 0;
     if (!to_number(name.substr(kCamera.size()), number) || number < 1 || number > kChannels || value.empty())
@@ -131,7 +129,7 @@ std::string apply(Options &options, std::string_view item) {
     return {};
   }
   const auto *const row = std::find_if(std::begin(kOptions), std::end(kOptions),
-                                       [&](const OptionRow &entry) { return entry.name == name; });
+                                       [name = name](const OptionRow &entry) { return entry.name == name; });
   if (row == std::end(kOptions)) return "option " + quoted(name) + " is unknown; " + possible_names();
   if (row->set(options, value)) return {};
   return "option " + quoted(name) + ": value " + quoted(value) + " is wrong; possible is " + row->values;

@@ -1,5 +1,7 @@
 /// Hands a recording to a player outside this program.
+#include <QDir>
 #include <QFileDialog>
+#include <QFileInfo>
 #include <QLineEdit>
 #include <cstdio>
 #include <cstdlib>

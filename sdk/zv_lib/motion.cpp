@@ -12,8 +12,6 @@
 
 namespace zarvo {
 
-namespace {}  // namespace
-
 void write_motion_control(const ZV_CARD &card) {
   write_codec(card, driver::kRegMotionControl, driver::kMotionControlAll);
 }

@@ -4,6 +4,7 @@
 #include <QFileDialog>
 #include <QTimer>
 
+#include "record_file_header.h"
 #include "recording_fixture.h"
 
 namespace {
@@ -83,28 +84,22 @@ TEST_F(Playback, TypedNamesAndLinksLeadToTheFile) {
   }
 }
 
-std::string record_header(const char *tag, unsigned char lines, unsigned char rate) {
-  const unsigned char lines_high = lines < 128 ? 1 : 0;  // 288 or 240
-  std::string header = std::string(tag) + "\x60\1";
-  header.resize(32);
-  header[8] = static_cast<char>(lines);
-  header[9] = static_cast<char>(lines_high);
-  header[12] = static_cast<char>(rate);
-  return header.replace(16, 10, "Channel 12");
+std::string record_header(const char *tag, int lines, int rate) {
+  RECORD_FILE_HEADER header{{}, 352, lines, rate, "Channel 12"};
+  std::memcpy(header.codec_tag, tag, sizeof header.codec_tag);
+  return {reinterpret_cast<const char *>(&header), sizeof header};
 }
-constexpr unsigned char kNtsc = 240;
-constexpr unsigned char kPal = 288 - 256;
 
 // The players themselves, with a stand-in for ffplay that tells its arguments.
 TEST_F(Playback, PlayersHandTheFileOver) {
   fs::create_directory("bin");
   write_program("bin/ffplay", "printf '%s ' \"$@\"");
   const auto write = [](const char *name, const std::string &content) { std::ofstream(name) << content; };
-  write("it's.rec", record_header("MPG4", kNtsc, 30) + "stream");
-  write("pal.rec", record_header("MJPG", kPal, 16) + "stream");    // 16.67, cut
-  write("whole.rec", record_header("MJPG", kPal, 20) + "stream");  // 20 and not 20.83
-  write("header.rec", record_header("MPG4", kNtsc, 30));
-  write("bad.rec", "RIFF" + record_header("MPG4", kNtsc, 30));
+  write("it's.rec", record_header("MPG4", 240, 30) + "stream");
+  write("pal.rec", record_header("MJPG", 288, 16) + "stream");    // 16.67, cut
+  write("whole.rec", record_header("MJPG", 288, 20) + "stream");  // 20 and not 20.83
+  write("header.rec", record_header("MPG4", 240, 30));
+  write("bad.rec", "RIFF" + record_header("MPG4", 240, 30));
   write("a.aud", "blocks");
   ASSERT_EQ(mkfifo("pipe.rec", 0600), 0);
   const std::string video = " -skip_initial_bytes 32 -framerate ";
