@@ -123,7 +123,7 @@ long Card::power_on() {
 
 void Card::power_down_if_unused() {
   if (open_ == 0) {
-    runner_.stop();
+    runner_.rest();
     board_.last_close();
   }
   if (open_ == 0 && mapped_ == 0)

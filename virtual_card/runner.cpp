@@ -30,15 +30,16 @@ std::uint64_t pictures_between(const EncoderSettings &encoder, std::int64_t firs
 }  // namespace
 
 long Runner::start() {
-  stop();
   if (board_.clock.mode() == ClockMode::manual) return 0;
   {
     const std::lock_guard lock(run_mutex_);
     const nanoseconds now = board_.clock.now();
     field_ = std::max(field_, fields_.first_at(now));
     audio_block_ = std::max(audio_block_, audio_block_at(now));
+    state_ = State::running;
   }
-  stopping_ = false;
+  signal_.notify_all();
+  if (thread_.joinable()) return 0;
   try {
     thread_ = start_thread([this] { loop(); });
   } catch (const std::system_error &error) {
@@ -49,17 +50,22 @@ long Runner::start() {
   return 0;
 }
 
-void Runner::stop() {
-  if (thread_.joinable()) {
-    {
-      const std::lock_guard lock(stop_mutex_);
-      stopping_ = true;
-    }
-    stop_signal_.notify_all();
-    thread_.join();
-  }
+void Runner::rest() {
+  state_ = State::resting;
+  // The thread gives the mutex up when it has seen that.
   const std::lock_guard lock(run_mutex_);
   board_.engine.rest();
+}
+
+void Runner::stop() {
+  rest();
+  if (!thread_.joinable()) return;
+  {
+    const std::lock_guard lock(run_mutex_);
+    state_ = State::ending;
+  }
+  signal_.notify_all();
+  thread_.join();
 }
 
 void Runner::power_up() {
@@ -70,22 +76,20 @@ void Runner::power_up() {
 }
 
 void Runner::loop() {
-  std::unique_lock stop_lock(stop_mutex_);
-  while (!stopping_) {
-    stop_lock.unlock();
-    MonotonicTime wake;
-    {
-      const std::lock_guard lock(run_mutex_);
-      const nanoseconds now = board_.clock.now();
-      const Next first = next();
-      if (now - first.due > board_.clock.second())
-        skip_to(now);
-      else if (first.due <= now)
-        run(first);
-      wake = board_.clock.when(next().due);
+  std::unique_lock lock(run_mutex_);
+  while (state_ != State::ending) {
+    if (state_ == State::resting) {
+      signal_.wait(lock);
+      continue;
     }
-    stop_lock.lock();
-    while (!stopping_ && monotonic_now() < wake) stop_signal_.wait_until(stop_lock, wake);
+    const nanoseconds now = board_.clock.now();
+    const Next first = next();
+    if (now - first.due > board_.clock.second())
+      skip_to(now);
+    else if (first.due <= now)
+      run(first);
+    const MonotonicTime wake = board_.clock.when(next().due);
+    if (state_ == State::running && monotonic_now() < wake) signal_.wait_until(lock, wake);
   }
 }
 

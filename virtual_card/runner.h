@@ -6,6 +6,7 @@
 #ifndef VIRTUAL_CARD_RUNNER_H
 #define VIRTUAL_CARD_RUNNER_H
 
+#include <atomic>
 #include <condition_variable>
 #include <thread>
 
@@ -20,10 +21,13 @@ class Runner {
   Runner(const Runner &) = delete;
   Runner &operator=(const Runner &) = delete;
 
-  /// Begins the thread, unless the clock is manual. What was due while it did not run is not made up for.
+  /// Lets the card run, unless the clock is manual. What was due while it rested is not made up for.
   /// A negated error number when there is no thread to be had.
   long start();
-  /// Ends and joins it, and those of the engine. Calling it twice is harmless.
+  /// Nothing is made any more, and the engine's threads are joined. The card's own only waits from then
+  /// on: a host may open and close the card many times in a row.
+  void rest();
+  /// Rests, and joins that thread as well. Calling it twice is harmless.
   void stop();
   /// After a power-up of the clock: everything is due from card time 0 again.
   void power_up();
@@ -38,6 +42,7 @@ class Runner {
     std::int64_t count;  ///< frames that came due since `since`
     nanoseconds since;   ///< when encoding began
   };
+  enum class State { resting, running, ending };
   enum class Event { field, audio, video_supply, audio_supply };
   struct Next {
     Event event;
@@ -63,9 +68,8 @@ class Runner {
 
   Board &board_;
   std::thread thread_;
-  std::mutex stop_mutex_;  // guards stopping_
-  std::condition_variable stop_signal_;
-  bool stopping_ = false;
+  std::atomic<State> state_ = State::resting;  // set to running with the mutex only, and then signalled
+  std::condition_variable signal_;
 
   std::mutex run_mutex_;  // guards what follows: the thread and a manual advance() may not mix
   FieldTimes fields_;
