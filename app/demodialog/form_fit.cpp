@@ -5,6 +5,7 @@
 #include <QLabel>
 #include <QLineEdit>
 #include <QPushButton>
+#include <QRadioButton>
 #include <QStyleOptionGroupBox>
 #include <algorithm>
 #include <cmath>
@@ -38,8 +39,10 @@ struct Factors {
 // What the form says is kept with the widget the first time, before anything is stretched.
 template <typename Value>
 Value from_form(QWidget *widget, const char *name, Value now) {
-  if (!widget->property(name).isValid()) widget->setProperty(name, now);
-  return widget->property(name).value<Value>();
+  const QVariant kept = widget->property(name);
+  if (kept.isValid()) return kept.value<Value>();
+  widget->setProperty(name, now);
+  return now;
 }
 
 QRect place_in_form(QWidget *child) {
@@ -49,28 +52,40 @@ QSize size_in_form(QGroupBox *group) {
   return from_form(group, "form_size", group->minimumSize());
 }
 
+// Character by character: laying every text out would take a third of the dialog's own start, and what
+// kerning adds to that is a text that is a little narrower.
+QSize size_of_text(const QWidget *widget, const QString &text) {
+  const QFontMetricsF metrics(widget->font(), widget);
+  qreal width = 0;
+  for (const QChar character : text) width += metrics.horizontalAdvance(character);
+  return {static_cast<int>(std::ceil(width)), static_cast<int>(std::ceil(metrics.height()))};
+}
+
 QSize room_for_text(const QWidget *child) {
-  const QFontMetrics metrics = child->fontMetrics();
-  const auto padded = [&](int width) { return QSize(width + 2 * kPadding, metrics.height() + kPadding); };
+  const auto text = [&](const QString &shown) { return size_of_text(child, shown); };
+  constexpr QSize kAround(2 * kPadding, kPadding);
   if (const auto *combo = qobject_cast<const QComboBox *>(child)) {
-    int widest = 0;
-    for (int n = 0; n < combo->count(); ++n)
-      widest = std::max(widest, metrics.horizontalAdvance(combo->itemText(n)));
-    return padded(widest + kArrow);
+    QSize widest;
+    for (int n = 0; n < combo->count(); ++n) widest = widest.expandedTo(text(combo->itemText(n)));
+    return widest + kAround + QSize(kArrow, 0);
   }
-  if (const auto *button = qobject_cast<const QPushButton *>(child))
-    return padded(metrics.size(Qt::TextShowMnemonic, button->text()).width());
-  if (qobject_cast<const QLineEdit *>(child) != nullptr) return padded(metrics.horizontalAdvance("0000"));
-  if (qobject_cast<const QLabel *>(child) != nullptr ||
-      qobject_cast<const QAbstractButton *>(child) != nullptr)
-    return child->sizeHint();
+  if (const auto *button = qobject_cast<const QPushButton *>(child)) return text(button->text()) + kAround;
+  if (qobject_cast<const QLineEdit *>(child) != nullptr) return text(QStringLiteral("0000")) + kAround;
+  if (const auto *label = qobject_cast<const QLabel *>(child)) return text(label->text());
+  if (const auto *box = qobject_cast<const QAbstractButton *>(child)) {
+    QStyleOptionButton option;
+    option.initFrom(box);
+    const auto contents = qobject_cast<const QRadioButton *>(child) != nullptr ? QStyle::CT_RadioButton
+                                                                                : QStyle::CT_CheckBox;
+    return box->style()->sizeFromContents(contents, &option, text(box->text()), box);
+  }
   return {};
 }
 
 int title_bottom(const QGroupBox *group) {
   QStyleOptionGroupBox option;
   option.initFrom(group);
-  option.text = group->title();
+  option.text = QStringLiteral("T");  // of any title: only the height is asked for
   option.subControls = QStyle::SC_GroupBoxLabel;
   const QStyle *style = group->style();
   return style->subControlRect(QStyle::CC_GroupBox, &option, QStyle::SC_GroupBoxLabel, group).bottom();
