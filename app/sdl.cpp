@@ -10,6 +10,8 @@
 #include <cstring>
 #include <iterator>
 
+#include "sdl_on_demand.h"
+
 SDL_Surface *screen = nullptr;
 SDL_Overlay *overlay = nullptr;
 SDL_Rect video_rect;
@@ -19,6 +21,8 @@ namespace {
 
 constexpr int kBitsPerPixel = 24;
 constexpr std::size_t kBytesPerPixel = 2;  // of a UYVY picture
+
+bool loaded = false;  // SDL's functions may be called
 
 // Rows of the overlay may be padded; rows of a picture never are.
 void copy_into_overlay(const unsigned char *picture, std::size_t length) {
@@ -61,6 +65,12 @@ void set_overlay_environment() {
 
 int InitialSDL(int width, int height) {
   set_overlay_environment();
+  const char *missing = load_sdl();
+  loaded = missing == nullptr;
+  if (!loaded) {
+    std::printf("Initial SDL error: %s\n", missing);
+    return -1;
+  }
   if (init_without_signals() != 0) {
     std::printf("Initial SDL error: %s\n", SDL_GetError());
     return -1;
@@ -105,5 +115,5 @@ void CloseSDL() {
   if (overlay != nullptr) SDL_FreeYUVOverlay(overlay);
   overlay = nullptr;
   screen = nullptr;
-  SDL_Quit();
+  if (loaded) SDL_Quit();
 }

@@ -31,14 +31,17 @@ std::uint64_t pictures_between(const EncoderSettings &encoder, std::int64_t firs
 
 long Runner::start() {
   if (board_.clock.mode() == ClockMode::manual) return 0;
+  bool asleep = false;
   {
     const std::lock_guard lock(run_mutex_);
     const nanoseconds now = board_.clock.now();
     field_ = std::max(field_, fields_.first_at(now));
     audio_block_ = std::max(audio_block_, audio_block_at(now));
     state_ = State::running;
+    asleep = asleep_;
   }
-  signal_.notify_all();
+  // After a short rest it still waits for the field it waited for before, and need not be woken.
+  if (asleep) signal_.notify_all();
   if (thread_.joinable()) return 0;
   try {
     thread_ = start_thread([this] { loop(); });
@@ -73,13 +76,16 @@ void Runner::power_up() {
   fields_ = FieldTimes{};
   field_ = 0;
   audio_block_ = 0;
+  signal_.notify_all();  // what the thread waits for is due at another time now
 }
 
 void Runner::loop() {
   std::unique_lock lock(run_mutex_);
   while (state_ != State::ending) {
     if (state_ == State::resting) {
+      asleep_ = true;
       signal_.wait(lock);
+      asleep_ = false;
       continue;
     }
     const nanoseconds now = board_.clock.now();

@@ -68,10 +68,11 @@ class Runner {
 
   Board &board_;
   std::thread thread_;
-  std::atomic<State> state_ = State::resting;  // set to running with the mutex only, and then signalled
+  std::atomic<State> state_ = State::resting;  // set to running and ending with the mutex only
   std::condition_variable signal_;
 
   std::mutex run_mutex_;  // guards what follows: the thread and a manual advance() may not mix
+  bool asleep_ = false;  // the thread waits until it is signalled
   FieldTimes fields_;
   std::int64_t field_ = 0;        // next one
   std::int64_t audio_block_ = 0;  // next one

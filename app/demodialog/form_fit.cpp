@@ -55,7 +55,7 @@ QSize size_in_form(QGroupBox *group) {
 // Character by character: laying every text out would take a third of the dialog's own start, and what
 // kerning adds to that is a text that is a little narrower.
 QSize size_of_text(const QWidget *widget, const QString &text) {
-  const QFontMetricsF metrics(widget->font(), widget);
+  const QFontMetricsF metrics(widget->font());
   qreal width = 0;
   for (const QChar character : text) width += metrics.horizontalAdvance(character);
   return {static_cast<int>(std::ceil(width)), static_cast<int>(std::ceil(metrics.height()))};
