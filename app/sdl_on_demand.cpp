@@ -18,10 +18,10 @@ Function *next(Function *, const char *name) {
 }  // namespace
 
 // What sdl.cpp calls. Weak: a program that has functions of these names itself is linked with its own.
-#define FORWARD(result, name, parameters, arguments)    \
-  [[gnu::weak]] result name parameters {                \
+#define FORWARD(result, name, parameters, arguments)  \
+  [[gnu::weak]] result name parameters {              \
     static auto *const function = next(&name, #name); \
-    return function arguments;                          \
+    return function arguments;                        \
   }
 
 extern "C" {

@@ -3,7 +3,9 @@
 
 #include <QDialog>
 #include <cstdio>
+#include <optional>
 
+#include "form_fit.h"
 #include "global.h"
 #include "ui_demodialog.h"
 
@@ -88,6 +90,8 @@ class DemoDialog : public QDialog, public Ui::DemoDialog {
  private:
   void init();
   void destroy();
+
+  std::optional<FormFit> form_fit;
 };
 
 #endif

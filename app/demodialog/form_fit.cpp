@@ -36,22 +36,6 @@ struct Factors {
   }
 };
 
-// What the form says is kept with the widget the first time, before anything is stretched.
-template <typename Value>
-Value from_form(QWidget *widget, const char *name, Value now) {
-  const QVariant kept = widget->property(name);
-  if (kept.isValid()) return kept.value<Value>();
-  widget->setProperty(name, now);
-  return now;
-}
-
-QRect place_in_form(QWidget *child) {
-  return from_form(child, "form_place", child->geometry());
-}
-QSize size_in_form(QGroupBox *group) {
-  return from_form(group, "form_size", group->minimumSize());
-}
-
 // Character by character: laying every text out would take a third of the dialog's own start, and what
 // kerning adds to that is a text that is a little narrower.
 QSize size_of_text(const QWidget *widget, const QString &text) {
@@ -75,8 +59,8 @@ QSize room_for_text(const QWidget *child) {
   if (const auto *box = qobject_cast<const QAbstractButton *>(child)) {
     QStyleOptionButton option;
     option.initFrom(box);
-    const auto contents = qobject_cast<const QRadioButton *>(child) != nullptr ? QStyle::CT_RadioButton
-                                                                                : QStyle::CT_CheckBox;
+    const auto contents =
+        qobject_cast<const QRadioButton *>(child) != nullptr ? QStyle::CT_RadioButton : QStyle::CT_CheckBox;
     return box->style()->sizeFromContents(contents, &option, text(box->text()), box);
   }
   return {};
@@ -91,30 +75,27 @@ int title_bottom(const QGroupBox *group) {
   return style->subControlRect(QStyle::CC_GroupBox, &option, QStyle::SC_GroupBoxLabel, group).bottom();
 }
 
-QWidgetList children_of(const QGroupBox *group) {
-  return group->findChildren<QWidget *>(QString(), Qt::FindDirectChildrenOnly);
+}  // namespace
+
+FormFit::FormFit(const QWidget &dialog) {
+  for (QGroupBox *box : dialog.findChildren<QGroupBox *>(QString(), Qt::FindDirectChildrenOnly)) {
+    Group &group = groups_.emplace_back(Group{box, box->minimumSize(), {}});
+    for (QWidget *child : box->findChildren<QWidget *>(QString(), Qt::FindDirectChildrenOnly))
+      group.children.push_back({child, child->geometry()});
+  }
 }
 
-Factors factors_for(const QList<QGroupBox *> &groups) {
+void FormFit::fit() const {
   Factors factors;
-  for (const QGroupBox *group : groups) {
-    const QSize title(0, title_bottom(group));
-    for (QWidget *child : children_of(group)) {
-      const QRect place = place_in_form(child);
-      factors.make_room(room_for_text(child), place.size());
+  for (const Group &group : groups_) {
+    const QSize title(0, title_bottom(group.box));
+    for (const auto &[widget, place] : group.children) {
+      factors.make_room(room_for_text(widget), place.size());
       factors.make_room(title, {1, place.y()});
     }
   }
-  return factors;
-}
-
-}  // namespace
-
-void fit_form(QWidget &dialog) {
-  const auto groups = dialog.findChildren<QGroupBox *>(QString(), Qt::FindDirectChildrenOnly);
-  const Factors factors = factors_for(groups);
-  for (QGroupBox *group : groups) {
-    for (QWidget *child : children_of(group)) child->setGeometry(factors.stretched(place_in_form(child)));
-    group->setMinimumSize(factors.stretched(size_in_form(group)));
+  for (const Group &group : groups_) {
+    for (const auto &[widget, place] : group.children) widget->setGeometry(factors.stretched(place));
+    group.box->setMinimumSize(factors.stretched(group.size));
   }
 }

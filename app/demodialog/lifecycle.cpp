@@ -9,7 +9,6 @@
 
 #include "app_state.h"
 #include "demodialog.h"
-#include "form_fit.h"
 #include "preview_thread.h"
 #include "zv_lib.h"
 
@@ -50,6 +49,7 @@ DemoDialog::DemoDialog(QWidget *parent, const char *name, bool modal, unsigned i
     : QDialog(parent, Qt::WindowFlags(static_cast<int>(flags))) {
   setModal(modal);
   setupUi(this);
+  form_fit.emplace(*this);
   if (name != nullptr) setObjectName(QString::fromUtf8(name));  // an empty one, too
   languageChange();
   resize(kLeastSize.expandedTo(minimumSizeHint()));
@@ -68,13 +68,14 @@ void DemoDialog::languageChange() {
   for (const auto &[combo, index] : chosen) refill(combo);
   retranslateUi(this);
   for (const auto &[combo, index] : chosen) combo->setCurrentIndex(index);
-  fit_form(*this);
+  form_fit->fit();
 }
 
 void DemoDialog::changeEvent(QEvent *event) {
   QDialog::changeEvent(event);
   if (event->type() == QEvent::LanguageChange) languageChange();
-  if (event->type() == QEvent::FontChange || event->type() == QEvent::StyleChange) fit_form(*this);
+  const bool fonts = event->type() == QEvent::FontChange || event->type() == QEvent::StyleChange;
+  if (fonts && form_fit) form_fit->fit();
 }
 
 void DemoDialog::init() {
