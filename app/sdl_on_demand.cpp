@@ -18,11 +18,13 @@ Function *next(Function *, const char *name) {
 }  // namespace
 
 // What sdl.cpp calls. Weak: a program that has functions of these names itself is linked with its own.
+// NOLINTBEGIN(bugprone-macro-parentheses): a parameter list and its arguments come in theirs.
 #define FORWARD(result, name, parameters, arguments)  \
   [[gnu::weak]] result name parameters {              \
     static auto *const function = next(&name, #name); \
     return function arguments;                        \
   }
+// NOLINTEND(bugprone-macro-parentheses)
 
 extern "C" {
 FORWARD(int, SDL_Init, (Uint32 flags), (flags))

@@ -72,7 +72,7 @@ class Runner {
   std::condition_variable signal_;
 
   std::mutex run_mutex_;  // guards what follows: the thread and a manual advance() may not mix
-  bool asleep_ = false;  // the thread waits until it is signalled
+  bool asleep_ = false;   // the thread waits until it is signalled
   FieldTimes fields_;
   std::int64_t field_ = 0;        // next one
   std::int64_t audio_block_ = 0;  // next one

@@ -40,7 +40,8 @@ TEST_F(Manners, ThreadsTakeNoSignalsAndRestAfterTheLastClose) {
     for (const int signal : {SIGTERM, SIGINT, SIGALRM, SIGCHLD, SIGUSR1})
       EXPECT_TRUE(before.count(task) != 0 || blocks(task, signal)) << task << " takes signal " << signal;
   close_nodes();
-  EXPECT_TRUE(eventually([&] { return tasks().size() <= before.size() + 1; })) << "more than the card's clock";
+  EXPECT_TRUE(eventually([&] { return tasks().size() <= before.size() + 1; }))
+      << "more than the card's clock";
   const auto previews = card::counters().previews;
   open_nodes();
   EXPECT_EQ(send(display, driver::DISP_IOC_PREVIEW_ON), 0);
