@@ -70,7 +70,7 @@ class Card {
   Board board_;
   std::array<std::unique_ptr<DeviceNode>, 4> nodes_;
   Runner runner_{board_};
-  std::mutex power_mutex_;  // guards open_, mapped_ and the runner's start and stop
+  std::mutex power_mutex_;  // guards what follows and the runner's start, rest and stop
   int open_ = 0;
   int mapped_ = 0;
   bool off_ = false;

@@ -5,6 +5,7 @@
 #include <cstdio>
 #include <new>
 #include <system_error>
+#include <utility>
 
 #include "card_thread.h"
 #include "encoded_picture.h"
@@ -13,6 +14,7 @@ namespace virtual_card {
 namespace {
 
 constexpr nanoseconds kNever = nanoseconds::max();
+constexpr auto kLongRest = std::chrono::seconds{1};
 
 std::int64_t audio_block_at(nanoseconds time) {
   return (time + kAudioBlock - nanoseconds{1}) / kAudioBlock;
@@ -32,6 +34,7 @@ std::uint64_t pictures_between(const EncoderSettings &encoder, std::int64_t firs
 long Runner::start() {
   if (board_.clock.mode() == ClockMode::manual) return 0;
   bool asleep = false;
+  bool ended = false;
   {
     const std::lock_guard lock(run_mutex_);
     const nanoseconds now = board_.clock.now();
@@ -39,9 +42,11 @@ long Runner::start() {
     audio_block_ = std::max(audio_block_, audio_block_at(now));
     state_ = State::running;
     asleep = asleep_;
+    ended = std::exchange(ended_, false);
   }
   // After a short rest it still waits for the field it waited for before, and need not be woken.
   if (asleep) signal_.notify_all();
+  if (ended) thread_.join();
   if (thread_.joinable()) return 0;
   try {
     thread_ = start_thread([this] { loop(); });
@@ -69,6 +74,7 @@ void Runner::stop() {
   }
   signal_.notify_all();
   thread_.join();
+  ended_ = false;
 }
 
 void Runner::power_up() {
@@ -79,13 +85,20 @@ void Runner::power_up() {
   signal_.notify_all();  // what the thread waits for is due at another time now
 }
 
+bool Runner::wait_for_work(std::unique_lock<std::mutex> &lock) {
+  const MonotonicTime end = monotonic_now() + kLongRest;
+  asleep_ = true;
+  while (state_ == State::resting && monotonic_now() < end) signal_.wait_until(lock, end);
+  asleep_ = false;
+  ended_ = state_ == State::resting;
+  return !ended_;
+}
+
 void Runner::loop() {
   std::unique_lock lock(run_mutex_);
   while (state_ != State::ending) {
     if (state_ == State::resting) {
-      asleep_ = true;
-      signal_.wait(lock);
-      asleep_ = false;
+      if (!wait_for_work(lock)) return;
       continue;
     }
     const nanoseconds now = board_.clock.now();

@@ -24,8 +24,8 @@ class Runner {
   /// Lets the card run, unless the clock is manual. What was due while it rested is not made up for.
   /// A negated error number when there is no thread to be had.
   long start();
-  /// Nothing is made any more, and the engine's threads are joined. The card's own only waits from then
-  /// on: a host may open and close the card many times in a row.
+  /// Nothing is made any more, and the engine's threads are joined. The card's own ends by itself when the
+  /// rest lasts: a host may open and close the card many times in a row.
   void rest();
   /// Rests, and joins that thread as well. Calling it twice is harmless.
   void stop();
@@ -50,6 +50,8 @@ class Runner {
   };
 
   void loop();
+  /// Where the thread spends a rest. False when that lasts: it is to end.
+  bool wait_for_work(std::unique_lock<std::mutex> &lock);
   /// What is due first.
   Next next();
   /// What memory is short for is left out.
@@ -68,11 +70,12 @@ class Runner {
 
   Board &board_;
   std::thread thread_;
-  std::atomic<State> state_ = State::resting;  // set to running and ending with the mutex only
-  std::condition_variable signal_;
-
   std::mutex run_mutex_;  // guards what follows: the thread and a manual advance() may not mix
-  bool asleep_ = false;   // the thread waits until it is signalled
+  std::condition_variable signal_;
+  // Resting is set without the mutex, which the thread may be holding field after field.
+  std::atomic<State> state_ = State::resting;
+  bool asleep_ = false;  // the thread must be signalled to take up its work at once
+  bool ended_ = false;   // the thread has ended by itself
   FieldTimes fields_;
   std::int64_t field_ = 0;        // next one
   std::int64_t audio_block_ = 0;  // next one
