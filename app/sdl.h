@@ -14,7 +14,8 @@ void set_overlay_environment();
 /// reason printed, when there is no window or no overlay. CloseSDL() is due in either case.
 int InitialSDL(int width, int height);
 
-/// Shows one packed UYVY picture of `length` bytes; what is longer than the overlay is left out.
+/// Shows, in a window that InitialSDL() has opened, one packed UYVY picture of `length` bytes; what is longer
+/// than the overlay is left out.
 void UpDataYUVScreen(unsigned char *picture, int length);
 
 /// Writes the frame rate into the window's caption.

@@ -12,7 +12,9 @@ namespace {
 
 template <typename Function>
 Function *next(Function *, const char *name) {
-  return reinterpret_cast<Function *>(dlsym(RTLD_NEXT, name));
+  void *function = dlsym(RTLD_NEXT, name);
+  if (function == nullptr && load_sdl() == nullptr) function = dlsym(RTLD_NEXT, name);
+  return reinterpret_cast<Function *>(function);
 }
 
 }  // namespace
