@@ -39,8 +39,8 @@ extern int video_enable;
 extern int g_finish_preview;
 extern int g_width;
 extern int g_height;
-/// Held around each change of split, standard or resolution together with the SDK call that sends it,
-/// and by the preview thread while it compares the choice with the card.
+/// Held around each change of split, standard, resolution, focus and preview channels together with the
+/// SDK call that sends it, and by the preview thread around its own display calls.
 extern std::mutex layout_mutex;
 
 // Channel sets, bit n = channel n + 1.
@@ -76,9 +76,12 @@ extern int g_res;
 /// The labels of a standard's frame rates, without the closing null.
 QStringList frame_rate_labels(ZV_VIDEO_STANDARD standard);
 
-/// Pixels across the input picture, as the operator chose.
+/// Pixels across and lines of the input picture, as the operator chose.
 inline int input_width() {
   return zv_resolution == RESOLUTION_ZV_720 ? 720 : 704;
+}
+inline int input_lines() {
+  return zv_format == VIDEO_STANDARD_ZV_NTSC ? 480 : 576;
 }
 
 /// A word that two threads share.

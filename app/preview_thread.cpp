@@ -12,6 +12,9 @@ namespace {
 
 constexpr u32 kAllChannels = 0xFFFF;
 constexpr int kRealTimePriority = 80;
+constexpr u32 kNtscPeriod = 33;  // milliseconds a picture
+constexpr u32 kPalPeriod = 40;
+constexpr int kNtscLines = 480;
 constexpr useconds_t kPause = 1000;  // microseconds, short against a picture: a stop is noticed at once
 
 pthread_t thread;
@@ -104,7 +107,7 @@ void *videothread(void *) {
   const Size size = chosen_size();
   if (InitialSDL(size.width, size.height) == 0 && prepare_card()) {
     std::puts("Start video thread");
-    show_pictures(size.height == 480 ? 33 : 40);
+    show_pictures(size.height == kNtscLines ? kNtscPeriod : kPalPeriod);
     const std::lock_guard lock(layout_mutex);
     enable_channels(0);
   }

@@ -26,7 +26,9 @@ posix_spawn_file_actions_t silent() {
 
 double start_ns(const char *program, bool card = true) {
   static const posix_spawn_file_actions_t actions = silent();
-  card ? setenv("LD_PRELOAD", VIRTUAL_CARD, 1) : unsetenv("LD_PRELOAD");
+  // By its name alone, found by its folder: the list of libraries has no quoting for blanks.
+  setenv("LD_LIBRARY_PATH", VIRTUAL_CARD_FOLDER, 1);
+  card ? setenv("LD_PRELOAD", VIRTUAL_CARD_NAME, 1) : unsetenv("LD_PRELOAD");
   const auto before = std::chrono::steady_clock::now();
   char *const arguments[] = {const_cast<char *>(program), nullptr};
   pid_t child = 0;

@@ -44,7 +44,7 @@ void *get_audio_data_thread(void *card);
 void disable_motion(const ZV_CARD &card);
 void write_motion_control(const ZV_CARD &card);
 int stop_motion_detection(ZV_CARD &card);
-inline constexpr u32 kAllVideo = 0xFFFF;  ///< a bit for every channel
+inline constexpr u32 kAllChannels = 0xFFFF;  ///< a bit for every channel
 u32 video_loss(ZV_CARD &card);
 void *watchdog_thread(void *card);
 /// Clears the run flag of the watchdog thread, if it is still set, and joins the thread.

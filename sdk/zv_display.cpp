@@ -112,12 +112,11 @@ void lay_out(ZV_DISPLAY &display, u32 mode, u32 i, driver::Grid &grid) {
   grid.cells |= 1u << (row * kGridStride + column);
 }
 
-constexpr u32 kSourceGroups = 4;
-constexpr u32 kPlainSource[kSourceGroups] = {0x00000000, 0x10000000, 0x20000000, 0x30000000};
+constexpr u32 kPlainSource[driver::kSourceGroups] = {0x00000000, 0x10000000, 0x20000000, 0x30000000};
 /// Three columns of a picture as wide as the input.
-constexpr u32 kThirdSource[kSourceGroups] = {0x00001000, 0x10001002, 0x200012BA, 0x300012BC};
+constexpr u32 kThirdSource[driver::kSourceGroups] = {0x00001000, 0x10001002, 0x200012BA, 0x300012BC};
 
-void send_source(const ZV_DISPLAY &display, const u32 (&words)[kSourceGroups]) {
+void send_source(const ZV_DISPLAY &display, const u32 (&words)[driver::kSourceGroups]) {
   for (u32 word : words) issue(display.fd, driver::DISP_IOC_SET_SOURCE_CFG, word);
 }
 

@@ -134,6 +134,10 @@ struct FrameRect {
 inline constexpr u32 kScreenFrame = 0;
 inline constexpr u32 kPipFrame = 1;
 
+// Source words: the group in the bits from kSourceGroupShift on.
+inline constexpr u32 kSourceGroupShift = 28;
+inline constexpr u32 kSourceGroups = 4;
+
 /// A privacy mask; note both x edges before both y edges.
 struct Mask {
   u32 channel;
@@ -252,7 +256,10 @@ inline constexpr u32 kRegMotionControl = 0x268;   ///< written 0xFFFF
 inline constexpr u32 kRegDisplayState = 0x310;    ///< bit 31: the display is running
 inline constexpr u32 kRegMjpegQuality = 0x670;    ///< written through the encoder device
 inline constexpr u32 kRegWatchdogPeriod = 0xBE4;  ///< kWatchdogPeriod while fed, 0 off
-inline constexpr u32 kMotionEnableMask = 0xFFFF0000;
+inline constexpr u32 kMjpegCoarse = 0x02020202;   ///< kRegMjpegQuality
+inline constexpr u32 kMjpegFine = 0x02000102;
+inline constexpr u32 kMotionEnableShift = 16;
+inline constexpr u32 kMotionEnableMask = 0xFFFFu << kMotionEnableShift;
 inline constexpr u32 kMotionControlAll = 0xFFFF;
 inline constexpr u32 kDisplayStateBit = 0x80000000;
 inline constexpr u32 kWatchdogPeriod = 0x1FF;

@@ -61,7 +61,7 @@ long Board::set_standard(u32 standard) {
 
 void Board::write_codec(u32 address, u32 value) {
   settings.codec.write(address, value);
-  settings.state.motion_enable = settings.codec.read(driver::kRegMotionEnable) >> 16;
+  settings.state.motion_enable = settings.codec.read(driver::kRegMotionEnable) >> driver::kMotionEnableShift;
   settings.state.mjpeg_quality = settings.codec.read(driver::kRegMjpegQuality);
 }
 

@@ -6,6 +6,7 @@
 #define VIRTUAL_CARD_BOARD_H
 
 #include <atomic>
+#include <deque>
 #include <optional>
 
 #include "board_controller.h"

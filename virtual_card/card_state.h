@@ -59,15 +59,15 @@ struct DisplayState {
 
 struct CardState {
   u32 standard = VIDEO_STANDARD_ZV_NTSC;
-  u32 width = 720;
+  u32 width = kMaxWidth;
   bool encoding = false;  ///< between ENC_IOC_START and ENC_IOC_STOP
-  u32 mjpeg_quality = 0x02000102;
+  u32 mjpeg_quality = driver::kMjpegFine;
   u32 motion_enable = 0;  ///< bit n: detection on channel n
   u32 sound_present = 0xF;
   std::array<ChannelState, kChannels> channel{};
   DisplayState display;
 
-  u32 lines() const { return standard == VIDEO_STANDARD_ZV_NTSC ? 480 : 576; }
+  u32 lines() const { return standard == VIDEO_STANDARD_ZV_NTSC ? 480 : kMaxLines; }
 };
 
 }  // namespace virtual_card

@@ -3,6 +3,7 @@
 #include <sys/mman.h>
 
 #include <cerrno>
+#include <tuple>
 
 #include "user_memory.h"
 
@@ -100,9 +101,7 @@ long DisplayDevice::set_zoom(driver::Zoom &zoom) {
 
 /// The words tune the scaler's sampling of a three-column layout; the drawn pictures need none.
 long DisplayDevice::set_source(u32 &word) {
-  constexpr u32 kGroupShift = 28;
-  constexpr u32 kGroups = 4;
-  return word >> kGroupShift < kGroups ? 0 : -EINVAL;
+  return word >> driver::kSourceGroupShift < driver::kSourceGroups ? 0 : -EINVAL;
 }
 
 long DisplayDevice::set_grid(driver::Grid &grid) {

@@ -3,6 +3,8 @@
 #include <array>
 #include <cstring>
 
+#include "card_state.h"
+
 namespace virtual_card {
 
 namespace {
@@ -10,7 +12,6 @@ namespace {
 // Blocks from the left: two of the backdrop, white black white black, channel (4), frame number (24),
 // check (7), bottom field, two of the backdrop. The field stands outside the check, so that the two
 // fields of a frame differ in one block only and a full-height picture can be read as one.
-constexpr u32 kActiveWidth = 704;
 constexpr u32 kBlockWidth = 16;
 constexpr u32 kMargin = 2;
 constexpr u32 kSync = 4;
@@ -43,7 +44,7 @@ bool bit(std::uint64_t bits, u32 block) {
 }  // namespace
 
 Area frame_mark_area(u32 width, u32 lines) {
-  const u32 x = (width - kActiveWidth) / 2 + kMargin * kBlockWidth;
+  const u32 x = (width - kNarrowWidth) / 2 + kMargin * kBlockWidth;
   return {x, lines - kFromBottom, x + kBlocks * kBlockWidth, lines - kFromBottom + kHeight};
 }
 
@@ -62,9 +63,9 @@ void draw_frame_mark(Picture &picture, const FrameMark &mark, u8 black, u8 white
 std::optional<FrameMark> read_frame_mark(const u8 *luma, std::size_t stride, u32 width, u32 height) {
   const bool both_fields = height > 288;
   const u32 vertical = both_fields ? 1 : 2;
-  // The wide inputs carry 8 pixels more on each side than the scaled pictures.
-  const u32 margin = width == 720 ? 8 : 0;
-  const u32 block_width = (width - 2 * margin) * kBlockWidth / kActiveWidth;
+  // The wide inputs carry a few pixels more on each side than the scaled pictures.
+  const u32 margin = width == kMaxWidth ? (kMaxWidth - kNarrowWidth) / 2 : 0;
+  const u32 block_width = (width - 2 * margin) * kBlockWidth / kNarrowWidth;
   if (block_width < 4 || height < kFromBottom) return std::nullopt;
 
   const u32 top = height - kFromBottom / vertical;

@@ -13,7 +13,6 @@ namespace {
 
 /// The tables of the host's header are those of this quality.
 constexpr int kQuality = 25;
-constexpr u32 kCoarseWord = 0x02020202;
 /// Sum of horizontal and vertical frequency from which a coarse picture has nothing.
 constexpr int kCoarseFrequencies = 4;
 constexpr u32 kStripLines = 2 * DCTSIZE;
@@ -164,7 +163,7 @@ std::vector<u8> JpegEncoder::encode(const EncodedPicture &picture, bool fine) {
 }
 
 bool fine_quality(u32 quality_word) {
-  return quality_word != kCoarseWord;
+  return quality_word != driver::kMjpegCoarse;
 }
 
 }  // namespace virtual_card

@@ -21,10 +21,10 @@ class Stream {
   /// A paced supply's next frame has come due.
   void supply_due();
 
-  /// Hands the next frame over; its read result, or 0 when none came in the time. `supplied`: the
-  /// supply may answer.
+  /// Hands the next frame over; its read result, or 0 when none came in the time. A
+  /// supply answers only while `encoding`.
   template <typename Place>
-  long read(bool supplied, std::chrono::microseconds wait, Place place);
+  long read(bool encoding, std::chrono::microseconds wait, Place place);
 
   FrameQueue queue;
 
@@ -40,8 +40,8 @@ class Stream {
 };
 
 template <typename Place>
-long Stream::read(bool supplied, std::chrono::microseconds wait, Place place) {
-  if (supplied && unpaced_.load(std::memory_order_relaxed)) {
+long Stream::read(bool encoding, std::chrono::microseconds wait, Place place) {
+  if (encoding && unpaced_.load(std::memory_order_relaxed)) {
     const std::lock_guard lock(mutex_);
     if (const ReadyFrame *frame = next_supplied()) {
       place(frame->area);

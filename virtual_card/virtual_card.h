@@ -5,11 +5,13 @@
  *
  * All functions may be called from any thread. The card of this process is made at the first use of
  * a device node or of this interface, with the options of the environment variable ZARVO_VIRTUAL_CARD.
- * A channel or input that does not exist throws std::out_of_range.
+ * Channels count from 0 to 15, audio inputs and decoder chips from 0 to 3, one less than the numbers that
+ * people read, in the environment variable too. One that does not exist throws std::out_of_range.
  */
 #ifndef VIRTUAL_CARD_H
 #define VIRTUAL_CARD_H
 
+#include <cerrno>
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
@@ -59,12 +61,15 @@ enum class Scene {
   black    ///< a covered lens
 };
 
+/// The signal is lost: a blue picture, no motion, the decoder's video bit clear.
 void unplug_camera(unsigned channel);
 void plug_camera(unsigned channel);
+/// What is in front of a camera that has no film.
 void set_scene(unsigned channel, Scene scene);
-/// Puts a video file in front of the camera. False, with the reason in `error`, when it cannot be
-/// read as video.
+/// Puts a video file in front of the camera; an empty path takes it away. False, with the reason in `error`,
+/// when it cannot be read as video.
 bool show_film(unsigned channel, const std::string &path, std::string *error = nullptr);
+/// No sound arrives: the decoder's audio bit is clear.
 void silence_input(unsigned input);
 void sound_input(unsigned input);
 
@@ -112,6 +117,8 @@ void answer_reads_at_once(bool on);
 
 // --- Registers and replies ---------------------------------------------------------------------
 
+/// What the chips hold, as the driver's register commands would read and write it; what hangs on a register
+/// changes with it.
 std::uint32_t codec_register(std::uint32_t address);
 void set_codec_register(std::uint32_t address, std::uint32_t value);
 std::uint32_t video_input_register(std::uint32_t address);
@@ -126,7 +133,8 @@ void script_board_replies(std::uint32_t command, std::vector<std::uint32_t> repl
 void set_board_version(std::uint32_t reply);
 /// DISP_IOC_GET_MOTION answers these bits instead of what the card has detected, until reset.
 void script_motion(std::uint32_t bits);
-/// What VIN_IOC_GET_MOTION_LEVELS answers for a channel.
+/// What VIN_IOC_GET_MOTION_LEVELS answers for a channel, and its threshold until a map is set: 0 to 0xFFFF,
+/// which never moves.
 void set_motion_level(unsigned channel, std::uint16_t level);
 
 // --- Log ---------------------------------------------------------------------------------------
@@ -162,7 +170,7 @@ struct Fault {
   Operation operation;
   int countdown = 1;
   bool for_good = false;
-  int error = 5;  ///< errno, EIO
+  int error = EIO;
   Device device = Device::none;
   std::uint32_t code = 0;
 };

@@ -91,7 +91,7 @@ class DemoDialog : public QDialog, public Ui::DemoDialog {
   void init();
   void destroy();
 
-  std::optional<FormFit> form_fit;
+  std::optional<FormFit> form_fit;  // none until the widgets exist
 };
 
 #endif

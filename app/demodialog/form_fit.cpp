@@ -36,8 +36,8 @@ struct Factors {
   }
 };
 
-// Character by character: laying every text out would take a third of the dialog's own start, and what
-// kerning adds to that is a text that is a little narrower.
+// Character by character: laying every text out would take a third of the dialog's own start. Kerning,
+// which this leaves out, makes Latin texts narrower if anything.
 QSize size_of_text(const QWidget *widget, const QString &text) {
   const QFontMetricsF metrics(widget->font());
   qreal width = 0;

@@ -74,8 +74,8 @@ void DemoDialog::languageChange() {
 void DemoDialog::changeEvent(QEvent *event) {
   QDialog::changeEvent(event);
   if (event->type() == QEvent::LanguageChange) languageChange();
-  const bool fonts = event->type() == QEvent::FontChange || event->type() == QEvent::StyleChange;
-  if (fonts && form_fit) form_fit->fit();
+  const bool measures_changed = event->type() == QEvent::FontChange || event->type() == QEvent::StyleChange;
+  if (measures_changed && form_fit) form_fit->fit();
 }
 
 void DemoDialog::init() {

@@ -16,7 +16,7 @@ void show_split(ZV_VIDEO_MODE mode) {
 void show_standard(ZV_VIDEO_STANDARD standard) {
   const std::lock_guard lock(layout_mutex);
   zv_format = standard;
-  g_height = standard == VIDEO_STANDARD_ZV_NTSC ? 480 : 576;
+  g_height = input_lines();
   sdk_ok(zv_SetVideoStandard(zv_handle, zv_format), "ERROR:zv_SetVideoStandard Error!");
 }
 

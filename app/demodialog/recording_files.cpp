@@ -66,9 +66,8 @@ void close_entry(FILE *&entry) {
 /// Size of the picture that is recorded; "None" keeps the size recorded last.
 void update_record_size(ZV_SCALE_VALUE scale) {
   if (scale == SCALE_ZV_NO_ENCODE) return;
-  const int lines = zv_format == VIDEO_STANDARD_ZV_NTSC ? 480 : 576;
   g_record_width = scale == SCALE_ZV_CIF ? 352 : input_width();
-  g_record_height = scale == SCALE_ZV_D1 ? lines : lines / 2;
+  g_record_height = scale == SCALE_ZV_D1 ? input_lines() : input_lines() / 2;
 }
 
 }  // namespace

@@ -137,7 +137,7 @@ int mark_channels(ZV_CARD &card, u32 mask) {
 
 /// The card has one quality register: every Motion-JPEG channel writes it, the last one's word stays.
 void send_jpeg_quality(const ZV_CARD &card) {
-  constexpr u32 kQualityWords[] = {0x02020202, 0x02000102, 0x02000102};  // by ZV_JPEG_QUALITY
+  constexpr u32 kQualityWords[] = {driver::kMjpegCoarse, driver::kMjpegFine, driver::kMjpegFine};
   u32 word = kQualityWords[JPEG_QP_ZV_MEDIUM];
   for (const ZV_VIDEO_CONFIG &config : card.config) {
     if (word_of(config.mjpeg) == VIDEO_CODEC_ZV_MPEG4) continue;

@@ -77,7 +77,7 @@ int start_detection(ZV_CARD &card) {
 
 u32 motion_of(ZV_CARD &card) {
   const u32 motion = ask(card.disp_fd, driver::DISP_IOC_GET_MOTION, card.motion_status);
-  return card.motion_status = motion & ~video_loss(card) & kAllVideo;
+  return card.motion_status = motion & ~video_loss(card) & kAllChannels;
 }
 
 }  // namespace

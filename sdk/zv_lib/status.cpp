@@ -36,7 +36,7 @@ u32 video_loss(ZV_CARD &card) {
   u32 present = 0;
   for (u8 chip = 0; chip < driver::kDecoderChips; ++chip)
     present |= (read_decoder(card, chip, driver::kDecoderStatus) & 0xFu) << driver::kChannelsPerChip * chip;
-  return ~present & kAllVideo;
+  return ~present & kAllChannels;
 }
 
 }  // namespace zarvo
@@ -44,7 +44,7 @@ u32 video_loss(ZV_CARD &card) {
 using namespace zarvo;
 
 u32 zv_GetVideoStatus(HANDLE handle) {
-  return value_from(handle, kAllVideo, video_loss);
+  return value_from(handle, kAllChannels, video_loss);
 }
 
 u32 zv_GetAudioStatus(HANDLE handle) {

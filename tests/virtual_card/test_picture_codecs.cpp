@@ -66,8 +66,8 @@ TEST_P(EveryFormat, CoarseStreamsAreSmallerAndKeepTheMark) {
     EXPECT_EQ(decode_jpeg(jpeg.at(0)).mark(), (FrameMark{2, frame, false}));
     return std::pair(mpeg4[0].bytes.size(), jpeg[0].bytes.size());
   };
-  const auto fine = sizes(2, 0x02000102);
-  const auto coarse = sizes(31, 0x02020202);
+  const auto fine = sizes(2, driver::kMjpegFine);
+  const auto coarse = sizes(31, driver::kMjpegCoarse);
   EXPECT_LT(coarse.first * 2, fine.first);
   EXPECT_LT(coarse.second * 10, fine.second * 9);
 }
