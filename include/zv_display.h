@@ -100,7 +100,7 @@ int zv_display_motion_trace(ZV_DISPLAY *display, u32 on);
  * Magnifies a region of the picture.
  *
  * @param display  the display state
- * @param level    0 is off; the card says which levels it can do
+ * @param level    0 is off; what the others magnify, and which of them it refuses, is the card's affair
  * @param x        left edge of the region, pixels; kept between 0 and half the display
  * @param y        top edge of the region, lines; kept between 0 and half the display
  * @return the driver's result, 0 on success; -1 outside the 1-picture layout or with a

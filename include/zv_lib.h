@@ -480,7 +480,7 @@ int zv_DisableWatchDog(HANDLE handle);
  * Reads a codec-chip register and prints it.
  *
  * @param handle  the open card
- * @param reg     register address
+ * @param reg     register address, any u32; what the driver does not give reads as 0
  * @param value   receives the value
  * @return ZV_OK; ZV_ERR_PARAM
  *
@@ -492,7 +492,7 @@ int zv_GetTarnRegisterValue(HANDLE handle, u32 reg, u32 *value);
  * Writes a codec-chip register, reads it back and prints what it reads.
  *
  * @param handle  the open card
- * @param reg     register address
+ * @param reg     register address, any u32; what the driver does not give reads as 0
  * @param value   the value to write; not changed
  * @return ZV_OK; ZV_ERR_PARAM
  *
@@ -505,7 +505,7 @@ int zv_SetTarnRegisterValue(HANDLE handle, u32 reg, const u32 *value);
  *
  * @param handle  the open card
  * @param chip    decoder, 0-3; channels 4k to 4k + 3 are on chip k
- * @param reg     register number
+ * @param reg     register number, any u8; what the driver does not give reads as 0
  * @param value   receives the value
  * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_DEVICE for a chip above 3
  *
@@ -518,7 +518,7 @@ int zv_GetTW2815RegisterValue(HANDLE handle, u8 chip, u8 reg, u8 *value);
  *
  * @param handle  the open card
  * @param chip    decoder, 0-3
- * @param reg     register number
+ * @param reg     register number, any u8; what the driver does not give reads as 0
  * @param value   the value to write; not changed
  * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_DEVICE for a chip above 3
  *

@@ -41,8 +41,8 @@ typedef void *HANDLE;
  * @param flags    ZV_FLAG_MOTION and ZV_FLAG_VIDEO_LOSS of a video channel; 0 for audio
  *
  * Context: video callbacks run on the video data thread, the audio callback on the audio data
- * thread, both at once. A slow callback delays the frames behind it. It may call what its Context
- * allows on any thread; zv_Start(), zv_Stop() and zv_Close() belong to the control thread.
+ * thread, both at once. A slow callback delays the frames behind it. It may call functions whose
+ * Context says any thread; zv_Start(), zv_Stop() and zv_Close() belong to the control thread.
  */
 typedef void (*ZV_STREAM_CALLBACK)(u32 channel, u8 *data, i32 length, i32 flags);
 
@@ -108,8 +108,8 @@ typedef enum ZV_TWOFIELD_MODE { TWOFIELD_DISABLE = 0, TWOFIELD_ENABLE = 1 } ZV_T
 typedef enum ZV_JPEG_QUALITY {
   JPEG_QP_ZV_LOW = 0,
   JPEG_QP_ZV_MEDIUM = 1,
-  JPEG_QP_ZV_HIGH = 2,
-  JPEG_QP_ZV_UNSUPPORT = 3
+  JPEG_QP_ZV_HIGH = 2,     /**< the same as medium */
+  JPEG_QP_ZV_UNSUPPORT = 3 /**< no quality: leaves it to the other channels */
 } ZV_JPEG_QUALITY;
 
 /** Frame rate of a channel. Both standards share the numbers. */
