@@ -43,12 +43,12 @@ void copy_into_overlay(const unsigned char *picture, std::size_t length) {
 }
 
 // SDL turns the signals that end a program into events, and nobody reads its events here: Ctrl-C would
-// do nothing while the preview runs.
+// do nothing while the preview runs. It catches those of a crash as well, which would hide what crashed.
 int init_without_signals() {
-  constexpr int kSignals[] = {SIGINT, SIGTERM};
+  constexpr int kSignals[] = {SIGINT, SIGTERM, SIGQUIT, SIGALRM, SIGSEGV, SIGBUS, SIGFPE};
   struct sigaction before[std::size(kSignals)];
   for (std::size_t n = 0; n < std::size(kSignals); ++n) sigaction(kSignals[n], nullptr, &before[n]);
-  const int status = SDL_Init(SDL_INIT_VIDEO | SDL_INIT_NOPARACHUTE);
+  const int status = SDL_Init(SDL_INIT_VIDEO);
   for (std::size_t n = 0; n < std::size(kSignals); ++n) sigaction(kSignals[n], &before[n], nullptr);
   return status;
 }

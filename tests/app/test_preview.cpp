@@ -156,9 +156,11 @@ TEST_F(PreviewTest, GoesOnUntilItIsStopped) {
   for (const auto &[index, result] : {std::pair{7u, 100L}, {0u, 0L}, {1u, 0x240000L}})
     virtual_card::queue_preview(index, result);
   wait_for_pictures(5);
-  struct sigaction action;
-  sigaction(SIGINT, nullptr, &action);
-  EXPECT_EQ(action.sa_handler, SIG_DFL);
+  for (const int signal : {SIGINT, SIGTERM, SIGQUIT, SIGALRM}) {
+    struct sigaction action;
+    sigaction(signal, nullptr, &action);
+    EXPECT_EQ(action.sa_handler, SIG_DFL) << signal;
+  }
 }
 
 TEST_F(PreviewTest, LeavingWaitsForTheThreadBeforeTheCardIsClosed) {
