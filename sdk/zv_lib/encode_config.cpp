@@ -137,6 +137,7 @@ int mark_channels(ZV_CARD &card, u32 mask) {
 
 /// The card has one quality register: every Motion-JPEG channel writes it, the last one's word stays.
 void send_jpeg_quality(const ZV_CARD &card) {
+  // By ZV_JPEG_QUALITY.
   constexpr u32 kQualityWords[] = {driver::kMjpegCoarse, driver::kMjpegFine, driver::kMjpegFine};
   u32 word = kQualityWords[JPEG_QP_ZV_MEDIUM];
   for (const ZV_VIDEO_CONFIG &config : card.config) {
