@@ -34,7 +34,7 @@ prepare() {
   build release zarvo_record zarvo_motion zarvo_demo zarvo_virtual_card Videoplayer Audioplayer widget_map
   use_card "$CARD"
   mkdir -p "$RESULTS"
-  if [ ${#ON_CARD[@]} -eq 1 ]; then say "Using the card of this machine"; else say "No card here: using the virtual card"; fi
+  if real_card; then say "Using the card of this machine"; else say "No card here: using the virtual card"; fi
 }
 
 # prepare_working_folder FOLDER: the program expects the players and a root for its recordings in it.

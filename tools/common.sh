@@ -44,6 +44,9 @@ build() {
     cmake --build --preset "$preset" -j "$(nproc)" ${targets[0]:+--target "${targets[@]}"})
 }
 
+# real_card: this machine has one.
+real_card() { [ -e /dev/zarvo_enc0 ]; }
+
 # use_card CARD-LIBRARY: fills the array ON_CARD with the command that puts a program on the card of this
 # machine, or else on the virtual card: "${ON_CARD[@]}" PROGRAM .... A program built with a sanitizer needs
 # the sanitizer's runtime in front of the card. ZARVO_PRELOAD names one more library, to stand behind it.
@@ -51,7 +54,7 @@ build() {
 use_card() {
   local runtime folder
   ON_CARD=(env)
-  [ ! -e /dev/zarvo_enc0 ] || return 0
+  ! real_card || return 0
   [ -f "$1" ] || die "the virtual card $1 is not built"
   folder=$(cd "$(dirname "$1")" && pwd)
   case $folder in *[:\;]*) die "the virtual card cannot be put in front of a program from a folder with ':' or ';' in its name: $folder" ;; esac

@@ -21,8 +21,8 @@ class Stream {
   /// A paced supply's next frame has come due.
   void supply_due();
 
-  /// Hands the next frame over; its read result, or 0 when none came in the time. A
-  /// supply answers only while `encoding`.
+  /// Hands the next frame over; its read result, or 0 when none came in the time. A supply
+  /// answers only while `encoding`.
   template <typename Place>
   long read(bool encoding, std::chrono::microseconds wait, Place place);
 

@@ -36,8 +36,8 @@ struct Factors {
   }
 };
 
-// Character by character: laying every text out would take a third of the dialog's own start. Kerning,
-// which this leaves out, makes Latin texts narrower if anything.
+// Character by character: laying every text out takes more than twice as long. Kerning, which this leaves
+// out, makes Latin texts narrower if anything.
 QSize size_of_text(const QWidget *widget, const QString &text) {
   const QFontMetricsF metrics(widget->font());
   qreal width = 0;

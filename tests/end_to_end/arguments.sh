@@ -47,7 +47,7 @@ for option in speed=fast lost=17 nonsense=1 camera3=/nowhere.mp4; do
 done
 
 # Without a card in front.
-if [ ! -e /dev/zarvo_enc0 ]; then
+if ! real_card; then
   ON_CARD=(env)
   refused 1 'zv_Open failed with status 1' --channels 1
 fi
