@@ -8,6 +8,7 @@
 
 #include <array>
 
+#include "video_standard.h"
 #include "virtual_card.h"
 #include "zv_driver.h"
 
@@ -19,7 +20,9 @@ inline constexpr unsigned kChannels = ZV_CHANNELS;
 inline constexpr unsigned kAudioInputs = ZV_AUDIO_CHANNELS;
 inline constexpr u32 kMaxWidth = 720;
 inline constexpr u32 kNarrowWidth = 704;
-inline constexpr u32 kMaxLines = 576;
+inline constexpr u32 kMaxLines = kPal.lines;
+/// Motion threshold of every block at power-up.
+inline constexpr u16 kDefaultMotionLevel = 12;
 
 struct EncoderSettings {
   u32 scale_code = 0;     ///< 0 off, 1 half D1, 2 CIF, 9 D1
@@ -37,6 +40,8 @@ struct PictureSettings {
   u8 saturation = 128;
   u8 contrast = 128;
   u8 brightness = 128;
+
+  bool operator==(const PictureSettings &) const = default;
 };
 
 struct ChannelState {
@@ -47,12 +52,17 @@ struct ChannelState {
   bool lost = false;
 };
 
-struct DisplayState {
+/// What DISP_IOC_BEGIN_UPDATE and END_UPDATE change at one stroke.
+struct Layout {
   std::array<ZV_DISPLAY_WINDOW, 16> window{};
-  std::array<u32, 16> routing{};  ///< channel shown at each window; this, not window.channel, decides
   driver::Zoom zoom{};
   std::array<driver::FrameRect, 2> frame{};
   driver::Grid grid{};
+};
+
+struct DisplayState {
+  Layout layout;
+  std::array<u32, 16> routing{};  ///< channel shown at each window; this, not window.channel, decides
   bool on = false;
   bool motion_trace = false;
 };
@@ -67,7 +77,7 @@ struct CardState {
   std::array<ChannelState, kChannels> channel{};
   DisplayState display;
 
-  u32 lines() const { return standard == VIDEO_STANDARD_ZV_NTSC ? 480 : kMaxLines; }
+  u32 lines() const { return video_standard(standard).lines; }
 };
 
 }  // namespace virtual_card

@@ -1,7 +1,7 @@
 #include <algorithm>
 
-#include "clock.h"
 #include "frame_queue.h"
+#include "host/monotonic_time.h"
 
 namespace virtual_card {
 

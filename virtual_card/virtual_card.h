@@ -113,7 +113,7 @@ void set_supply(Supply supply);
 void clear_supply();
 
 /// Reads of an empty stream return at once, as another driver's might, instead of waiting up to 10 ms.
-void answer_reads_at_once(bool on);
+void set_nowait(bool on);
 
 // --- Registers and replies ---------------------------------------------------------------------
 
@@ -142,7 +142,7 @@ void set_motion_level(unsigned channel, std::uint16_t level);
 enum class Device { encoder, display, audio, video_input, none };
 enum class Operation { open, close, ioctl, read, mmap, munmap };
 
-struct Command {
+struct Call {
   Operation operation;
   Device device;
   std::uint32_t code = 0;  ///< ioctl: command code
@@ -158,7 +158,7 @@ struct Command {
 /// Starts the log afresh, or ends it. It is off at first.
 void record_log(bool on);
 /// What was done to the device nodes since record_log(true), in order.
-std::vector<Command> log();
+std::vector<Call> log();
 
 // --- Faults ------------------------------------------------------------------------------------
 

@@ -16,7 +16,7 @@ constexpr std::uint32_t kSetMotionMap = 0x40187602;
 
 /// Of a motion map, whose pointer is of no interest: its five words, the number of thresholds, and
 /// their value if it is the same for all.
-Words words_of(const vc::Command &command) {
+Words words_of(const vc::Call &command) {
   const Bytes &bytes = command.argument;
   const bool map = command.code == kSetMotionMap;
   if (!map && bytes.size() % 4 != 0) return Words(bytes.begin(), bytes.end());
@@ -30,7 +30,7 @@ Words words_of(const vc::Command &command) {
   return words;
 }
 
-std::string describe(const vc::Command &command) {
+std::string describe(const vc::Call &command) {
   static const char *const kDevices[] = {"encoder", "display", "audio", "vin", "none"};
   static const char *const kOperations[] = {"open", "close", "ioctl", "read", "mmap", "munmap"};
   if (command.operation == vc::Operation::ioctl) return cmd(command.code, words_of(command));
@@ -72,7 +72,7 @@ std::string cmd(std::uint32_t code, const Words &words) {
 
 Lines issued() {
   Lines lines;
-  for (const vc::Command &command : vc::log())
+  for (const vc::Call &command : vc::log())
     if (command.operation == vc::Operation::ioctl && command.code != 0x650F && command.code != 0x6509)
       lines.push_back(describe(command));
   vc::record_log(true);
@@ -87,7 +87,7 @@ std::string sent() {
 
 Lines operations() {
   Lines lines;
-  for (const vc::Command &command : vc::log()) lines.push_back(describe(command));
+  for (const vc::Call &command : vc::log()) lines.push_back(describe(command));
   return lines;
 }
 

@@ -84,7 +84,7 @@ TEST_F(Capture, StartAndStopSendTheirCommandsOnce) {
   // Every pass: request, read, done, read; and no audio read without an enabled input.
   EXPECT_EQ(count(all, "0000650f"), count(all, "00006509"));
   EXPECT_EQ(count(all, "read audio"), 0u);
-  for (const vc::Command &command : log)
+  for (const vc::Call &command : log)
     EXPECT_TRUE(command.value == 0 || (command.code != 0x6510 && command.operation != vc::Operation::read));
 }
 

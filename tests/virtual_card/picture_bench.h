@@ -10,8 +10,8 @@
 #include <optional>
 #include <vector>
 
-#include "engine.h"
-#include "frame_mark.h"
+#include "picture/engine.h"
+#include "picture/frame_mark.h"
 
 namespace virtual_card {
 
@@ -65,7 +65,7 @@ class PictureBench {
   PictureBench() {
     state.encoding = true;
     for (unsigned i = 0; i < 16; ++i) {
-      state.display.window[i] = {i, i, 0, 0, 0, 0, 0, ZV_WINDOW_ENABLED};
+      state.display.layout.window[i] = {i, i, 0, 0, 0, 0, 0, ZV_WINDOW_ENABLED};
       state.display.routing[i] = i;
     }
   }
@@ -77,13 +77,11 @@ class PictureBench {
     encoder.gop = gop;
     encoder.qp = qp;
   }
-  double field_seconds() const {
-    return state.standard == VIDEO_STANDARD_ZV_NTSC ? 1001.0 / 60000.0 : 1.0 / 50.0;
-  }
   void fields(int count) {
     for (const std::int64_t end = next + count; next < end; ++next) {
-      const auto passed = static_cast<std::int64_t>(static_cast<double>(next) * field_seconds() * 1e6);
-      engine.field(state, {next, std::chrono::microseconds(1'700'000'000'000'000 + passed)});
+      const auto passed = std::chrono::duration_cast<std::chrono::microseconds>(
+          video_standard(state.standard).duration(next));
+      engine.field(state, {state.standard, next, std::chrono::microseconds(1'700'000'000'000'000) + passed});
     }
   }
   std::vector<Encoded> take_mpeg4();
@@ -98,8 +96,8 @@ class PictureBench {
   }
   Colour pixel(u32 x, u32 y) const { return pixel_of(screen, state.width, x, y); }
   void window(unsigned number, Area area, u32 flags = ZV_WINDOW_ENABLED) {
-    state.display.window[number] = {number,       number,     1,          area.x_start,
-                                    area.y_start, area.x_end, area.y_end, flags};
+    state.display.layout.window[number] = {number,       number,     1,          area.x_start,
+                                           area.y_start, area.x_end, area.y_end, flags};
   }
 
   FrameQueue mpeg4{kCapacity}, mjpeg{kCapacity}, audio{kCapacity};

@@ -1,33 +1,8 @@
-// Card time: fields that never drift, the three clocks, the watchdog.
+// Card time: the three clocks, and the watchdog.
 
 #include "card_fixture.h"
-#include "clock.h"
 
 namespace {
-
-using card::FieldTimes;
-
-TEST(FieldTimes, StayExactOverYears) {
-  FieldTimes times;
-  for (const std::int64_t round : {1, 90, 24 * 3600, 300000}) {
-    EXPECT_EQ(times.due(60000 * round), 1001s * round);
-    EXPECT_EQ(times.first_at(1001s * round), 60000 * round);
-  }
-  for (std::int64_t field = 0; field < 7; ++field) {
-    EXPECT_EQ(times.first_at(times.due(field)), field);
-    EXPECT_EQ(times.first_at(times.due(field) + 1ns), field + 1);
-  }
-}
-
-TEST(FieldTimes, AStandardChangeKeepsTheNextFieldsTime) {
-  FieldTimes times;
-  const auto due = times.due(31);
-  times.change_standard(VIDEO_STANDARD_ZV_PAL, 31);
-  EXPECT_EQ(times.due(31), due);
-  EXPECT_EQ(times.due(31 + 50), due + 1s);
-  times.change_standard(VIDEO_STANDARD_ZV_NTSC, 81);
-  EXPECT_EQ(times.due(81 + 60000), due + 1s + 1001s);
-}
 
 using ManualClock = CardTest;
 

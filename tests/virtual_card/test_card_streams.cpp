@@ -3,26 +3,12 @@
 #include <cstring>
 
 #include "card_fixture.h"
-#include "frame_queue.h"
 
 namespace {
 
 using card::ReadyFrame;
 using ::testing::Each;
 using ::testing::ElementsAre;
-
-TEST(FrameQueue, AFullQueueLosesTheNewFrameAndCountsIt) {
-  card::FrameQueue queue(100);
-  const auto frame = [](u8 mark, std::size_t size) { return ReadyFrame{std::vector<u8>(size, mark), mark}; };
-  EXPECT_TRUE(queue.push(frame(1, 60)));
-  EXPECT_FALSE(queue.push(frame(2, 41)));
-  EXPECT_TRUE(queue.push(frame(3, 40)));
-  EXPECT_FALSE(queue.push(frame(4, 1)));
-  for (const long result : {1, 3}) EXPECT_EQ(queue.pop(0us)->result, result);
-  EXPECT_FALSE(queue.pop(0us));
-  const auto [made, delivered, lost] = queue.counters();
-  EXPECT_THAT((std::array{made, delivered, lost}), ElementsAre(4u, 2u, 2u));
-}
 
 class Streams : public CardTest {
  protected:

@@ -2,7 +2,7 @@
 
 #include <numbers>
 
-#include "audio_encoder.h"
+#include "picture/audio_encoder.h"
 #include "picture_bench.h"
 
 namespace virtual_card {

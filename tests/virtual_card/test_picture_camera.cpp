@@ -3,7 +3,7 @@
 #include <cstdlib>
 #include <ctime>
 
-#include "camera.h"
+#include "picture/camera.h"
 #include "picture_bench.h"
 
 namespace virtual_card {
@@ -19,7 +19,7 @@ TEST(Cameras, PictureIsAFunctionOfTheMoment) {
   walked.adjust(state);
   jumped.adjust(state);
   const auto moment = [](std::int64_t field) {
-    return FieldMoment(0, field, std::chrono::microseconds(field * 16683));
+    return Field{0, field, std::chrono::microseconds(field * 16683)};
   };
   for (std::int64_t field = 0; field < 200; ++field) walked.draw(moment(field));
   jumped.draw(moment(198));
@@ -32,8 +32,8 @@ TEST(Cameras, ClockShowsLocalTimeOfTheFrame) {
   setenv("TZ", "XXX-5:30", 1);
   tzset();
   const std::chrono::microseconds time{(23 * 3600 + 59 * 60 + 58) * 1'000'000LL + 999'000};
-  EXPECT_EQ(FieldMoment(1, 0, time).clock(), "05:29:58.24");
-  EXPECT_EQ(FieldMoment(0, 1, time + std::chrono::microseconds(16683)).clock(), "05:29:58.29");
+  EXPECT_EQ(ClockText({1, 0, time}).view(), "05:29:58.24");
+  EXPECT_EQ(ClockText({0, 1, time + std::chrono::microseconds(16683)}).view(), "05:29:58.29");
 }
 
 struct Property {

@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "encoded_picture.h"
+#include "picture/encoded_picture.h"
 #include "picture_bench.h"
 
 namespace virtual_card {
@@ -167,7 +167,7 @@ TEST(Mpeg4, ConstantBitRateHoldsAtAnyFrameRate) {
     bench.fields(300);
     double bits = 0;
     for (const Encoded &frame : bench.take_mpeg4()) bits += 8.0 * static_cast<double>(frame.bytes.size());
-    return bits / (300 * bench.field_seconds());
+    return bits / (300 * video_standard(bench.state.standard).field_seconds());
   };
   EXPECT_NEAR(bits_a_second(1, 262144, 0), 262144, 262144 * 0.25);
   EXPECT_NEAR(bits_a_second(3, 262144, 0), 262144, 262144 * 0.25);

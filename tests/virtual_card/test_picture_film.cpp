@@ -3,7 +3,7 @@
 #include <filesystem>
 #include <fstream>
 
-#include "film.h"
+#include "picture/film.h"
 #include "picture_bench.h"
 
 namespace virtual_card {

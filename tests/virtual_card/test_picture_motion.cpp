@@ -1,6 +1,6 @@
 #include <gtest/gtest.h>
 
-#include "motion_detector.h"
+#include "picture/motion_detector.h"
 #include "picture_bench.h"
 
 namespace virtual_card {

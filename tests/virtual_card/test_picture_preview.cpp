@@ -1,6 +1,6 @@
 #include <gtest/gtest.h>
 
-#include "compositor.h"
+#include "picture/compositor.h"
 #include "picture_bench.h"
 
 namespace virtual_card {
@@ -81,8 +81,8 @@ INSTANTIATE_TEST_SUITE_P(Layouts, EveryLayout,
 TEST_F(Preview, OffLostAndUnusedPartsAreBlackAndBlue) {
   bench_.state.channel[1].lost = true;
   lay_out(4, false);
-  bench_.state.display.window[0].flags = 0;
-  bench_.state.display.window[5].scale = 0;
+  bench_.state.display.layout.window[0].flags = 0;
+  bench_.state.display.layout.window[5].scale = 0;
   bench_.fields(2);
   bench_.compose();
   EXPECT_TRUE(near(bench_.pixel(260, 60), kLostBlue, 0));
@@ -113,7 +113,7 @@ TEST_F(Preview, PictureInPictureLiesOnTopInItsFrame) {
   constexpr Area kPip{464, 304, 704, 464};
   bench_.window(0, kPip, ZV_WINDOW_ENABLED | ZV_WINDOW_PIP);  // earlier in the list, later on the screen
   bench_.window(7, {0, 0, 720, 480});
-  bench_.state.display.frame[1] = {
+  bench_.state.display.layout.frame[1] = {
       driver::kPipFrame, kPip.x_start, kPip.y_start, kPip.x_end, kPip.y_end, 1, 0};
   bench_.fields(4);
   bench_.compose();
@@ -121,8 +121,8 @@ TEST_F(Preview, PictureInPictureLiesOnTopInItsFrame) {
   const Colour edge = bench_.pixel(600, 304);
   EXPECT_TRUE(near(edge, bench_.pixel(464, 400), 0) && near(edge, bench_.pixel(703, 463), 0));
   EXPECT_FALSE(near(edge, bench_.pixel(600, 302), 20));
-  bench_.state.display.window[0].scale = 0;
-  bench_.state.display.frame[1].enable = 0;
+  bench_.state.display.layout.window[0].scale = 0;
+  bench_.state.display.layout.frame[1].enable = 0;
   bench_.compose();
   EXPECT_EQ(channel_in({0, 0, 720, 480}), 7u);
 }
@@ -135,7 +135,7 @@ TEST_F(Preview, ZoomMagnifiesTheQuarterAtItsOrigin) {
   const auto plain = bench_.screen;
   for (const driver::Zoom zoom : {driver::Zoom{1, 0, 0}, driver::Zoom{2, 360, 240}, driver::Zoom{1, 100, 60},
                                   driver::Zoom{1, 9999, 9999}}) {
-    bench_.state.display.zoom = zoom;
+    bench_.state.display.layout.zoom = zoom;
     bench_.compose();
     const u32 left = std::min(zoom.x, 360u), top = std::min(zoom.y, 240u);
     int wrong = 0;
@@ -151,7 +151,7 @@ TEST_F(Preview, ZoomMagnifiesTheQuarterAtItsOrigin) {
 TEST_F(Preview, GridFollowsItsMaskAndNothingLeavesTheScreen) {
   bench_.state.channel[0].scene = Scene::black;
   lay_out(3, true);
-  bench_.state.display.grid = {{0, 240, 480, 718, 0}, {0, 160, 320, 478, 0}, 0x744, 0};
+  bench_.state.display.layout.grid = {{0, 240, 480, 718, 0}, {0, 160, 320, 478, 0}, 0x744, 0};
   bench_.fields(2);
   bench_.compose();
   EXPECT_TRUE(near(bench_.pixel(240, 100), kBlack, 0)) << "under the large window";
@@ -159,9 +159,9 @@ TEST_F(Preview, GridFollowsItsMaskAndNothingLeavesTheScreen) {
   EXPECT_TRUE(near(line, bench_.pixel(480, 50), 0) && near(line, bench_.pixel(100, 320), 0));
 
   constexpr u32 kFar = 0xFFFFFFFF;
-  bench_.state.display.grid = {{0, 5000, kFar, 3, 1}, {7, kFar, 2, 900, kFar}, 0xFFFF, 0};
-  bench_.state.display.frame[1] = {1, 700, 400, kFar, kFar, 1, 0};
-  bench_.state.display.zoom = {1, kFar, kFar};
+  bench_.state.display.layout.grid = {{0, 5000, kFar, 3, 1}, {7, kFar, 2, 900, kFar}, 0xFFFF, 0};
+  bench_.state.display.layout.frame[1] = {1, 700, 400, kFar, kFar, 1, 0};
+  bench_.state.display.layout.zoom = {1, kFar, kFar};
   bench_.state.display.routing.fill(kFar);
   bench_.window(3, {kFar - 8, 0, kFar, 480});
   bench_.window(4, {699, 470, kFar, kFar});

@@ -1,0 +1,248 @@
+#include "card.h"
+
+#include <fcntl.h>
+#include <sys/mman.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <system_error>
+
+#include "device_audio.h"
+#include "device_display.h"
+#include "device_encoder.h"
+#include "device_video_input.h"
+#include "host/real_calls.h"
+
+namespace virtual_card {
+namespace {
+
+constinit std::atomic<Card *> current{nullptr};
+constinit std::mutex creation_mutex;         // guards the making of the card
+Card *left_to_parent = nullptr;              // after a fork; kept so that leak checkers find it
+constinit thread_local bool making = false;  // this thread is making the card
+
+/// A film among the options is opened with the host's calls, which may lead back here.
+class Making {
+ public:
+  Making() { making = true; }
+  ~Making() { making = false; }
+  Making(const Making &) = delete;
+  Making &operator=(const Making &) = delete;
+};
+
+/// Ends the card's threads before the host's libraries are torn down.
+struct AtExit {
+  ~AtExit() {
+    if (Card *card = current.load()) card->power_off();
+  }
+};
+
+}  // namespace
+
+Device device_of(const char *path) {
+  constexpr std::pair<const char *, Device> kNodes[] = {{driver::kEncoderNode, Device::encoder},
+                                                        {driver::kDisplayNode, Device::display},
+                                                        {driver::kAudioNode, Device::audio},
+                                                        {driver::kVideoInputNode, Device::video_input}};
+  for (const auto &[name, device] : kNodes)
+    if (std::strcmp(name, path) == 0) return device;
+  return Device::none;
+}
+
+Card &Card::instance() {
+  if (Card *card = current.load(std::memory_order_acquire)) return *card;
+  if (making) throw std::system_error(EBUSY, std::generic_category());
+  const std::lock_guard lock(creation_mutex);
+  if (Card *card = current.load(std::memory_order_acquire)) return *card;
+  const Making now;
+  static const AtExit at_exit;
+  Card *card = new Card;
+  current.store(card, std::memory_order_release);
+  return *card;
+}
+
+void Card::before_fork() {
+  creation_mutex.lock();
+}
+
+void Card::after_fork(bool child) {
+  if (child) left_to_parent = current.exchange(nullptr);
+  creation_mutex.unlock();
+}
+
+Card::Card() {
+  nodes_[0] = std::make_unique<EncoderDevice>(board_);
+  nodes_[1] = std::make_unique<DisplayDevice>(board_);
+  nodes_[2] = std::make_unique<AudioDevice>(board_);
+  nodes_[3] = std::make_unique<VideoInputDevice>(board_);
+  apply_options();
+}
+
+void Card::apply_options() {
+  const char *text = std::getenv("ZARVO_VIRTUAL_CARD");
+  Options &options = board_.options;
+  options = parse_options(text == nullptr ? "" : text);
+  CardState &state = board_.settings.state;
+  for (u32 n = 0; n < kChannels; ++n) {
+    state.channel[n].lost = (options.lost >> n & 1) != 0;
+    if ((options.still >> n & 1) != 0) state.channel[n].scene = Scene::still;
+    if ((options.black >> n & 1) != 0) state.channel[n].scene = Scene::black;
+  }
+  state.sound_present &= ~options.silent;
+  board_.settings.controller.set_version(options.board_version);
+  board_.nowait = options.nowait;
+  if (options.speed != 1.0) board_.clock.power_up(ClockMode::fast, options.speed);
+  std::string reason;
+  for (const auto &[channel, path] : options.films)
+    if (options.error.empty() && !board_.engine.show_film(channel, path, &reason))
+      options.error = "option \"camera" + std::to_string(channel + 1) + "\": " + reason;
+  if (!options.log_file.empty() && options.error.empty() && !board_.log.write_to(options.log_file))
+    options.error = "option \"log\": cannot write " + options.log_file;
+  if (!options.error.empty())
+    std::fprintf(stderr, "virtual card: ZARVO_VIRTUAL_CARD: %s\n", options.error.c_str());
+}
+
+DeviceNode *Card::node(Device device) {
+  const auto index = static_cast<std::size_t>(device);
+  return index < nodes_.size() ? nodes_[index].get() : nullptr;
+}
+
+void Card::log(Call call, long result) {
+  call.result = result < 0 ? -1 : result;
+  board_.log.add(std::move(call));
+}
+
+void Card::stop_if_unused() {
+  if (open_ > 0) return;
+  runner_.stop();
+  board_.last_close();
+  for (const auto &each : nodes_) each->region().release();
+}
+
+long Card::open(Device device, int flags, int sibling) {
+  Call call{Operation::open, device};
+  call.flags = flags;
+  const long result = [&]() -> long {
+    if (const int error = board_.injector.strike(Operation::open, device)) return -error;
+    if (!board_.options.error.empty()) return -EINVAL;
+    if (device == Device::none || board_.options.absent) return -ENOENT;
+    if (board_.vanished()) return -ENODEV;
+    const std::lock_guard lock(power_mutex_);
+    if (open_ == 0 && !off_)
+      if (const long error = runner_.start()) return error;
+    const long fd = node(device)->region().open(sibling, (flags & O_CLOEXEC) != 0);
+    if (fd >= 0) ++open_;
+    stop_if_unused();
+    return fd;
+  }();
+  log(std::move(call), result);
+  return result;
+}
+
+long Card::close(Device device) {
+  const long result = -board_.injector.strike(Operation::close, device);
+  log({Operation::close, device}, result);
+  return result;
+}
+
+long Card::ioctl(Device device, u32 code, std::uintptr_t argument) {
+  DeviceNode *target = node(device);
+  return target == nullptr ? -ENODEV : target->ioctl(code, argument);
+}
+
+long Card::read(Device device, std::uintptr_t buffer, std::size_t count) {
+  DeviceNode *target = node(device);
+  if (target == nullptr) return -ENODEV;
+  long result = -board_.injector.strike(Operation::read, device);
+  if (result == 0) result = board_.vanished() ? -ENODEV : target->read(buffer, count);
+  if (board_.log.on()) {
+    Call call{Operation::read, device};
+    call.value = buffer;
+    call.size = count;
+    log(std::move(call), result);
+  }
+  return result;
+}
+
+long Card::mmap(Device device, int fd, const MapRequest &request, void *&mapped) {
+  DeviceNode *target = node(device);
+  if (target == nullptr) return -ENODEV;
+  Call call{Operation::mmap, device};
+  call.size = request.length;
+  call.protection = request.protection;
+  call.flags = request.flags;
+  const long result = [&]() -> long {
+    if (const int error = board_.injector.strike(Operation::mmap, device)) return -error;
+    if ((request.flags & MAP_SHARED) == 0) return -EINVAL;
+    const long place = target->place_mapping(request.length, request.protection, request.offset);
+    if (place < 0) return place;
+    const std::lock_guard lock(power_mutex_);
+    mapped = real::mmap(real::Name::mmap, request.address, request.length, request.protection, request.flags,
+                        fd, place);
+    if (mapped == MAP_FAILED) return -errno;
+    ++mapped_;
+    return 0;
+  }();
+  log(std::move(call), result);
+  return result;
+}
+
+long Card::munmap(Device device, std::size_t length) {
+  Call call{Operation::munmap, device};
+  call.size = length;
+  const long result = -board_.injector.strike(Operation::munmap, device);
+  log(std::move(call), result);
+  return result;
+}
+
+void Card::duplicated() {
+  const std::lock_guard lock(power_mutex_);
+  ++open_;
+}
+
+void Card::closed() {
+  const std::lock_guard lock(power_mutex_);
+  --open_;
+  stop_if_unused();
+}
+
+void Card::unmapped(int count) {
+  const std::lock_guard lock(power_mutex_);
+  mapped_ -= count;
+}
+
+int Card::open_descriptors() {
+  const std::lock_guard lock(power_mutex_);
+  return open_;
+}
+
+int Card::open_mappings() {
+  const std::lock_guard lock(power_mutex_);
+  return mapped_;
+}
+
+bool Card::reset() {
+  const std::lock_guard lock(power_mutex_);
+  if (open_ > 0) return false;
+  board_.reset();
+  runner_.power_up();
+  return true;
+}
+
+bool Card::set_clock(ClockMode mode, double speed) {
+  const std::lock_guard lock(power_mutex_);
+  if (open_ > 0) return false;
+  board_.clock.power_up(mode, speed);
+  runner_.power_up();
+  return true;
+}
+
+void Card::power_off() {
+  const std::lock_guard lock(power_mutex_);
+  off_ = true;
+  runner_.stop();
+}
+
+}  // namespace virtual_card

@@ -1,0 +1,61 @@
+#include "device.h"
+
+#include <algorithm>
+#include <cerrno>
+
+#include "host/user_memory.h"
+
+namespace virtual_card {
+
+long DeviceNode::ioctl(u32 code, std::uintptr_t argument) {
+  const auto rows = commands();
+  const auto found =
+      std::find_if(rows.begin(), rows.end(), [&](const CommandRow &row) { return row.code == code; });
+  const CommandRow *row = found == rows.end() ? nullptr : &*found;
+  if (!board_.log.on()) return run(code, row, argument, nullptr);
+
+  Call logged{Operation::ioctl, device_};
+  logged.code = code;
+  logged.value = argument;
+  const long result = run(code, row, argument, &logged);
+  logged.result = result < 0 ? -1 : result;
+  board_.log.add(std::move(logged), row == nullptr ? nullptr : row->name);
+  return result;
+}
+
+long DeviceNode::run(u32 code, const CommandRow *row, std::uintptr_t argument, Call *logged) {
+  if (const int error = board_.injector.strike(Operation::ioctl, device_, code)) return -error;
+  if (row == nullptr) return -ENOTTY;
+
+  alignas(std::max_align_t) std::array<u8, kMaxRecord> record;
+  if (row->size > 0) {
+    if (const long error = copy_from_user(record.data(), argument, row->size)) return error;
+    if (logged != nullptr) {
+      logged->argument.assign(record.begin(), record.begin() + static_cast<std::ptrdiff_t>(row->size));
+      log_pointed_to(row->code, record.data(), logged->argument);
+    }
+  }
+  if (row->channel_first) {
+    u32 channel;
+    std::copy_n(record.begin(), sizeof channel, reinterpret_cast<u8 *>(&channel));
+    if (channel >= kChannels) return -EINVAL;
+  }
+  // Whether the answer can be delivered is found out before the command does anything.
+  if (row->answers)
+    if (const long error = copy_to_user(argument, record.data(), row->size)) return error;
+  {
+    const std::lock_guard lock(board_.mutex);
+    if (const long result = row->handler(*this, record.data()); result != 0) return result;
+  }
+  return row->answers ? copy_to_user(argument, record.data(), row->size) : 0;
+}
+
+long DeviceNode::read(std::uintptr_t, std::size_t) {
+  return -EINVAL;
+}
+
+long DeviceNode::place_mapping(std::size_t, int, off_t) {
+  return -ENODEV;
+}
+
+}  // namespace virtual_card

@@ -1,0 +1,103 @@
+/**
+ * @file device.h
+ * A device node of the card, as a kernel would call its driver: results below zero are negated error
+ * numbers.
+ */
+#ifndef VIRTUAL_CARD_DEVICE_H
+#define VIRTUAL_CARD_DEVICE_H
+
+#include "board.h"
+
+namespace virtual_card {
+
+class DeviceNode;
+
+/// A command a node understands: its record is copied in, the first word checked if it is a channel,
+/// the handler called with the board locked, and the record copied back if the command answers.
+struct CommandRow {
+  const char *name;
+  u32 code;
+  std::size_t size;
+  bool channel_first;
+  bool answers;
+  long (*handler)(DeviceNode &node, void *record);
+};
+
+class DeviceNode {
+ public:
+  DeviceNode(Board &board, Device device, Region &region) : board_(board), device_(device), region_(region) {}
+  virtual ~DeviceNode() = default;
+  DeviceNode(const DeviceNode &) = delete;
+  DeviceNode &operator=(const DeviceNode &) = delete;
+
+  long ioctl(u32 code, std::uintptr_t argument);
+  virtual long read(std::uintptr_t buffer, std::size_t count);
+  /// Where in the region a mapping of the node lies.
+  virtual long place_mapping(std::size_t length, int protection, off_t offset);
+
+  Region &region() { return region_; }
+
+ protected:
+  virtual std::span<const CommandRow> commands() const { return {}; }
+  /// Adds to the log what a record points to.
+  virtual void log_pointed_to(u32, const void *, std::vector<u8> &) const {}
+
+  Board &board_;
+
+ private:
+  long run(u32 code, const CommandRow *row, std::uintptr_t argument, Call *logged);
+
+  Device device_;
+  Region &region_;
+};
+
+/// The size of the largest record of any command.
+inline constexpr std::size_t kMaxRecord = 64;
+
+namespace detail {
+
+template <typename Method>
+struct Signature;
+template <typename Class, typename Argument>
+struct Signature<long (Class::*)(Argument &)> {
+  using Node = Class;
+  using Record = Argument;
+  static constexpr std::size_t kSize = sizeof(Argument);
+};
+template <typename Class>
+struct Signature<long (Class::*)()> {
+  using Node = Class;
+  using Record = void;
+  static constexpr std::size_t kSize = 0;
+};
+
+template <auto Method>
+long call(DeviceNode &node, void *record) {
+  using Types = Signature<decltype(Method)>;
+  auto &self = static_cast<typename Types::Node &>(node);
+  if constexpr (Types::kSize == 0)
+    return (self.*Method)();
+  else
+    return (self.*Method)(*static_cast<typename Types::Record *>(record));
+}
+
+}  // namespace detail
+
+enum class First { word, channel };
+enum class Answer { no, yes };
+
+template <auto Method>
+constexpr CommandRow command(const char *name, u32 code, First first = First::word,
+                             Answer answer = Answer::no) {
+  constexpr std::size_t size = detail::Signature<decltype(Method)>::kSize;
+  static_assert(size <= kMaxRecord);
+  return {name, code, size, first == First::channel, answer == Answer::yes, &detail::call<Method>};
+}
+
+/// The row of a command of the device boundary; further arguments are those of command().
+#define VIRTUAL_CARD_COMMAND(method, code, ...) \
+  command<&method>(#code, driver::code __VA_OPT__(, ) __VA_ARGS__)
+
+}  // namespace virtual_card
+
+#endif

@@ -1,0 +1,77 @@
+#include "motion_detector.h"
+
+#include <algorithm>
+#include <cstring>
+
+#include "pixel_ops.h"
+
+namespace virtual_card {
+
+namespace {
+
+constexpr std::int64_t kFramesPerLook = 3;
+/// 300 ms of NTSC fields: an object that moves steadily is reported without gaps.
+constexpr std::int64_t kHoldFields = 18;
+constexpr u32 kBlockLines = driver::kMotionBlock / 2;  ///< lines of a block in one field
+constexpr u32 kBlockSamples = driver::kMotionBlock * kBlockLines;
+constexpr u32 kMaxColumns = driver::kMotionMapSide;
+
+}  // namespace
+
+MotionDetector::MotionDetector() {
+  map_.fill(kDefaultMotionLevel);
+}
+
+void MotionDetector::set_thresholds(const driver::MotionMap &map) {
+  const std::lock_guard lock(mutex_);
+  for (u32 row = 0; row < map.rows; ++row) {
+    std::copy_n(map.thresholds + std::size_t{row} * map.columns, map.columns,
+                map_.begin() + (map.row + row) * driver::kMotionMapSide + map.column);
+  }
+}
+
+void MotionDetector::set_threshold(u16 level) {
+  const std::lock_guard lock(mutex_);
+  map_.fill(level);
+}
+
+bool MotionDetector::looks_at(std::int64_t field) {
+  return field % (2 * kFramesPerLook) == 0;
+}
+
+void MotionDetector::look(const Picture &picture, std::int64_t field) {
+  const u32 field_height = picture.lines / 2;
+  const bool comparable = seen_.width == picture.width && seen_.lines == field_height;
+  blocks_.columns = picture.width / driver::kMotionBlock;
+  blocks_.rows = picture.lines / driver::kMotionBlock;
+  blocks_.moved.assign(std::size_t{blocks_.columns} * blocks_.rows, 0);
+  if (!comparable) {
+    seen_.width = picture.width;
+    seen_.lines = field_height;
+    seen_.y.resize(std::size_t{picture.width} * field_height);
+  }
+
+  const std::lock_guard lock(mutex_);
+  for (u32 row = 0; row < blocks_.rows; ++row) {
+    std::array<u32, kMaxColumns> sums{};
+    for (u32 line = row * kBlockLines; line < (row + 1) * kBlockLines; ++line) {
+      if (comparable)
+        add_differences(seen_.y_line(line), picture.y_line(2 * line), sums.data(), blocks_.columns);
+      std::memcpy(seen_.y_line(line), picture.y_line(2 * line), picture.width);
+    }
+    for (u32 column = 0; column < blocks_.columns; ++column) {
+      const u16 threshold = map_[row * driver::kMotionMapSide + column];
+      if (threshold == driver::kNeverMoves || sums[column] <= threshold * kBlockSamples) continue;
+      blocks_.moved[std::size_t{row} * blocks_.columns + column] = 1;
+      moving_until_ = field + kHoldFields;
+    }
+  }
+}
+
+void MotionDetector::forget() {
+  seen_ = {};
+  blocks_ = {};
+  moving_until_ = INT64_MIN;
+}
+
+}  // namespace virtual_card
