@@ -34,10 +34,8 @@ int set_video_config(ZV_CARD &card, u32 channel);
 
 /// Pause of a capture thread between two passes, microseconds.
 inline constexpr u32 kPassPause = 100;
-int stop_capture(ZV_CARD &card);
 /// Clears the run flags of the capture threads and joins them. False on one of these threads itself.
 bool join_capture();
-void *get_video_data_thread(void *card);
 void *get_audio_data_thread(void *card);
 
 /// Switches detection off on all channels in the codec chip.
@@ -46,7 +44,6 @@ void write_motion_control(const ZV_CARD &card);
 int stop_motion_detection(ZV_CARD &card);
 inline constexpr u32 kAllChannels = 0xFFFF;  ///< a bit for every channel
 u32 video_loss(ZV_CARD &card);
-void *watchdog_thread(void *card);
 /// Clears the run flag of the watchdog thread, if it is still set, and joins the thread.
 bool join_watchdog();
 

@@ -60,10 +60,6 @@ struct ZV_CARD {
   Shared<u32> frame_flags[ZV_CHANNELS];  ///< flag words handed to the video callbacks
 };
 
-inline constexpr std::size_t kMotionMapBytes = 0xCA800;
-inline constexpr std::size_t kAudioBufferSize = 0x300;
-inline constexpr std::size_t kAudioBufferAlignment = 0x40;
-
 // The enumerations of a configuration are read and written as words: a caller may have put any number
 // into them, and zv_Stop() wipes a scale while the video thread makes a header from it.
 using EnumWord __attribute__((__may_alias__)) = u32;
@@ -77,9 +73,6 @@ void set_word(Enum &field, u32 word) {
   static_assert(sizeof field == sizeof(u32));
   __atomic_store_n(reinterpret_cast<EnumWord *>(&field), word, __ATOMIC_RELAXED);
 }
-
-/// Copies a configuration record into a stored one.
-void store_config(ZV_VIDEO_CONFIG &stored, const ZV_VIDEO_CONFIG &record);
 
 // Device nodes. The arrays may be overwritten with other paths before zv_Open().
 using DevicePath = std::array<char, 256>;

@@ -251,18 +251,18 @@ inline constexpr u32 kPreviewBuffers = 4;
 inline constexpr std::size_t kPreviewBufferSize = 0x240000;
 
 // Codec-chip registers.
-inline constexpr u32 kRegMotionEnable = 0x260;    ///< bits 16-31: detection on a channel
-inline constexpr u32 kRegMotionControl = 0x268;   ///< written 0xFFFF
-inline constexpr u32 kRegDisplayState = 0x310;    ///< bit 31: the display is running
-inline constexpr u32 kRegMjpegQuality = 0x670;    ///< written through the encoder device
-inline constexpr u32 kRegWatchdogPeriod = 0xBE4;  ///< kWatchdogPeriod while fed, 0 off
-inline constexpr u32 kMjpegCoarse = 0x02020202;   ///< values of kRegMjpegQuality
+inline constexpr u32 kRegMotionEnable = 0x260;   ///< bits 16-31: detection on a channel
+inline constexpr u32 kRegMotionControl = 0x268;  ///< written 0xFFFF
+inline constexpr u32 kRegDisplayState = 0x310;   ///< bit 31: the display is running
+inline constexpr u32 kRegMjpegQuality = 0x670;   ///< written through the encoder device
+inline constexpr u32 kRegWatchdogTimer = 0xBE4;  ///< kWatchdogTimerOn while fed, 0 off
+inline constexpr u32 kMjpegCoarse = 0x02020202;  ///< values of kRegMjpegQuality
 inline constexpr u32 kMjpegFine = 0x02000102;
 inline constexpr u32 kMotionEnableShift = 16;
 inline constexpr u32 kMotionEnableMask = 0xFFFFu << kMotionEnableShift;
 inline constexpr u32 kMotionControlAll = 0xFFFF;
 inline constexpr u32 kDisplayStateBit = 0x80000000;
-inline constexpr u32 kWatchdogPeriod = 0x1FF;
+inline constexpr u32 kWatchdogTimerOn = 0x1FF;  ///< in the chip's own unit
 
 // Video-input registers.
 inline constexpr u32 kRegPrivacyMask = 0x140;  ///< + 4 * channel: x_start, x_end, y_start, y_end / 8

@@ -140,8 +140,6 @@ void clear_header_flags() {
   for (auto &flag : mp4_header_flag) flag = 0;
 }
 
-}  // namespace
-
 void *get_video_data_thread(void *argument) {
   if (void *failure = make_cancellable()) return failure;
   ZV_CARD &card = *static_cast<ZV_CARD *>(argument);
@@ -151,8 +149,6 @@ void *get_video_data_thread(void *argument) {
   while (zv_thread_enable != 0) video_pass(card, state);
   return nullptr;
 }
-
-namespace {
 
 /// One of the two capture threads with what belongs to it.
 struct CaptureThread {
@@ -184,6 +180,19 @@ bool stop_thread(const CaptureThread &thread) {
 bool stop_threads() {
   const bool video_joined = stop_thread(kVideo);
   return stop_thread(kAudio) && video_joined;
+}
+
+int stop_capture(ZV_CARD &card) {
+  constexpr useconds_t kSettle = 10000;
+  if (start_flag.exchange(0) == 0) return ZV_OK;
+  enable_record_channels(card, 0);
+  enable_audio_channels(card, 0);
+  usleep(kSettle);
+  issue_with_zero(card.enc_fd, driver::ENC_IOC_STOP);
+  usleep(kSettle);
+  const bool joined = stop_threads();
+  clear_header_flags();
+  return joined ? ZV_OK : ZV_ERR_THREAD_JOIN;
 }
 
 int start_capture(ZV_CARD &card) {
@@ -218,19 +227,6 @@ bool join_capture() {
   stop_threads();
   const bool video_joined = zv_capture_thread.join(zv_thread_result);
   return zv_audio_capture_thread.join(zv_audio_thread_result) && video_joined;
-}
-
-int stop_capture(ZV_CARD &card) {
-  constexpr useconds_t kSettle = 10000;
-  if (start_flag.exchange(0) == 0) return ZV_OK;
-  enable_record_channels(card, 0);
-  enable_audio_channels(card, 0);
-  usleep(kSettle);
-  issue_with_zero(card.enc_fd, driver::ENC_IOC_STOP);
-  usleep(kSettle);
-  const bool joined = stop_threads();
-  clear_header_flags();
-  return joined ? ZV_OK : ZV_ERR_THREAD_JOIN;
 }
 
 }  // namespace zarvo

@@ -12,6 +12,9 @@
 
 namespace zarvo {
 
+namespace {
+
+/// Copies a record into a stored one, word by word.
 void store_config(ZV_VIDEO_CONFIG &stored, const ZV_VIDEO_CONFIG &record) {
   set_word(stored.mjpeg, word_of(record.mjpeg));
   set_word(stored.scale, word_of(record.scale));
@@ -27,8 +30,6 @@ void store_config(ZV_VIDEO_CONFIG &stored, const ZV_VIDEO_CONFIG &record) {
   stored.QPMax = record.QPMax;
   stored.QPMin = record.QPMin;
 }
-
-namespace {
 
 int set_encode_config(ZV_CARD &card, u32 channel, const ZV_VIDEO_CONFIG *record) {
   if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;

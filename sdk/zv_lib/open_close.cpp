@@ -20,6 +20,10 @@ namespace zarvo {
 
 namespace {
 
+constexpr std::size_t kMotionMapBytes = 0xCA800;
+constexpr std::size_t kAudioBufferSize = 0x300;
+constexpr std::size_t kAudioBufferAlignment = 0x40;
+
 template <std::size_t N>
 constexpr DevicePath device_path(const char (&node)[N]) {
   DevicePath path{};

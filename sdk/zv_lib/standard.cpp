@@ -1,11 +1,7 @@
 /**
  * @file standard.cpp
- * Video standard, input width, and the preview picture.
+ * Video standard and input width.
  */
-#include <unistd.h>
-
-#include <cstring>
-
 #include "command.h"
 #include "internal.h"
 #include "zv_bits.h"
@@ -57,32 +53,6 @@ u32 standard_of(ZV_CARD &card) {
   return card.standard;
 }
 
-int enable_preview_channels(ZV_CARD &card, u32 mask) {
-  if (mask >> ZV_CHANNELS != 0) return ZV_ERR_CHANNEL;
-  issue(card.disp_fd, mask != 0 ? driver::DISP_IOC_PREVIEW_ON : driver::DISP_IOC_PREVIEW_OFF);
-  for (u32 n = 0; n < ZV_CHANNELS; ++n) {
-    ZV_DISPLAY_WINDOW &window = card.display.window[n];
-    window.flags = (mask >> n & 1) != 0 ? ZV_WINDOW_ENABLED : 0;
-    issue(card.disp_fd, driver::DISP_IOC_SET_WINDOW, window);
-  }
-  return ZV_OK;
-}
-
-int preview_screen(ZV_CARD &card, u8 **picture) {
-  if (picture == nullptr) return -1;
-  // The driver answers with one word, but it is asked for a whole picture: the scratch buffer has
-  // room for one, so that nobody's memory suffers from a generous driver.
-  u32 index = driver::kPreviewBuffers;
-  pthread_mutex_lock(&mutex_preview);
-  std::memcpy(preview_scratch, &index, sizeof index);
-  const ssize_t result = read(card.disp_fd, preview_scratch, driver::kPreviewBufferSize);
-  std::memcpy(&index, preview_scratch, sizeof index);
-  pthread_mutex_unlock(&mutex_preview);
-  const bool whole = result > 0 && static_cast<std::size_t>(result) <= driver::kPreviewBufferSize;
-  if (whole && index < driver::kPreviewBuffers) *picture = preview_buf[index];
-  return static_cast<int>(result);
-}
-
 }  // namespace
 
 }  // namespace zarvo
@@ -103,12 +73,4 @@ u32 zv_GetVideoStandard(HANDLE handle) {
 
 int zv_SetVideoStandard(HANDLE handle, u32 standard) {
   return status_from(handle, set_video_standard, standard);
-}
-
-int zv_EnablePreviewChannels(HANDLE handle, u32 mask) {
-  return status_from(handle, enable_preview_channels, mask);
-}
-
-int zv_GetPreviewScreen(HANDLE handle, u8 **picture) {
-  return value_from(handle, -1, preview_screen, picture);
 }

@@ -22,8 +22,8 @@ void *zv_watchdog_thread_result;
 
 namespace {
 
-constexpr std::int64_t kKickPeriod = 30000;  ///< milliseconds
-constexpr useconds_t kLookPause = 5000;      ///< microseconds between looks at the flag and the clock
+constexpr std::int64_t kKickIntervalMs = 30000;  ///< from one feed of the board to the next
+constexpr useconds_t kFlagPollUs = 5000;         ///< from one look at the flag and the clock to the next
 constexpr int kAttempts = 10;
 
 const RunFlag kRunning{zv_watchdog_thread_enable, mutex_watchdog};
@@ -49,15 +49,15 @@ std::int64_t now_ms() {
 
 /// Feeds the watchdog until the run flag is cleared or the controller fails to answer.
 void feed(const ZV_CARD &card) {
-  std::int64_t next_kick = now_ms() + kKickPeriod;
+  std::int64_t next_kick = now_ms() + kKickIntervalMs;
   while (kRunning.is_set()) {
     const std::int64_t now = now_ms();
     if (now < next_kick) {
-      usleep(kLookPause);
+      usleep(kFlagPollUs);
       continue;
     }
-    next_kick = now + kKickPeriod;
-    write_codec(card, driver::kRegWatchdogPeriod, driver::kWatchdogPeriod);
+    next_kick = now + kKickIntervalMs;
+    write_codec(card, driver::kRegWatchdogTimer, driver::kWatchdogTimerOn);
     u32 reply = 0;
     if (!kick(card, reply)) {
       std::printf("ERROR: Zarvo WatchDog reset failed. code = 0x%x.\n", reply);
@@ -66,11 +66,9 @@ void feed(const ZV_CARD &card) {
   }
 }
 
-}  // namespace
-
 void *watchdog_thread(void *argument) {
   const ZV_CARD &card = *static_cast<ZV_CARD *>(argument);
-  write_codec(card, driver::kRegWatchdogPeriod, driver::kWatchdogPeriod);
+  write_codec(card, driver::kRegWatchdogTimer, driver::kWatchdogTimerOn);
   zv_delay(500);
   u32 reply = 0;
   if (kick(card, reply)) {
@@ -81,11 +79,9 @@ void *watchdog_thread(void *argument) {
   }
   kRunning.exchange(0);
   board_command(card, driver::kBoardWatchdogOff, 0);
-  write_codec(card, driver::kRegWatchdogPeriod, 0);
+  write_codec(card, driver::kRegWatchdogTimer, 0);
   return nullptr;
 }
-
-namespace {
 
 int enable_watchdog(ZV_CARD &card) {
   if (kRunning.exchange(1) != 0) return ZV_OK;
@@ -97,7 +93,7 @@ int enable_watchdog(ZV_CARD &card) {
 int disable_watchdog(ZV_CARD &card) {
   if (kRunning.exchange(0) == 0) return ZV_OK;
   if (!zv_watchdog_thread.join(zv_watchdog_thread_result)) return ZV_ERR_THREAD_JOIN;
-  write_codec(card, driver::kRegWatchdogPeriod, 0);
+  write_codec(card, driver::kRegWatchdogTimer, 0);
   u32 reply = 0;
   return handshake(card, driver::kBoardWatchdogOff, driver::kBoardWatchdogOffReply, reply) ? ZV_OK
                                                                                            : ZV_ERR_DEVICE;

@@ -37,7 +37,7 @@ bool BoardController::expired(nanoseconds now) {
 
 void BoardController::feed(nanoseconds now) {
   running_ = true;
-  deadline_ = now + kPatience;
+  deadline_ = now + kResetDelay;
   ++kicks_;
 }
 

@@ -12,8 +12,8 @@ namespace virtual_card {
 /// fed in time.
 class BoardController {
  public:
-  /// Card time from a feed to the reset: twice the interval at which the Capture SDK feeds it.
-  static constexpr nanoseconds kPatience = std::chrono::seconds{60};
+  /// Card time from the last feed to the reset of the machine: twice the SDK's feeding interval.
+  static constexpr nanoseconds kResetDelay = std::chrono::seconds{60};
 
   /// Carries a command out and answers it; commands it does not know answer 0.
   u32 command(u32 command, nanoseconds now);

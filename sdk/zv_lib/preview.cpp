@@ -1,7 +1,11 @@
 /**
  * @file preview_mode.cpp
- * Preview layout, focus channel and channel numbers.
+ * The preview: layout, channels shown, the picture, focus channel; and the channel numbers of encoded
+ * pictures.
  */
+#include <unistd.h>
+
+#include <cstring>
 #include <utility>
 
 #include "command.h"
@@ -24,6 +28,32 @@ namespace {
 
 u32 preview_mode_of(ZV_CARD &card) {
   return card.display.mode;
+}
+
+int enable_preview_channels(ZV_CARD &card, u32 mask) {
+  if (mask >> ZV_CHANNELS != 0) return ZV_ERR_CHANNEL;
+  issue(card.disp_fd, mask != 0 ? driver::DISP_IOC_PREVIEW_ON : driver::DISP_IOC_PREVIEW_OFF);
+  for (u32 n = 0; n < ZV_CHANNELS; ++n) {
+    ZV_DISPLAY_WINDOW &window = card.display.window[n];
+    window.flags = (mask >> n & 1) != 0 ? ZV_WINDOW_ENABLED : 0;
+    issue(card.disp_fd, driver::DISP_IOC_SET_WINDOW, window);
+  }
+  return ZV_OK;
+}
+
+int preview_screen(ZV_CARD &card, u8 **picture) {
+  if (picture == nullptr) return -1;
+  // The driver answers with one word, but it is asked for a whole picture: the scratch buffer has
+  // room for one, so that nobody's memory suffers from a generous driver.
+  u32 index = driver::kPreviewBuffers;
+  pthread_mutex_lock(&mutex_preview);
+  std::memcpy(preview_scratch, &index, sizeof index);
+  const ssize_t result = read(card.disp_fd, preview_scratch, driver::kPreviewBufferSize);
+  std::memcpy(&index, preview_scratch, sizeof index);
+  pthread_mutex_unlock(&mutex_preview);
+  const bool whole = result > 0 && static_cast<std::size_t>(result) <= driver::kPreviewBufferSize;
+  if (whole && index < driver::kPreviewBuffers) *picture = preview_buf[index];
+  return static_cast<int>(result);
 }
 
 constexpr u32 kChannelMask = 0xFu << driver::kRoutingShift;
@@ -101,4 +131,12 @@ int zv_EnableVideoChannelNumber(HANDLE handle, u32 channel) {
 
 int zv_DisableVideoChannelNumber(HANDLE handle, u32 channel) {
   return status_from(handle, send_channel_number, channel, driver::ENC_IOC_CHANNEL_NUMBER_OFF);
+}
+
+int zv_EnablePreviewChannels(HANDLE handle, u32 mask) {
+  return status_from(handle, enable_preview_channels, mask);
+}
+
+int zv_GetPreviewScreen(HANDLE handle, u8 **picture) {
+  return value_from(handle, -1, preview_screen, picture);
 }
