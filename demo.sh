@@ -40,7 +40,7 @@ prepare() {
 # prepare_working_folder FOLDER: the program expects the players and a root for its recordings in it.
 prepare_working_folder() {
   mkdir -p "$1/Data"
-  cp "$BUILD/players/Videoplayer" "$BUILD/players/Audioplayer" "$1/"
+  cp "$BUILD/programs/players/Videoplayer" "$BUILD/programs/players/Audioplayer" "$1/"
 }
 
 run_window() {

@@ -22,7 +22,7 @@ export TSAN_OPTIONS=halt_on_error=1:second_deadlock_stack=1:suppressions=$ZARVO_
 
 sources() {
   if git rev-parse --git-dir >/dev/null 2>&1; then git ls-files '*.cpp' '*.h' '*.c'; else
-    find app bench examples include players sdk tests virtual_card -name '*.cpp' -o -name '*.h' -o -name '*.c'
+    find app bench examples include programs recording sdk tests virtual_card -name '*.cpp' -o -name '*.h' -o -name '*.c'
   fi
 }
 
@@ -50,7 +50,7 @@ smoke_demo() {
 run_tidy() {
   build release
   say "clang-tidy"
-  run-clang-tidy -quiet -p build/release '^(?!.*(_autogen|/headers/)).*/(app|bench|examples|players|sdk|virtual_card)/.*\.cpp$'
+  run-clang-tidy -quiet -p build/release '^(?!.*(_autogen|/headers/)).*/(app|bench|examples|programs|recording|sdk|tests|virtual_card)/.*\.cpp$'
 }
 
 mode=${1:-all}

@@ -47,8 +47,7 @@ int g_res = 0;
 
 QStringList frame_rate_labels(ZV_VIDEO_STANDARD standard) {
   QStringList labels;
-  for (auto label = standard == VIDEO_STANDARD_ZV_NTSC ? ntsc_fps_str : pal_fps_str; *label != nullptr;
-       ++label)
+  for (auto label = recording::frame_rate_list(standard); *label != nullptr; ++label)
     labels << QString::fromLatin1(*label);
   return labels;
 }

@@ -17,8 +17,8 @@
 #include <ctime>
 #include <mutex>
 
-#include "frame_rates.h"
 #include "global.h"
+#include "recording/frame_rates.h"
 #include "zv_type.h"
 
 // The card and what the operator chose for it.

@@ -1,3 +1,4 @@
+// The preview window, made with SDL 1.2.
 #include "sdl.h"
 
 #include <SDL.h>
@@ -10,8 +11,6 @@
 #include <cstring>
 #include <iterator>
 
-#include "sdl_on_demand.h"
-
 SDL_Surface *screen = nullptr;
 SDL_Overlay *overlay = nullptr;
 SDL_Rect video_rect;
@@ -21,8 +20,6 @@ namespace {
 
 constexpr int kBitsPerPixel = 24;
 constexpr std::size_t kBytesPerPixel = 2;  // of a UYVY picture
-
-bool loaded = false;  // SDL's functions may be called
 
 // Rows of the overlay may be padded; rows of a picture never are.
 void copy_into_overlay(const unsigned char *picture, std::size_t length) {
@@ -65,12 +62,6 @@ void set_overlay_environment() {
 
 int InitialSDL(int width, int height) {
   set_overlay_environment();
-  const char *missing = load_sdl();
-  loaded = missing == nullptr;
-  if (!loaded) {
-    std::printf("Initial SDL error: %s\n", missing);
-    return -1;
-  }
   if (init_without_signals() != 0) {
     std::printf("Initial SDL error: %s\n", SDL_GetError());
     return -1;
@@ -115,5 +106,5 @@ void CloseSDL() {
   if (overlay != nullptr) SDL_FreeYUVOverlay(overlay);
   overlay = nullptr;
   screen = nullptr;
-  if (loaded) SDL_Quit();
+  SDL_Quit();
 }

@@ -25,7 +25,6 @@ constexpr i32 kBitRates[] = {0,         64 * kKilo, 128 * kKilo, 256 * kKilo, 51
                              6 * kMega, 7 * kMega,  8 * kMega,   9 * kMega,   10 * kMega};
 constexpr u32 kGops[] = {kDefaultGop, 1, 2, 3, 5, 10, 15, 20, 25, 30};
 constexpr ZV_JPEG_QUALITY kJpegQualities[] = {JPEG_QP_ZV_LOW, JPEG_QP_ZV_HIGH};
-constexpr int kIntervals = 16;
 
 // Range of the quantiser, and what is stored where the operator gives no bound.
 constexpr int kHighestQpMax = 59;
@@ -79,7 +78,7 @@ void choose_quality(DemoDialog &dialog, const Quality &quality) {
   dialog.combowTwoField->setEnabled(!d1);
   zv_config.scale = quality.scale;
   zv_config.twofield = field_mode_of(dialog.combowTwoField);
-  g_valid_record_ch = quality.channels[zv_config.twofield];
+  g_valid_record_ch = allowed_channels(quality, zv_config.twofield);
   g_record_ch = (1u << g_valid_record_ch) - 1u;
   dialog.btnRecordStart->setEnabled(true);
 }
@@ -161,7 +160,7 @@ void DemoDialog::UpdateCodecInfo() {
 
 void DemoDialog::UpdateFrameRate() {
   const int index = comboFrameRate->currentIndex();
-  if (index >= 0 && index < kIntervals) zv_config.interval = static_cast<ZV_INTERVAL_VALUE>(index);
+  if (index >= 0 && index < INTERVAL_ZV_INVALID) zv_config.interval = static_cast<ZV_INTERVAL_VALUE>(index);
 }
 
 void DemoDialog::UpdateJpegQuality() {

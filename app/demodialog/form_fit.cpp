@@ -36,17 +36,9 @@ struct Factors {
   }
 };
 
-// Character by character: laying every text out takes more than twice as long. Kerning, which this leaves
-// out, makes Latin texts narrower if anything.
-QSize size_of_text(const QWidget *widget, const QString &text) {
-  const QFontMetricsF metrics(widget->font());
-  qreal width = 0;
-  for (const QChar character : text) width += metrics.horizontalAdvance(character);
-  return {static_cast<int>(std::ceil(width)), static_cast<int>(std::ceil(metrics.height()))};
-}
-
 QSize room_for_text(const QWidget *child) {
-  const auto text = [&](const QString &shown) { return size_of_text(child, shown); };
+  const QFontMetrics metrics(child->font());
+  const auto text = [&](const QString &shown) { return metrics.size(Qt::TextSingleLine, shown); };
   constexpr QSize kAround(2 * kPadding, kPadding);
   if (const auto *combo = qobject_cast<const QComboBox *>(child)) {
     QSize widest;
@@ -69,7 +61,7 @@ QSize room_for_text(const QWidget *child) {
 int title_bottom(const QGroupBox *group) {
   QStyleOptionGroupBox option;
   option.initFrom(group);
-  option.text = QStringLiteral("T");  // of any title: only the height is asked for
+  option.text = QStringLiteral("T");  // any title will do: only the height matters
   option.subControls = QStyle::SC_GroupBoxLabel;
   const QStyle *style = group->style();
   return style->subControlRect(QStyle::CC_GroupBox, &option, QStyle::SC_GroupBoxLabel, group).bottom();

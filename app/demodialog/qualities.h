@@ -8,23 +8,26 @@
 #include "panel_helpers.h"
 #include "zv_type.h"
 
-/// A picture size, and how many channels the card encodes in it at the full rate with one field and with
-/// two. "None" is the first item; D1 has no field mode.
+/// A picture size, and its share of what the card can encode.
 struct Quality {
   ZV_SCALE_VALUE scale;
-  int channels[2];
+  int cif_pictures;  ///< size in CIF pictures
 };
 
+/// In the order of the items; "None" is the first.
 inline constexpr Quality kQualities[] = {
-    {SCALE_ZV_NO_ENCODE, {0, 0}},
-    {SCALE_ZV_CIF, {16, 8}},
-    {SCALE_ZV_HALF_D1, {8, 4}},
-    {SCALE_ZV_D1, {4, 4}},
-};
+    {SCALE_ZV_NO_ENCODE, 0}, {SCALE_ZV_CIF, 1}, {SCALE_ZV_HALF_D1, 2}, {SCALE_ZV_D1, 4}};
 
 /// The quality of an item; "None" for an index without one.
 inline Quality quality_of(int item) {
   return item_value(kQualities, item, kQualities[0]);
+}
+
+/// How many channels the card encodes at the full rate: sixteen CIF channels with one field, or as many
+/// pictures in another size. Two fields count twice.
+constexpr int allowed_channels(const Quality &quality, ZV_TWOFIELD_MODE fields) {
+  if (quality.scale == SCALE_ZV_NO_ENCODE) return 0;
+  return ZV_CHANNELS / (quality.cif_pictures * (fields == TWOFIELD_ENABLE ? 2 : 1));
 }
 
 #endif

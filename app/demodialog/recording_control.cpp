@@ -13,15 +13,14 @@
 #include "app_state.h"
 #include "demodialog.h"
 #include "panel_helpers.h"
-#include "recording_files.h"
+#include "recording/tree.h"
 #include "zv_lib.h"
 
 namespace {
 
 constexpr const char *kNoSpace = "No enough disk space";
 
-/// Bytes a second, divided by this, are kilobits a second.
-constexpr int kBytesPerKilobit = 128;
+constexpr int kBytesPerKilobit = 1024 / 8;
 
 /// Appends a delivery to the file open for it; false when there is none. The GUI thread opens the files
 /// before the capture starts and closes them after it has ended, so no lock is needed.
@@ -34,7 +33,7 @@ bool append(FILE *const (&files)[N], unsigned index, const unsigned char *data, 
 
 /// A folder this process can enter, with a path short enough for all the paths below it.
 bool is_root(const QByteArray &path) {
-  if (static_cast<std::size_t>(path.size()) > kMaxRootBytes || path.contains('\0')) return false;
+  if (static_cast<std::size_t>(path.size()) > recording::kMaxRootBytes || path.contains('\0')) return false;
   struct stat info {};
   return stat(path.constData(), &info) == 0 && S_ISDIR(info.st_mode) && access(path.constData(), X_OK) == 0;
 }
@@ -52,7 +51,7 @@ int setting_in(QLineEdit *edit, int lowest, int highest) {
 
 void mpeg4_call_back(unsigned int ch, unsigned char *data, int length, int) {
   if (!append(g_fp_mpg4, ch, data, length)) return;
-  // The meter holds one second's bytes; a meter that nobody empties stops at the end of its range.
+  // lenlen counts this second's bytes; it stops at INT_MAX in case nothing resets it.
   lenlen =
       static_cast<int>(std::min<long long>(static_cast<long long>(lenlen) + std::max(length, 0), INT_MAX));
   const std::time_t now = std::time(nullptr);
@@ -73,13 +72,13 @@ void audio_call_back(unsigned int ch, unsigned char *data, int length, int) {
 void DemoDialog::StartRecord() {
   // A second start would truncate the files that the capture threads are writing.
   if (timer.isActive()) return;
-  if (std::strlen(g_filepath) > kMaxRootBytes || !CheckDiskSpace(g_filepath)) {
+  if (std::strlen(g_filepath) > recording::kMaxRootBytes || !CheckDiskSpace(g_filepath)) {
     std::puts(kNoSpace);
     return;
   }
   CheckFolder(g_filepath);
   OpenFile();
-  // The quantiser first: a fixed one puts the bit rate back to VBR before that is read.
+  // SetQP() first: a fixed quantiser resets the bit-rate box to VBR, and SetCBRbps() reads that box.
   SetQP();
   SetCBRbps();
   SetTwoField();
@@ -90,7 +89,8 @@ void DemoDialog::StartRecord() {
   }
   WriteEnableCh();
   const int status = zv_Start(zv_handle);
-  if (status != ZV_OK) CloseFile();  // whoever reads the line finds the files complete
+  if (status != ZV_OK)
+    CloseFile();  // before the error line is printed, so that the files are complete by then
   if (!sdk_ok(status, "ERROR:zv_Start Error!")) return;
   timer.start(g_time_interval);
   g_finish_record = 0;
@@ -123,7 +123,7 @@ void DemoDialog::TimerTick() {
 }
 
 int DemoDialog::CheckTime() {
-  const int hour = local_clock().tm_hour;
+  const int hour = recording::local_time().tm_hour;
   if (hour == g_cur_hour) return 1;
   g_cur_hour = hour;
   return 0;

@@ -4,7 +4,7 @@
 #include <QFileDialog>
 #include <QTimer>
 
-#include "record_file_header.h"
+#include "recording/header.h"
 #include "recording_fixture.h"
 
 namespace {

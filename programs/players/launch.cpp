@@ -12,7 +12,7 @@ namespace players {
 namespace {
 
 /// Returns only when the program cannot be run; then errno tells why.
-void run(const Command &command) {
+void run(const PlayerCommand &command) {
   std::vector<char *> argv = {const_cast<char *>(command.program.c_str())};
   for (const std::string &argument : command.arguments) argv.push_back(const_cast<char *>(argument.c_str()));
   argv.push_back(nullptr);
@@ -46,11 +46,11 @@ std::string base_name(const std::string &path) {
   return path.substr(path.rfind('/') + 1);
 }
 
-int hand_over(const std::vector<Command> &commands) {
+int hand_over(const std::vector<PlayerCommand> &commands) {
   // Whoever started this program may have left its own descriptors open, the card's among them.
   closefrom(STDERR_FILENO + 1);
   bool installed = false;
-  for (const Command &command : commands) {
+  for (const PlayerCommand &command : commands) {
     run(command);
     if (errno == ENOENT) continue;
     installed = true;

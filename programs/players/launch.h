@@ -13,7 +13,7 @@
 namespace players {
 
 /// A player to hand a recording to, with its arguments.
-struct Command {
+struct PlayerCommand {
   std::string program;
   std::vector<std::string> arguments;
 };
@@ -27,7 +27,7 @@ std::string base_name(const std::string &path);
 
 /// Replaces this process by the first of the players that is installed; all descriptors but the standard ones
 /// are closed. Returns 1, with a message on standard error, when no player can be run.
-int hand_over(const std::vector<Command> &commands);
+int hand_over(const std::vector<PlayerCommand> &commands);
 
 }  // namespace players
 

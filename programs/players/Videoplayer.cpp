@@ -1,0 +1,49 @@
+/// Videoplayer FILE: plays a video recording (".rec") with ffplay, or with mpv where ffplay is missing.
+#include <cstdio>
+
+#include "launch.h"
+#include "recording/frame_rates.h"
+#include "recording/header.h"
+
+namespace {
+
+/// The demuxer that splits the stream behind the header into frames.
+const char *stream_format(ZV_VIDEO_CODEC codec) {
+  return codec == VIDEO_CODEC_ZV_MJPEG ? "mjpeg" : "m4v";
+}
+
+/// A camera's picture is 4:3 whatever its size in pixels; the pixels of a half-height one are not square. The
+/// players skip the header, so that they can seek in the file.
+std::vector<players::PlayerCommand> player_commands(const RECORD_FILE_HEADER &header,
+                                                    const std::string &format, const std::string &file) {
+  const std::string title = recording::label_of(header) + " - " + players::base_name(file);
+  const std::string skip = std::to_string(sizeof header);
+  players::PlayerCommand ffplay{"ffplay",
+                                {"-hide_banner", "-loglevel", "error", "-autoexit", "-window_title", title,
+                                 "-vf", "setdar=4/3", "-f", format, "-skip_initial_bytes", skip}};
+  std::string options = "skip_initial_bytes=" + skip;
+  if (header.frame_rate > 0) {
+    const std::string rate = recording::frame_rate_label(header);
+    ffplay.arguments.insert(ffplay.arguments.end(), {"-framerate", rate});
+    options += ",framerate=" + rate;
+  }
+  ffplay.arguments.insert(ffplay.arguments.end(), {"-i", "file:" + file});
+  return {ffplay,
+          {"mpv",
+           {"--video-aspect-override=4:3", "--demuxer=lavf", "--title=" + title,
+            "--demuxer-lavf-format=" + format, "--demuxer-lavf-o=" + options, "--", file}}};
+}
+
+}  // namespace
+
+int main(int argc, char **argv) {
+  const int file = players::open_argument(argc, argv, sizeof(RECORD_FILE_HEADER));
+  if (file < 0) return 1;
+  const auto header = recording::read_header(file);
+  const auto codec = header ? recording::codec_of(*header) : std::nullopt;
+  if (!codec) {
+    std::fprintf(stderr, "%s: no recording header\n", argv[1]);
+    return 1;
+  }
+  return players::hand_over(player_commands(*header, stream_format(*codec), argv[1]));
+}

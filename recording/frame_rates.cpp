@@ -1,0 +1,29 @@
+// The lists of frame rates, and how a cut rate finds its label again.
+#include "recording/frame_rates.h"
+
+#include <cstdlib>
+
+const char *const ntsc_fps_str[] = {"30", "27", "25",   "24", "22.5", "20",  "15", "10",   "7.5",
+                                    "6",  "5",  "3.75", "3",  "2",    "1.2", "1",  nullptr};
+const char *const pal_fps_str[] = {"25",   "22.5", "20.83", "20",   "18.75", "16.67", "12.5", "8.33",
+                                   "6.25", "5",    "4.17",  "3.13", "2.5",   "1.67",  "1",    nullptr};
+
+namespace recording {
+
+const char *const *frame_rate_list(ZV_VIDEO_STANDARD standard) {
+  return standard == VIDEO_STANDARD_ZV_NTSC ? ntsc_fps_str : pal_fps_str;
+}
+
+std::string frame_rate_label(const RECORD_FILE_HEADER &header) {
+  const bool ntsc = header.record_height % 240 == 0;
+  const std::string whole = std::to_string(header.frame_rate);
+  std::string cut;
+  for (auto label = frame_rate_list(ntsc ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL); *label != nullptr;
+       ++label) {
+    if (*label == whole) return whole;
+    if (cut.empty() && std::atoi(*label) == header.frame_rate) cut = *label;
+  }
+  return cut.empty() ? whole : cut;
+}
+
+}  // namespace recording
