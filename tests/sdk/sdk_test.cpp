@@ -1,103 +1,87 @@
+// The world of the SDK's tests: the log as lines, faults between the SDK and libc, and the callbacks.
+
 #include "sdk_test.h"
 
 #include <malloc.h>
 #include <pthread.h>
 #include <time.h>
 
-#include <cerrno>
-#include <filesystem>
 #include <mutex>
-
-namespace vc = virtual_card;
 
 namespace {
 
-constexpr std::uint32_t kSetMotionMap = 0x40187602;
-
-/// Of a motion map, whose pointer is of no interest: its five words, the number of thresholds, and
-/// their value if it is the same for all.
-Words words_of(const vc::Call &command) {
-  const Bytes &bytes = command.argument;
-  const bool map = command.code == kSetMotionMap;
-  if (!map && bytes.size() % 4 != 0) return Words(bytes.begin(), bytes.end());
-  Words words((map ? 20 : bytes.size()) / 4);
-  std::copy_n(bytes.data(), words.size() * 4, reinterpret_cast<u8 *>(words.data()));
-  if (!map) return words;
-  const std::size_t record = sizeof(void *) == 8 ? 32 : 24;
-  const bool same = std::equal(bytes.begin() + record + 2, bytes.end(), bytes.begin() + record);
-  words.push_back(static_cast<std::uint32_t>((bytes.size() - record) / 2));
-  words.push_back(same ? bytes[record] | std::uint32_t{bytes[record + 1]} << 8 : ~0u);
-  return words;
+std::string hex(u32 word) {
+  char text[16];
+  std::snprintf(text, sizeof text, "%x", word);
+  return text;
 }
 
-std::string describe(const vc::Call &command) {
-  static const char *const kDevices[] = {"encoder", "display", "audio", "vin", "none"};
-  static const char *const kOperations[] = {"open", "close", "ioctl", "read", "mmap", "munmap"};
-  if (command.operation == vc::Operation::ioctl) return cmd(command.code, words_of(command));
-  return std::string(kOperations[static_cast<int>(command.operation)]) + " " +
-         kDevices[static_cast<int>(command.device)];
+/// Instead of its pointer, a motion map shows the number of thresholds, and their value if all are the same.
+std::string thresholds(const Bytes &record) {
+  const u8 *first = record.data() + 16 + 2 * sizeof(void *), *end = record.data() + record.size();
+  return ": " + std::to_string((end - first) / 2) + " x " +
+         (std::equal(first + 2, end, first) ? std::to_string(first[0] | first[1] << 8) : "various");
+}
+
+std::string command_line(u32 code, const Bytes &record) {
+  std::string text = command_name(code);
+  const bool map = text == "VIN_IOC_SET_MOTION_MAP" && !record.empty();
+  std::vector<u32> words(record.begin(), record.end());
+  if (record.size() != 3) {
+    words.resize(map ? 5 : record.size() / 4);
+    std::copy_n(record.data(), words.size() * 4, reinterpret_cast<u8 *>(words.data()));
+  }
+  if (std::islower(text[0]) && !words.empty()) {
+    if (words.size() == 3) text = line(text, words[0]);
+    const u32 *access = &words[words.size() - 2];
+    return text + " 0x" + hex(access[0]) + (text.find("write") < text.size() ? ' ' + hex(access[1]) : "");
+  }
+  for (const u32 word : words) text = line(text, word);
+  return map ? text + thresholds(record) : text;
+}
+
+std::string describe(const card::Call &call) {
+  static const char *const kDevices[] = {"encoder", "display", "audio", "vin"};
+  static const char *const kOperations[] = {"open ", "close ", "", "read ", "mmap ", "munmap "};
+  if (call.operation == card::Operation::ioctl) return command_line(call.code, call.argument);
+  return std::string(kOperations[static_cast<int>(call.operation)]) +
+         kDevices[static_cast<int>(call.device)] +
+         (call.size > 0 ? " 0x" + hex(static_cast<u32>(call.size)) : "");
 }
 
 std::mutex delivery_mutex;
 std::vector<Delivery> delivery_list;
 
 bool strikes(int &countdown) {
-  if (countdown == 0 || --countdown > 0) return false;
-  return faults.struck = true;
-}
-
-template <typename... Arguments>
-void *allocate(void *(*real)(Arguments...), Arguments... arguments) {
-  if (strikes(faults.malloc_countdown)) return nullptr;
-  ++faults.live_allocations;
-  return real(arguments...);
+  return countdown > 0 && --countdown == 0;
 }
 
 }  // namespace
 
-std::string cmd(std::uint32_t code, const Words &words) {
-  char text[32];
-  std::snprintf(text, sizeof text, "%08x", code);
-  std::string line = text;
-  // Register accesses in hexadecimal, sizes and places in decimal.
-  static const Words kRegisters = {0xC008640E, 0xC008640F, 0xC0087605, 0xC0087606,
-                                   0xC0037607, 0xC0037608, 0xC008760A, 0xC008650E};
-  const bool hex = std::find(kRegisters.begin(), kRegisters.end(), code) != kRegisters.end();
-  for (std::uint32_t word : words) {
-    std::snprintf(text, sizeof text, hex ? " %x" : " %u", word);
-    line += text;
-  }
-  return line;
-}
-
-Lines issued() {
+Lines operations() {
   Lines lines;
-  for (const vc::Call &command : vc::log())
-    if (command.operation == vc::Operation::ioctl && command.code != 0x650F && command.code != 0x6509)
-      lines.push_back(describe(command));
-  vc::record_log(true);
+  for (const card::Call &call : card::log()) lines.push_back(describe(call));
   return lines;
 }
 
-std::string sent() {
+Lines issued() {
+  Lines lines = operations();
+  card::record_log(true);
+  std::erase_if(lines, [](const std::string &line) {
+    return line.starts_with("ENC_IOC_MPEG4_") || line.starts_with("read encoder");
+  });
+  return lines;
+}
+
+std::string sent(int status) {
+  EXPECT_EQ(status, ZV_OK);
   std::string text;
   for (const std::string &line : issued()) text += (text.empty() ? "" : "; ") + line;
   return text;
 }
 
-Lines operations() {
-  Lines lines;
-  for (const vc::Call &command : vc::log()) lines.push_back(describe(command));
-  return lines;
-}
-
 std::size_t count(const Lines &lines, const std::string &line) {
   return static_cast<std::size_t>(std::count(lines.begin(), lines.end(), line));
-}
-
-std::size_t entries(const char *directory) {
-  const std::filesystem::directory_iterator list(directory);
-  return static_cast<std::size_t>(std::distance(begin(list), end(list)));
 }
 
 Faults faults;
@@ -105,39 +89,40 @@ Faults faults;
 extern "C" {
 void *__real_malloc(std::size_t size);
 void *__real_memalign(std::size_t alignment, std::size_t size);
-void __real_free(void *memory);
 int __real_pthread_create(pthread_t *, const pthread_attr_t *, void *(*)(void *), void *);
-int __real_clock_gettime(clockid_t clock, timespec *now);
+int __real_pthread_join(pthread_t, void **);
 
 void *__wrap_malloc(std::size_t size) {
-  return allocate(__real_malloc, size);
+  return strikes(faults.malloc_countdown) ? nullptr : __real_malloc(size);
 }
 void *__wrap_memalign(std::size_t alignment, std::size_t size) {
-  return allocate(__real_memalign, alignment, size);
-}
-void __wrap_free(void *memory) {
-  if (memory != nullptr) --faults.live_allocations;
-  __real_free(memory);
+  return strikes(faults.malloc_countdown) ? nullptr : __real_memalign(alignment, size);
 }
 int __wrap_pthread_create(pthread_t *thread, const pthread_attr_t *attributes, void *(*routine)(void *),
                           void *argument) {
-  return strikes(faults.thread_countdown) ? EAGAIN
-                                          : __real_pthread_create(thread, attributes, routine, argument);
+  if (strikes(faults.thread_countdown)) return EAGAIN;
+  ++faults.threads;
+  return __real_pthread_create(thread, attributes, routine, argument);
 }
-int __wrap_clock_gettime(clockid_t clock, timespec *now) {
-  const int result = __real_clock_gettime(clock, now);
-  now->tv_sec += faults.clock_ahead;
+int __wrap_pthread_join(pthread_t thread, void **result) {
+  --faults.threads;
+  return __real_pthread_join(thread, result);
+}
+int __wrap_clock_gettime(clockid_t, timespec *now) {
+  const long ms = faults.clock_ms;
+  *now = {ms / 1000, ms % 1000 * 1000000};
   ++faults.clock_reads;
-  return result;
+  return 0;
 }
 }
 
 std::function<void(const Delivery &)> on_delivery;
 
-void keep(char stream, const u8 *area, u32 channel, const u8 *data, i32 length, i32 flags) {
-  char summary[80];
-  std::snprintf(summary, sizeof summary, "%c %u %td %d %x", stream, channel, data - area, length, flags);
-  const Delivery delivery{summary, Bytes(data, data + length)};
+void keep(char stream, u32 channel, const u8 *data, i32 length, i32 flags) {
+  const u8 *area = stream == 'm' ? zarvo::mpeg4_buf : stream == 'j' ? zarvo::mjpeg_buf : zarvo::audio_buf;
+  EXPECT_TRUE(channel < ZV_CHANNELS && length >= 0 && data >= area && data + length <= area + 0x100000);
+  const Delivery delivery{line({stream}, channel, data - area, length) + ' ' + hex(u32(flags)),
+                          Bytes(data, data + std::min(length, 8192))};
   if (on_delivery) on_delivery(delivery);
   const std::lock_guard lock(delivery_mutex);
   delivery_list.push_back(delivery);
@@ -148,57 +133,53 @@ std::vector<Delivery> deliveries() {
   return delivery_list;
 }
 
-Lines summaries() {
+Lines delivered() {
   Lines lines;
-  for (const Delivery &delivery : deliveries()) lines.push_back(delivery.summary);
+  for (const Delivery &delivery : deliveries()) lines.push_back(delivery.line);
   return lines;
 }
 
-bool wait_for_deliveries(std::size_t number) {
-  return eventually([&] { return deliveries().size() >= number; });
+ZV_VIDEO_CONFIG settings(ZV_SCALE_VALUE scale, u32 interval, ZV_TWOFIELD_MODE two) {
+  ZV_VIDEO_CONFIG config{};
+  config.scale = scale;
+  config.interval = static_cast<ZV_INTERVAL_VALUE>(interval);
+  config.twofield = two;
+  config.gop = 25;
+  config.qp = 6;
+  return config;
 }
 
-void CardTest::SetUp() {
-  vc::reset();
-  vc::set_clock(vc::ClockMode::manual);
-  faults.reset();
+void SdkTest::SetUp() {
+  card::reset();
+  card::set_clock(card::ClockMode::manual);
+  faults.malloc_countdown = faults.thread_countdown = faults.threads = 0;
   on_delivery = nullptr;
   delivery_list.clear();
-  descriptors_before = entries("/proc/self/fd");
   open_card();
-  vc::record_log(true);
+  card::record_log(true);
 }
 
-void CardTest::open_card() {
+void SdkTest::open_card() {
   ASSERT_EQ(zv_Open(&handle), ZV_OK);
   ASSERT_EQ(zv_RegisterCallBack(handle, callback<'m'>, callback<'j'>, callback<'a'>), ZV_OK);
 }
 
-void CardTest::close_leaving_nothing() {
+void SdkTest::close_leaving_nothing() {
   EXPECT_EQ(zv_Close(handle), ZV_OK);
-  EXPECT_EQ(vc::open_descriptors(), 0);
-  EXPECT_EQ(vc::open_mappings(), 0);
-  EXPECT_EQ(entries("/proc/self/fd"), descriptors_before);
+  EXPECT_EQ(card::open_descriptors(), 0);
+  EXPECT_EQ(card::open_mappings(), 0);
+  EXPECT_EQ(faults.threads, 0);
 }
 
-void CardTest::TearDown() {
-  vc::clear_fault();
+void SdkTest::TearDown() {
+  card::clear_fault();
   EXPECT_EQ(zv_Stop(handle), ZV_OK);
-  if (zarvo::card_of(handle) != nullptr) {
-    EXPECT_EQ(zv_DisableWatchDog(handle), ZV_OK);
-  }
   close_leaving_nothing();
 }
 
-void CardTest::enable(u32 mask, ZV_SCALE_VALUE scale) {
-  ZV_VIDEO_CONFIG config{};
-  config.scale = scale;
-  config.gop = 30;
-  config.qp = 4;
-  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel)
-    if ((mask >> channel & 1) != 0) {
-      EXPECT_EQ(zv_SetVideoEncodeConfig(handle, channel, &config), ZV_OK);
-    }
+void SdkTest::enable(u32 mask) {
+  const ZV_VIDEO_CONFIG config = settings(SCALE_ZV_CIF);
+  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) zv_SetVideoEncodeConfig(handle, channel, &config);
   EXPECT_EQ(zv_EnableVideoRecordChannels(handle, mask), ZV_OK);
-  vc::record_log(true);
+  card::record_log(true);
 }
