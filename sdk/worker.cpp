@@ -1,10 +1,11 @@
+// A thread that its owner starts and joins.
 #include "worker.h"
 
 namespace zarvo {
 
 namespace {
 
-// Exit values of threads, which pthread_join() hands out as plain pointers.
+// Exit values of threads. pthread_join() returns them as void pointers, so they must not be const.
 char cancel_state_failed[] = "ERROR:pthread_setcancelstate failed.\n";
 char cancel_type_failed[] = "ERROR:pthread_setcanceltype failed.\n";
 

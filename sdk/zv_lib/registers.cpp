@@ -1,6 +1,6 @@
 /**
  * @file registers.cpp
- * Raw register access for diagnosis. Every access prints its line.
+ * Raw register access for diagnosis. Every access prints a line.
  */
 #include <cstdio>
 
