@@ -1,5 +1,5 @@
-/// Audioplayer FILE: plays an audio recording (".aud") with ffplay, or with mpv where ffplay is missing.
-/// The file has no header: 8000 samples a second, mono, 3 bits a sample.
+// Audioplayer FILE: plays an audio recording (".aud") with ffplay, or with mpv if ffplay is not installed.
+// The file has no header: G.726, 8000 samples a second, mono, 3 bits a sample.
 #include "launch.h"
 
 int main(int argc, char **argv) {
