@@ -6,7 +6,7 @@ int main(int argc, char **argv) {
   if (players::open_argument(argc, argv, 0) < 0) return 1;
   const std::string file = argv[1];
   const std::string title = players::base_name(file);
-  return players::hand_over(
+  return players::run_first_installed(
       {{"ffplay",
         {"-hide_banner", "-loglevel", "error", "-autoexit", "-window_title", title, "-f", "g726",
          "-code_size", "3", "-sample_rate", "8000", "-i", "file:" + file}},

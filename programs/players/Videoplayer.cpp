@@ -45,5 +45,5 @@ int main(int argc, char **argv) {
     std::fprintf(stderr, "%s: no recording header\n", argv[1]);
     return 1;
   }
-  return players::hand_over(player_commands(*header, stream_format(*codec), argv[1]));
+  return players::run_first_installed(player_commands(*header, stream_format(*codec), argv[1]));
 }

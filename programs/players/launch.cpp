@@ -47,7 +47,7 @@ std::string base_name(const std::string &path) {
   return path.substr(path.rfind('/') + 1);
 }
 
-int hand_over(const std::vector<PlayerCommand> &commands) {
+int run_first_installed(const std::vector<PlayerCommand> &commands) {
   // Do not pass on descriptors of the program that started this one, for example those of the card.
   closefrom(STDERR_FILENO + 1);
   bool installed = false;

@@ -27,7 +27,7 @@ std::string base_name(const std::string &path);
 
 /// Closes all descriptors but the standard ones and replaces this process by the first of the players that is
 /// installed. If none can be run, prints a message on standard error and returns 1.
-int hand_over(const std::vector<PlayerCommand> &commands);
+int run_first_installed(const std::vector<PlayerCommand> &commands);
 
 }  // namespace players
 
