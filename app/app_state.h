@@ -39,7 +39,7 @@ extern int video_enable;
 extern int g_finish_preview;
 extern int g_width;
 extern int g_height;
-/// The dialog holds it during each change of split, standard, resolution, focus and preview channels,
+/// The dialog holds this mutex during each change of split, standard, resolution, focus and preview channels,
 /// including the SDK call. The preview thread holds it during its own display calls.
 extern std::mutex layout_mutex;
 

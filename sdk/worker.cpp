@@ -5,7 +5,7 @@ namespace zarvo {
 
 namespace {
 
-// Exit values of threads. pthread_join() returns them as void pointers, so they must not be const.
+// Exit values of threads. An exit value is a void pointer, so these texts cannot be const.
 char cancel_state_failed[] = "ERROR:pthread_setcancelstate failed.\n";
 char cancel_type_failed[] = "ERROR:pthread_setcanceltype failed.\n";
 

@@ -64,17 +64,16 @@ inline constexpr u32 DISP_IOC_GET_MOTION = 0x80046412;        // u32 channel bit
 inline constexpr u32 DISP_IOC_SELECT_BUFFER = 0xC0046413;     // u32 preview buffer 0-3
 
 // Commands of the video-input device.
-inline constexpr u32 VIN_IOC_SET_MASK = 0x40147601;        // Mask
-inline constexpr u32 VIN_IOC_SET_MOTION_MAP = 0x40187602;  // MotionMap
-inline constexpr u32 VIN_IOC_SET_STANDARD = 0xC0047604;    // u32 standard
-inline constexpr u32 VIN_IOC_READ_REG = 0xC0087605;        // Register, value output
-inline constexpr u32 VIN_IOC_WRITE_REG = 0xC0087606;       // Register
-inline constexpr u32 VIN_IOC_READ_TW2815 = 0xC0037607;     // DecoderRegister, value output
-inline constexpr u32 VIN_IOC_WRITE_TW2815 = 0xC0037608;    // DecoderRegister
-inline constexpr u32 VIN_IOC_SET_WIDTH = 0xC0047609;       // u32 pixels, 720 or 704
-inline constexpr u32 VIN_IOC_BOARD_CMD = 0xC008760A;       // BoardCommand, reply output
-inline constexpr u32 VIN_IOC_GET_MOTION_LEVELS =
-    0xC002760B;  // MotionLevels: 32 bytes, although the code says 2
+inline constexpr u32 VIN_IOC_SET_MASK = 0x40147601;           // Mask
+inline constexpr u32 VIN_IOC_SET_MOTION_MAP = 0x40187602;     // MotionMap
+inline constexpr u32 VIN_IOC_SET_STANDARD = 0xC0047604;       // u32 standard
+inline constexpr u32 VIN_IOC_READ_REG = 0xC0087605;           // Register, value output
+inline constexpr u32 VIN_IOC_WRITE_REG = 0xC0087606;          // Register
+inline constexpr u32 VIN_IOC_READ_TW2815 = 0xC0037607;        // DecoderRegister, value output
+inline constexpr u32 VIN_IOC_WRITE_TW2815 = 0xC0037608;       // DecoderRegister
+inline constexpr u32 VIN_IOC_SET_WIDTH = 0xC0047609;          // u32 pixels, 720 or 704
+inline constexpr u32 VIN_IOC_BOARD_CMD = 0xC008760A;          // BoardCommand, reply output
+inline constexpr u32 VIN_IOC_GET_MOTION_LEVELS = 0xC002760B;  // MotionLevels: 32 bytes, but the code says 2
 
 /// A value that belongs to one channel.
 struct ChannelValue {

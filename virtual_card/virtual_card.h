@@ -92,7 +92,7 @@ ReadyFrame mpeg4_frame(unsigned channel, unsigned type, const std::vector<std::u
 ReadyFrame mjpeg_frame(unsigned channel, unsigned width, unsigned height,
                        const std::vector<std::uint8_t> &scan);
 
-/// Append a frame to the stream's queue, behind the frames that wait there. A full queue loses it.
+/// Append a frame to the stream's queue, behind the frames that wait there. A full queue drops it.
 void queue_mpeg4(ReadyFrame frame);
 void queue_mjpeg(ReadyFrame frame);
 /// Appends audio data, normally four blocks of 48 bytes. The read delivers at most 192 bytes.

@@ -18,7 +18,8 @@ namespace {
 constexpr QSize kLeastSize(728, 780);
 constexpr int kTestPasses = 10;
 
-// Opens and closes the card several times, to find a card that can be opened only once before it is used.
+// Opens and closes the card several times before it is used: a card that can be opened only once is of no
+// use.
 void test_open_close() {
   for (int pass = 0; pass < kTestPasses; ++pass) {
     const std::string tried = " Error!, try count = " + std::to_string(pass);

@@ -19,10 +19,9 @@ std::uint8_t mark_of(Device device) {
   return static_cast<std::uint8_t>(static_cast<int>(device) + 1);
 }
 
-constinit std::array<std::atomic<std::uint8_t>, kTableSize>
-    marks{};                                              // by descriptor: kForeign, kOrphan or device + 1
-constinit std::array<std::atomic<int>, 4> open_counts{};  // by device: open descriptors
-constinit std::atomic<pid_t> home{0};                     // the process that the card belongs to
+constinit std::array<std::atomic<std::uint8_t>, kTableSize> marks{};  // kForeign, kOrphan or device + 1
+constinit std::array<std::atomic<int>, 4> open_counts{};              // by device: open descriptors
+constinit std::atomic<pid_t> home{0};                                 // the process that the card belongs to
 
 struct Mapping {
   std::uintptr_t start;

@@ -17,8 +17,7 @@ constexpr std::array<const char *, kNames> kSymbols = {
     "close",  "close_range", "closefrom", "ioctl",    "read",     "__read_chk", "mmap",       "mmap64",
     "munmap", "dup",         "dup2",      "dup3",     "fcntl",    "fcntl64"};
 
-constinit std::array<std::atomic<void *>, kNames>
-    addresses{};  // by Name: the next definition of the symbol, null until it is looked up
+constinit std::array<std::atomic<void *>, kNames> addresses{};  // libc's definition of each name
 
 template <typename Function>
 Function *next(Name name) {

@@ -62,7 +62,7 @@ struct Board {
   void write_codec(u32 address, u32 value);
   void write_video_input(u32 address, u32 value);
   void write_decoder(unsigned chip, unsigned address, u8 value);
-  /// Does what ENC_IOC_STOP does. The caller holds `mutex`.
+  /// Stops encoding and drops the queued frames. The caller holds `mutex`.
   void stop_encoding();
   /// Drops the queued frames if `session` is no longer the current session: encoding may be stopped while a
   /// field is being encoded, and the frames of that field must not start the next recording.

@@ -95,8 +95,8 @@ long DisplayDevice::set_zoom(driver::Zoom &zoom) {
   return 0;
 }
 
-/// Checks the word and ignores it: it adjusts the scaler of a real card for a three-column layout, which the
-/// drawn pictures do not need.
+/// Checks the word and ignores it. On a real card it adjusts the scaler for a three-column layout; the drawn
+/// pictures do not need that.
 long DisplayDevice::set_source(u32 &word) {
   return word >> driver::kSourceGroupShift < driver::kSourceGroups ? 0 : -EINVAL;
 }

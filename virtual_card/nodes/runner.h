@@ -1,7 +1,7 @@
 /**
  * @file runner.h
  * Runs the card: calls the engine for each field and audio block when it is due, composes the preview,
- * queues paced supplies and checks the watchdog.
+ * queues the frames of supplies with a rate, and checks the watchdog.
  */
 #ifndef VIRTUAL_CARD_RUNNER_H
 #define VIRTUAL_CARD_RUNNER_H

@@ -15,8 +15,8 @@ std::uint64_t size_of(const ZV_DISPLAY_WINDOW &window) {
   return std::uint64_t{window.x_end - window.x_start} * (window.y_end - window.y_start);
 }
 
-/// The order of drawing: first windows without ZV_WINDOW_PIP, and of these large before small: a
-/// picture-in-picture window whose flag was cleared stays visible.
+/// Returns whether window `a` is drawn before window `b`: windows without ZV_WINDOW_PIP first, then large
+/// before small, so that a picture-in-picture window whose flag was cleared stays visible.
 bool below(const ZV_DISPLAY_WINDOW *a, const ZV_DISPLAY_WINDOW *b) {
   const auto mark = [](const ZV_DISPLAY_WINDOW *window) { return window->flags & ZV_WINDOW_PIP; };
   return mark(a) != mark(b) ? mark(a) < mark(b) : size_of(*a) > size_of(*b);

@@ -16,20 +16,20 @@
 
 namespace virtual_card {
 
+/// Call the functions from one thread at a time, except those marked "Any thread".
 class Engine {
  public:
   Engine(FrameQueue &mpeg4, FrameQueue &mjpeg, FrameQueue &audio);
   ~Engine();
 
-  /// Draws, detects, encodes and queues everything that is due at this field. Call it from one thread at a
-  /// time. It uses threads of its own and returns when all is done. The result is deterministic.
+  /// Draws, detects, encodes and queues everything that is due at this field. It uses threads of its own and
+  /// returns when all is done. The result is deterministic.
   void field(const CardState &state, const Field &field);
   /// Encodes one 128-sample block of each audio input and queues the four blocks as one frame.
   /// `block` counts blocks since power-up (62.5 a second).
   void audio_block(const CardState &state, std::int64_t block);
 
-  /// Composes the newest preview picture from the last fields into `uyvy`, width x lines x 2 bytes. Call it
-  /// from one thread at a time, as field().
+  /// Composes the newest preview picture from the last fields into `uyvy`, width x lines x 2 bytes.
   void compose(const CardState &state, std::span<u8> uyvy);
 
   /// Returns the mask of channels with motion at the last field. Any thread.
@@ -42,8 +42,7 @@ class Engine {
   /// when the file cannot be read as video. Any thread.
   bool show_film(unsigned channel, const std::string &path, std::string *error);
 
-  /// Ends the engine's threads; the next field or preview starts them again. Call it from one thread at a
-  /// time, as field().
+  /// Ends the engine's threads; the next field or preview starts them again.
   void rest();
   /// Restores the power-up state of encoders, maps, films and pictures.
   void reset();

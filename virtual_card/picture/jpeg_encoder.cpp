@@ -107,7 +107,7 @@ struct JpegEncoder::Compressor {
     jpeg_finish_compress(&jpeg);
   }
 
-  /// Writes the picture that was just encoded again, with fewer coefficients and the same tables.
+  /// Encodes the last picture again, with fewer coefficients and the same tables.
   void coarsen_result() {
     fine_bytes.swap(sink.bytes);
     jpeg_mem_src(&fine_jpeg, fine_bytes.data(), sink.used);
