@@ -67,6 +67,7 @@ void Runner::power_up() {
   schedule_ = FieldSchedule{};
   field_ = 0;
   audio_block_ = 0;
+  for (Pace *pace : {&video_pace_, &audio_pace_}) pace->count = 0;
 }
 
 void Runner::loop() {
