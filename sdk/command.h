@@ -8,6 +8,7 @@
 
 #include <sys/ioctl.h>
 
+#include <cerrno>
 #include <type_traits>
 
 #include "zv_card.h"
@@ -15,14 +16,22 @@
 
 namespace zarvo {
 
+/// Makes a system call again for as long as a signal interrupts it.
+template <typename Call>
+auto uninterrupted(Call call) {
+  auto result = call();
+  while (result == -1 && errno == EINTR) result = call();
+  return result;
+}
+
 /// Issues a command without an argument.
 inline int issue(i32 fd, u32 code) {
-  return ioctl(fd, code);
+  return uninterrupted([=] { return ioctl(fd, code); });
 }
 
 /// Issues a command whose third argument is the number 0, not an address.
 inline int issue_with_zero(i32 fd, u32 code) {
-  return ioctl(fd, code, 0L);
+  return uninterrupted([=] { return ioctl(fd, code, 0L); });
 }
 
 /// Issues a command on a record. The record may be a temporary if the caller does not need the reply.
@@ -32,7 +41,7 @@ int issue(i32 fd, u32 code, Record &&record) {
   static_assert(std::is_trivially_copyable_v<std::remove_reference_t<Record>> &&
                 !std::is_pointer_v<std::remove_reference_t<Record>> &&
                 !std::is_null_pointer_v<std::remove_reference_t<Record>>);
-  return ioctl(fd, code, &record);
+  return uninterrupted([&] { return ioctl(fd, code, &record); });
 }
 
 /// Issues a command that returns a word. Returns the word the driver writes, or `word` if it writes none.

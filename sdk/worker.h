@@ -7,11 +7,10 @@
 
 #include <pthread.h>
 
-#include <mutex>
-
 namespace zarvo {
 
-/// A thread of the SDK. start() and join() refuse when the thread calls them on itself.
+/// A thread of the SDK. It takes no signals except those of its own faults, so that a signal handler of the
+/// host never runs inside it. start() and join() refuse when the thread calls them on itself.
 class Worker {
  public:
   using Routine = void *(*)(void *);
@@ -26,7 +25,8 @@ class Worker {
   bool join(void *&result);
 
  private:
-  std::mutex mutex_;  ///< guards id_ and joinable_; not held while waiting for the thread
+  pthread_mutex_t mutex_ =
+      PTHREAD_MUTEX_INITIALIZER;  ///< guards id_ and joinable_; not held while waiting for the thread
   pthread_t id_{};
   bool joinable_ = false;
 };

@@ -6,11 +6,11 @@
 #include <unistd.h>
 
 #include <cstdint>
-#include <cstdio>
 #include <cstring>
 
 #include "command.h"
 #include "internal.h"
+#include "print.h"
 #include "stream_headers.h"
 #include "zv_bits.h"
 #include "zv_card.h"
@@ -210,7 +210,7 @@ int start_capture(ZV_CARD &card) {
     usleep(1000);
     return ZV_OK;
   }
-  std::printf("Zarvo SDK: Start Error! Error Code = %d.\n", ZV_ERR_THREAD_CREATE);
+  print("Zarvo SDK: Start Error! Error Code = %d.\n", ZV_ERR_THREAD_CREATE);
   stop_capture(card);
   return ZV_ERR_THREAD_CREATE;
 }

@@ -3,11 +3,11 @@
  * Stores the encoder settings of the channels, checks them against the frame-rate budget and enables
  * channels.
  */
-#include <cstdio>
 
 #include "command.h"
 #include "internal.h"
 #include "interval.h"
+#include "print.h"
 #include "zv_card.h"
 #include "zv_lib.h"
 
@@ -38,7 +38,7 @@ int set_encode_config(ZV_CARD &card, u32 channel, const ZV_VIDEO_CONFIG *record)
   ZV_VIDEO_CONFIG &config = card.config[channel];
   store_config(config, *record);
   if (config.enable != 0 && word_of(config.scale) == SCALE_ZV_NO_ENCODE) {
-    std::printf("Error: zv_SetVideoEncodeConfig--invalid scale value.\n");
+    print("Error: zv_SetVideoEncodeConfig--invalid scale value.\n");
     return ZV_ERR_CONFIG;
   }
   const bool two_field_slow = word_of(config.twofield) == TWOFIELD_ENABLE && word_of(config.interval) != 0;
@@ -88,8 +88,8 @@ u32 weight_of(const ZV_VIDEO_CONFIG &config, const Load &load, u32 channel) {
     case SCALE_ZV_D1:
       return 4;
     default:
-      std::printf("Error: invalid scale value, channel = %d, scale = %d.\n", static_cast<int>(channel),
-                  static_cast<int>(word_of(config.scale)));
+      print("Error: invalid scale value, channel = %d, scale = %d.\n", static_cast<int>(channel),
+            static_cast<int>(word_of(config.scale)));
       return 0;
   }
 }
@@ -108,7 +108,7 @@ int check_encode_config(ZV_CARD &card) {
     if (word_of(config.twofield) == TWOFIELD_ENABLE && (load.skip != 0 || load.d1)) return ZV_ERR_CONFIG;
     total += static_cast<float>(weight_of(config, load, channel) * rate);
     if (total > budget) {
-      std::printf("Error: zv_CheckVideoEncodeConfig--Exceed maximum total frame rate!!\n");
+      print("Error: zv_CheckVideoEncodeConfig--Exceed maximum total frame rate!!\n");
       return ZV_ERR_CONFIG;
     }
   }
@@ -128,7 +128,7 @@ int mark_channels(ZV_CARD &card, u32 mask) {
     }
     config.enable = 1;
     if (word_of(config.scale) == SCALE_ZV_NO_ENCODE) {
-      std::printf(
+      print(
           "ZarvoSDK: Error: zv_EnableVideoRecordChannels--invalid scale value of Channel%d. Please confirm  "
           "video config first.\n",
           static_cast<int>(channel));

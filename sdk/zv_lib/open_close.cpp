@@ -7,12 +7,12 @@
 #include <sys/mman.h>
 #include <unistd.h>
 
-#include <cstdio>
 #include <cstdlib>
 #include <new>
 
 #include "command.h"
 #include "internal.h"
+#include "print.h"
 #include "zv_card.h"
 #include "zv_lib.h"
 
@@ -77,6 +77,8 @@ void close_nodes(const Descriptors &fds, std::size_t count) {
 bool open_nodes(Descriptors &fds) {
   for (std::size_t i = 0; i < kNodeCount; ++i) {
     fds[i] = open(kNodes[i].path.data(), O_RDWR);
+    // A program that the host starts must not hold the card.
+    if (fds[i] >= 0) fcntl(fds[i], F_SETFD, FD_CLOEXEC);
     if (fds[i] < 0) {
       close_nodes(fds, i);
       return false;
@@ -142,7 +144,7 @@ ZV_CARD *acquire_memory(const Descriptors &fds) {
     return preview_scratch != nullptr && card->motion_map != nullptr;
   };
   if (acquired()) return card;
-  std::printf("Zarvo SDK: Open Error! Error Code = %d.\n", ZV_ERR_NO_MEMORY);
+  print("Zarvo SDK: Open Error! Error Code = %d.\n", ZV_ERR_NO_MEMORY);
   release_memory(card);
   return nullptr;
 }

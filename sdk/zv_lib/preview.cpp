@@ -47,7 +47,8 @@ int preview_screen(ZV_CARD &card, u8 **picture) {
   u32 index = driver::kPreviewBuffers;
   pthread_mutex_lock(&mutex_preview);
   std::memcpy(preview_scratch, &index, sizeof index);
-  const ssize_t result = read(card.disp_fd, preview_scratch, driver::kPreviewBufferSize);
+  const ssize_t result =
+      uninterrupted([&] { return read(card.disp_fd, preview_scratch, driver::kPreviewBufferSize); });
   std::memcpy(&index, preview_scratch, sizeof index);
   pthread_mutex_unlock(&mutex_preview);
   const bool whole = result > 0 && static_cast<std::size_t>(result) <= driver::kPreviewBufferSize;

@@ -6,10 +6,10 @@
 #include <unistd.h>
 
 #include <cstdint>
-#include <cstdio>
 
 #include "command.h"
 #include "internal.h"
+#include "print.h"
 #include "zv_bits.h"
 #include "zv_card.h"
 #include "zv_lib.h"
@@ -61,7 +61,7 @@ void feed(const ZV_CARD &card) {
     write_codec(card, driver::kRegWatchdogTimer, driver::kWatchdogTimerOn);
     u32 reply = 0;
     if (!kick(card, reply)) {
-      std::printf("ERROR: Zarvo WatchDog reset failed. code = 0x%x.\n", reply);
+      print("ERROR: Zarvo WatchDog reset failed. code = 0x%x.\n", reply);
       return;
     }
   }
@@ -76,7 +76,7 @@ void *watchdog_thread(void *argument) {
     if (void *failure = make_cancellable()) return failure;
     feed(card);
   } else {
-    std::printf("ERROR: Zarvo WatchDog init failed. code = 0x%x\n", reply);
+    print("ERROR: Zarvo WatchDog init failed. code = 0x%x\n", reply);
   }
   kRunning.exchange(0);
   board_command(card, driver::kBoardWatchdogOff, 0);
