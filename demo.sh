@@ -16,14 +16,14 @@ Usage: ./demo.sh                      with a display: open the program; without:
        ./demo.sh tour                 let a scripted operator use the program on an invisible display
 
 Uses the card of this machine if there is one (/dev/zarvo_enc0), otherwise the virtual card.
-Installs what is missing, builds, and leaves its results in build/demo.
+Installs missing packages, builds, and writes its results to build/demo.
 TEXT
 }
 
 BUILD=$ZARVO_ROOT/build/release
 RESULTS=$ZARVO_ROOT/build/demo
 SHOTS=$RESULTS/screenshots
-TOUR=$RESULTS/tour # the scripted operator's working directory; what the user records is elsewhere
+TOUR=$RESULTS/tour # the scripted operator's working directory; the user's recordings are in $RESULTS/Data
 CARD=$BUILD/virtual_card/libzarvo_virtual_card.so
 PROGRAM=$BUILD/app/zarvo_demo
 WIDGET_MAP=$BUILD/tests/end_to_end/widget_map
@@ -37,7 +37,7 @@ prepare() {
   if real_card; then say "Using the card of this machine"; else say "No card here: using the virtual card"; fi
 }
 
-# prepare_working_folder FOLDER: the program expects the players and a root for its recordings in it.
+# prepare_working_folder FOLDER: the program expects the players and the folder Data in its working directory.
 prepare_working_folder() {
   mkdir -p "$1/Data"
   cp "$BUILD/programs/players/Videoplayer" "$BUILD/programs/players/Audioplayer" "$1/"
@@ -58,7 +58,7 @@ run_record() {
   mapfile -t files < <(sed -nE 's/: [0-9]+ (frames|blocks), [0-9]+ bytes, .*//p' "$log")
   [ ${#files[@]} -gt 0 ] || return 0 # --help records nothing
 
-  say "What ffprobe and ffmpeg say of each file (codec, width, height, frames; audio: codec, rate, blocks)"
+  say "What ffprobe and ffmpeg say about each file (codec, width, height, frames; audio: codec, rate, blocks)"
   report_streams "${files[@]}" || FAILED=1
   mkdir -p "$pictures"
   while read -r line; do
@@ -87,7 +87,7 @@ tour_preview() {
   wait_preview
   for split in 1 4 6 8 9 16; do
     click "btnSplit$split"
-    sleep 1.2 # for the eye: the card changes the layout with the next picture
+    sleep 1.2 # until the screenshot shows the new layout
     shot "preview-split-$split" "$PREVIEW"
     wait_until 10 rate_near 30 || fail "the preview in $split runs at $(preview_rate) pictures a second, not 30"
   done
@@ -170,19 +170,19 @@ tour_playback() {
   xdotool key Return
   wait_until 20 xdotool search --onlyvisible --name "^Channel 7 - ${file##*/}" || die "no player appeared"
   player=$(xdotool search --onlyvisible --name "^Channel 7 - ${file##*/}" | head -n 1)
-  sleep 0.5 # for the eye: the first picture of the film
+  sleep 0.5 # until the player shows the first picture
   shot player "$player"
   wait_until 30 player_gone "$file" || fail "the player does not end"
 }
 player_gone() { ! xdotool search --onlyvisible --name "^Channel 7 - ${1##*/}"; }
 
-# The dialog with a font of 125 %, as it opens and made larger by hand.
+# The dialog with a font of 125 %, as it opens and enlarged by hand.
 tour_sizes() {
-  say "The dialog with larger letters, and enlarged"
+  say "The dialog with a font of 125 %, and enlarged"
   QT_FONT_DPI=120 start_program "$TOUR"
   shot dialog-125-percent "$DIALOG"
   xdotool windowsize --sync "$DIALOG" 1500 950
-  sleep 0.5 # for the eye: the last repaint
+  sleep 0.5 # until the dialog is repainted
   shot dialog-enlarged "$DIALOG"
   close_program
 }

@@ -1,3 +1,4 @@
+// The state that the dialog, the preview thread and the recording callbacks share.
 #include "app_state.h"
 
 HANDLE zv_handle = nullptr;

@@ -1,8 +1,8 @@
 /**
  * @file app_state.h
- * The state the dialog, the preview thread and the recording callbacks share. It lives for the whole
- * program; none of it belongs to a dialog object. Words that two threads touch are read and written
- * through shared().
+ * The state that the dialog, the preview thread and the recording callbacks share. It exists for the whole
+ * program and belongs to no dialog object. Words that two threads use are read and written through
+ * shared().
  */
 #ifndef APP_STATE_H
 #define APP_STATE_H
@@ -21,7 +21,7 @@
 #include "recording/frame_rates.h"
 #include "zv_type.h"
 
-// The card and what the operator chose for it.
+// The card, and the settings that the operator chose for it.
 extern HANDLE zv_handle;
 extern ZV_VIDEO_STANDARD zv_format;
 extern ZV_RESOLUTION zv_resolution;
@@ -33,17 +33,17 @@ extern ZV_VIDEO_CONFIG zv_config;
 extern ZV_VIDEO_CONFIG zv_clean_config;
 extern ZV_VIDEO_CODEC zv_record_mode;
 
-// Preview. `video_enable` is written under the mutex and read by the preview thread without it.
+// Preview. `video_enable` is written under thread_mutex; the preview thread reads it without the mutex.
 extern pthread_mutex_t thread_mutex;
 extern int video_enable;
 extern int g_finish_preview;
 extern int g_width;
 extern int g_height;
-/// Held around each change of split, standard, resolution, focus and preview channels together with the
-/// SDK call that sends it, and by the preview thread around its own display calls.
+/// The dialog holds this mutex during each change of split, standard, resolution, focus and preview channels,
+/// including the SDK call. The preview thread holds it during its own display calls.
 extern std::mutex layout_mutex;
 
-// Channel sets, bit n = channel n + 1.
+// Channel sets: bit n is channel n + 1 as operators count.
 extern unsigned int g_preview_ch;
 extern unsigned int g_record_ch;
 extern unsigned int g_audio_ch;
@@ -70,13 +70,13 @@ extern QTimer timer;
 extern time_t ttt;
 extern int lenlen;
 
-/// Status of the most recent SDK call of the dialog.
+/// The status of the most recent SDK call that went through sdk_ok().
 extern int g_res;
 
-/// The labels of a standard's frame rates, without the closing null.
+/// Returns the labels of a standard's frame rates, without the final null.
 QStringList frame_rate_labels(ZV_VIDEO_STANDARD standard);
 
-/// Pixels across and lines of the input picture, as the operator chose.
+/// Return the width and the lines of the input picture, as the operator chose them.
 inline int input_width() {
   return zv_resolution == RESOLUTION_ZV_720 ? 720 : 704;
 }
@@ -84,17 +84,17 @@ inline int input_lines() {
   return zv_format == VIDEO_STANDARD_ZV_NTSC ? 480 : 576;
 }
 
-/// A word that two threads share.
+/// Gives atomic access to a word that two threads share.
 template <typename T>
 std::atomic_ref<T> shared(T &word) {
   return std::atomic_ref<T>(word);
 }
 
-/// Keeps the status of an SDK call in g_res and prints `message` as a line when the call failed.
-/// True on success. Every SDK call of the dialog whose failure is reported goes through here.
+/// Stores the status of an SDK call in g_res and prints `message` as a line when the call failed. Returns
+/// true on success. Every SDK call of the dialog whose failure is reported uses this function.
 bool sdk_ok(int status, const char *message);
 
-// Callbacks of the recording, called on the SDK's capture threads.
+// The recording callbacks. The SDK calls them on its capture threads.
 void mpeg4_call_back(unsigned int ch, unsigned char *data, int length, int flags);
 void mjpeg_call_back(unsigned int ch, unsigned char *data, int length, int flags);
 void audio_call_back(unsigned int ch, unsigned char *data, int length, int flags);

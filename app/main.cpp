@@ -1,3 +1,4 @@
+// Entry point of the demo application.
 #include <QApplication>
 #include <QStyle>
 #include <clocale>
@@ -8,15 +9,16 @@
 #include "sdl.h"
 
 int main(int argc, char **argv) {
-  // The diagnostics are read through pipes, too: each line is to be seen at once.
+  // Write each line at once, also into a pipe: scripts read the lines while the program runs.
   std::setvbuf(stdout, nullptr, _IOLBF, 0);
-  // A recording outlives whoever reads the lines, and a file that reaches its size limit.
+  // Keep recording when the reader of the lines has gone, or when a file reaches its size limit.
   std::signal(SIGPIPE, SIG_IGN);
   std::signal(SIGXFSZ, SIG_IGN);
-  set_overlay_environment();  // before Qt starts its threads
+  set_overlay_environment();  // before Qt starts threads
   const QApplication application(argc, argv);
-  std::setlocale(LC_NUMERIC, "C");  // the lines are the same in every country
-  // Two groups of the form are black on the window's colour, which a dark theme would make black as well.
+  std::setlocale(LC_NUMERIC, "C");  // printed numbers must not depend on the locale
+  // Two groups of the form have black text. Use the light palette of the style, since a dark theme would make
+  // that text unreadable.
   QApplication::setPalette(QApplication::style()->standardPalette());
   DemoDialog *dialog = new DemoDialog;
   dialog->show();

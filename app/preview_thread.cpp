@@ -1,3 +1,4 @@
+// Shows the card's preview picture on a thread of its own.
 #include "preview_thread.h"
 
 #include <pthread.h>
@@ -12,10 +13,10 @@ namespace {
 
 constexpr u32 kAllChannels = 0xFFFF;
 constexpr int kRealTimePriority = 80;
-constexpr u32 kNtscPeriod = 33;  // milliseconds a picture
+constexpr u32 kNtscPeriod = 33;  // milliseconds for each picture
 constexpr u32 kPalPeriod = 40;
 constexpr int kNtscLines = 480;
-constexpr useconds_t kPause = 1000;  // microseconds, short against a picture: a stop is noticed at once
+constexpr useconds_t kPause = 1000;  // microseconds; short, so that a stop is noticed at once
 
 pthread_t thread;
 bool thread_exists = false;
@@ -45,7 +46,8 @@ void enable_channels(u32 mask) {
   sdk_ok(zv_EnablePreviewChannels(zv_handle, mask), "ERROR:zv_EnablePreviewChannels Error");
 }
 
-// Turns the card's preview on, and compares what the card does with what the operator chose.
+// Turns the card's preview on and checks that standard, mode and resolution of the card are those that the
+// operator chose.
 bool prepare_card() {
   const std::lock_guard lock(layout_mutex);
   if (!same(zv_GetVideoStandard(zv_handle), zv_format, "ERROR:format does not match")) return false;
@@ -55,7 +57,7 @@ bool prepare_card() {
   return same(zv_GetResolution(zv_handle), zv_resolution, "ERROR:resolution does not match!");
 }
 
-// The number of pictures shown, negative when the card has failed.
+// Returns the number of pictures shown, 0 or 1, or -1 when the card has failed.
 int show_picture() {
   u8 *picture = nullptr;
   const int length = zv_GetPreviewScreen(zv_handle, &picture);
@@ -63,12 +65,13 @@ int show_picture() {
     sdk_ok(length, "ERROR:zv_GetPreviewScreen Error!");
     return -1;
   }
-  if (picture == nullptr) return 0;  // nothing new, or a buffer the card does not have
+  if (picture == nullptr) return 0;  // no new picture, or an unknown buffer
   UpDataYUVScreen(picture, length);
   return 1;
 }
 
-// Pictures follow each other in steady steps; after each caption the steps start from that moment.
+// Shows a picture every `period` milliseconds and the frame rate every second. The first picture after a new
+// frame rate starts a new sequence of periods.
 void show_pictures(u32 period) {
   const u32 start = now_ms();
   u32 next_due = start + period;
@@ -119,7 +122,7 @@ void *videothread(void *) {
 bool start_preview_thread() {
   stop_preview_thread();
   join_preview_thread();
-  // Set before the thread exists, so that a stop that comes at once is not lost.
+  // Set the flag before the thread exists, so that an immediate stop is not lost.
   set_video_enable(1);
   if (pthread_create(&thread, nullptr, videothread, nullptr) != 0) return false;
   thread_exists = true;

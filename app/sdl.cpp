@@ -1,4 +1,4 @@
-// The preview window, made with SDL 1.2.
+// The preview window, with SDL 1.2.
 #include "sdl.h"
 
 #include <SDL.h>
@@ -19,9 +19,9 @@ SDL_Event event;
 namespace {
 
 constexpr int kBitsPerPixel = 24;
-constexpr std::size_t kBytesPerPixel = 2;  // of a UYVY picture
+constexpr std::size_t kBytesPerPixel = 2;  // in a UYVY picture
 
-// Rows of the overlay may be padded; rows of a picture never are.
+// Copies a picture into the overlay. The rows of the overlay may have padding; those of a picture have none.
 void copy_into_overlay(const unsigned char *picture, std::size_t length) {
   const std::size_t row = static_cast<std::size_t>(overlay->w) * kBytesPerPixel;
   const std::size_t pitch = overlay->pitches[0];
@@ -39,8 +39,9 @@ void copy_into_overlay(const unsigned char *picture, std::size_t length) {
   }
 }
 
-// SDL turns the signals that end a program into events, and nobody reads its events here: Ctrl-C would
-// do nothing while the preview runs. It catches those of a crash as well, which would hide what crashed.
+// Initialises SDL and restores the signal handlers that it replaces. SDL turns SIGINT and similar signals
+// into events, which this program does not read: Ctrl-C would have no effect during a preview. SDL also
+// catches the signals of a crash, which would hide its cause.
 int init_without_signals() {
   constexpr int kSignals[] = {SIGINT, SIGTERM, SIGQUIT, SIGALRM, SIGSEGV, SIGBUS, SIGFPE};
   struct sigaction before[std::size(kSignals)];
@@ -53,7 +54,7 @@ int init_without_signals() {
 }  // namespace
 
 void set_overlay_environment() {
-  // putenv() keeps the strings themselves.
+  // putenv() does not copy the strings, so they are static.
   static char direct[] = "SDL_VIDEO_YUV_DIRECT=1";
   static char accelerated[] = "SDL_VIDEO_YUV_HWACCEL=1";
   putenv(direct);
@@ -87,8 +88,7 @@ void UpDataYUVScreen(unsigned char *picture, int length) {
     SDL_UnlockYUVOverlay(overlay);
   }
   SDL_DisplayYUVOverlay(overlay, &video_rect);
-  // Nobody asks for the events, yet the window manager wants them answered. A request to close the
-  // window waits in SDL's queue without effect.
+  // Let SDL reply to the window manager. A request to close the window stays in SDL's queue, without effect.
   SDL_PumpEvents();
 }
 

@@ -1,6 +1,6 @@
 /**
  * @file card.h
- * What every example needs: an open card that closes itself, and SDK statuses turned into exceptions.
+ * Helpers for all examples: an open card that closes itself, and exceptions for failed SDK calls.
  */
 #ifndef CARD_H
 #define CARD_H
@@ -10,11 +10,11 @@
 
 #include "zv_lib.h"
 
-/// What a status means, in words for the person at the keyboard.
+/// Returns the meaning of a status as a text for the user.
 inline const char *status_text(int status) {
   switch (status) {
     case ZV_ERR_OPEN:
-      return "no device node could be opened; is the driver loaded, or the virtual card in front?";
+      return "a device node could not be opened; load the driver or preload the virtual card";
     case ZV_ERR_ALREADY_OPEN:
       return "a card is already open in this process";
     case ZV_ERR_NO_MEMORY:
@@ -34,17 +34,17 @@ inline const char *status_text(int status) {
     case ZV_ERR_THREAD_CREATE:
       return "a thread could not be created";
     case ZV_ERR_THREAD_JOIN:
-      return "a thread could not be ended";
+      return "a thread could not be joined";
     case ZV_ERR_CLOSE:
       return "a device node could not be closed";
     case ZV_ERR_DEVICE:
-      return "the card refused or did not answer";
+      return "the driver or the card refused or did not reply";
     default:
       return "unknown status";
   }
 }
 
-/// Throws when an SDK call has failed: "zv_Open failed with status 1: no device node ...".
+/// Throws if an SDK call has failed, for example "zv_Open failed with status 1: a device node ...".
 inline void check(int status, const char *call) {
   if (status != ZV_OK) {
     throw std::runtime_error(std::string(call) + " failed with status " + std::to_string(status) + ": " +
@@ -52,7 +52,7 @@ inline void check(int status, const char *call) {
   }
 }
 
-/// An open card. A capture that still runs is stopped before the card is closed.
+/// An open card. The destructor stops a capture that still runs and closes the card.
 struct Card {
   HANDLE handle = nullptr;
 

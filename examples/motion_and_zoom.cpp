@@ -1,9 +1,9 @@
 /**
  * @file motion_and_zoom.cpp
- * Motion tags in the flags of the callback, and picture-in-picture and zoom on the preview picture,
- * saved as PPM files.
+ * Counts the frames that the callback gets with the motion flag, and saves preview pictures with
+ * picture-in-picture and zoom as PPM files.
  *
- * Usage: zarvo_motion [DIR]     the pictures go to DIR, by default the working directory
+ * Usage: zarvo_motion [DIR]     saves the pictures in DIR, by default the working directory
  */
 #include <algorithm>
 #include <array>
@@ -35,7 +35,7 @@ void on_frame(u32 channel, u8 *, i32, i32 flags) {
   ++tags[channel].frames;
 }
 
-/// Calls `done` every few milliseconds until it says true. Throws after ten seconds.
+/// Calls `done` every few milliseconds until it returns true. Throws after ten seconds.
 template <typename Done>
 void wait_for(const char *what, Done done) {
   const auto latest = std::chrono::steady_clock::now() + std::chrono::seconds(10);
@@ -73,7 +73,7 @@ u8 clip(double value) {
   return static_cast<u8>(std::clamp(value, 0.0, 255.0));
 }
 
-/// Saves a packed UYVY picture as PPM (ITU-R BT.601).
+/// Converts a packed UYVY picture (ITU-R BT.601) to PPM and saves it.
 void save_ppm(const u8 *picture, const std::filesystem::path &path) {
   std::ofstream out(path, std::ios::binary);
   out << "P6\n" << kWidth << ' ' << kHeight << "\n255\n";
@@ -91,17 +91,18 @@ void save_ppm(const u8 *picture, const std::filesystem::path &path) {
   std::printf("saved %s\n", path.c_str());
 }
 
-/// Saves the preview as it looks now. Pictures that the card may have composed before the last change are
-/// let pass. Each new one comes in another of the card's buffers.
+/// Saves the current preview picture. Skips pictures that the card may have composed before the last
+/// change. A new picture is recognised by its address: the card never composes into the buffer that was
+/// read last.
 void save_preview(HANDLE card, const std::filesystem::path &path) {
-  constexpr int kLetPass = 6;
+  constexpr int kSkip = 6;
   u8 *picture = nullptr;
   int pictures = 0;
   wait_for("preview picture", [&] {
     const u8 *const before = picture;
     if (zv_GetPreviewScreen(card, &picture) == static_cast<int>(kWidth * kHeight * 2))
       pictures += picture != before;
-    return pictures > kLetPass;
+    return pictures > kSkip;
   });
   save_ppm(picture, path);
 }

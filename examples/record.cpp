@@ -1,7 +1,7 @@
 /**
  * @file record.cpp
- * A headless recorder, and the shortest complete use of the SDK: open the card, configure channels,
- * register a callback for each kind of stream, start, wait, stop, close.
+ * Records channels of the card without a window. It shows the shortest complete use of the SDK: open the
+ * card, configure channels, register a callback for each kind of stream, start, wait, stop, close.
  */
 #include <signal.h>
 
@@ -22,7 +22,8 @@ namespace {
 
 using Clock = std::chrono::steady_clock;
 
-/// One file. Written by the one SDK thread that delivers its stream, read by main after zv_Stop().
+/// A file and its counters. One SDK thread delivers the stream and writes them; the main thread reads them
+/// after zv_Stop().
 struct Stream {
   std::string path;
   FILE *file = nullptr;
@@ -33,7 +34,7 @@ std::array<Stream, ZV_AUDIO_CHANNELS> audio;
 std::atomic<int> write_error{0};  // errno of a write that failed on an SDK thread
 std::atomic<bool> interrupted{false};
 
-// --- The SDK calls these, on threads of its own
+// --- Callbacks: the SDK calls them on its own threads
 
 void append(Stream &stream, const u8 *data, i32 length) {
   if (!stream.file) return;
@@ -70,7 +71,7 @@ void open_files(std::array<Stream, count> &streams, u32 mask, const RecordOption
   }
 }
 
-/// Closes the files and prints a line for each. Bytes still in a buffer may fail only now.
+/// Closes the files and prints a line for each. fclose() writes the rest of the buffer, so it can fail too.
 template <std::size_t count>
 void close_files(std::array<Stream, count> &streams, double seconds) {
   constexpr bool is_video = count == ZV_CHANNELS;
@@ -94,7 +95,7 @@ void configure(HANDLE card, const RecordOptions &options) {
   config.scale = options.scale;
   config.gop = options.standard == VIDEO_STANDARD_ZV_NTSC ? 30 : 25;
   config.qp = 6;
-  config.interval = INTERVAL_ZV_30FPS_NTSC;  // code 0: the full rate of either standard
+  config.interval = INTERVAL_ZV_30FPS_NTSC;  // code 0 is the full rate of both standards
   config.jpeg_qp = JPEG_QP_ZV_HIGH;
   for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) {
     if (!(options.channels >> channel & 1u)) continue;
@@ -109,8 +110,8 @@ void on_signal(int) {
   interrupted = true;
 }
 
-/// From here on Ctrl-C and a polite kill end the recording. A second one ends the program, in case the
-/// card hangs; so does the first one while the card is being opened.
+/// After this call a SIGINT or SIGTERM ends the recording; the same signal again ends the program, in case
+/// the card hangs. Before this call, while the card is being opened, the first signal ends the program.
 void catch_signals() {
   struct sigaction action {};
   action.sa_handler = on_signal;
@@ -119,7 +120,8 @@ void catch_signals() {
   sigaction(SIGTERM, &action, nullptr);
 }
 
-/// Returns when the time is over, a signal has come or a write has failed; the seconds that have passed.
+/// Waits until the time is over, a signal has come or a write has failed. Returns the seconds that have
+/// passed.
 double wait_for_end(unsigned seconds) {
   const auto start = Clock::now();
   const auto end = start + std::chrono::seconds(seconds);
@@ -138,7 +140,7 @@ void record(const RecordOptions &options) {
   open_files(video, options.channels, options, mpeg4 ? "ch%02u.m4v" : "ch%02u.mjpeg");
   open_files(audio, options.audio, options, "audio%u.g726");
 
-  // The card encodes each channel with both codecs; a null callback leaves the other one out.
+  // The card encodes each channel with both codecs; a null callback discards the other codec's frames.
   check(zv_RegisterCallBack(card.handle, mpeg4 ? on_video : nullptr, mpeg4 ? nullptr : on_video, on_audio),
         "zv_RegisterCallBack");
   catch_signals();

@@ -1,3 +1,4 @@
+// Parses the command line of zarvo_record.
 #include "record_options.h"
 
 #include <getopt.h>
@@ -29,7 +30,7 @@ const std::map<std::string, ZV_VIDEO_CODEC> kCodecs = {{"mpeg4", VIDEO_CODEC_ZV_
                                                        {"mjpeg", VIDEO_CODEC_ZV_MJPEG}};
 const std::map<std::string, ZV_VIDEO_STANDARD> kStandards = {{"ntsc", VIDEO_STANDARD_ZV_NTSC},
                                                              {"pal", VIDEO_STANDARD_ZV_PAL}};
-/// The first channels of each size that the card's frame-rate budget holds at the full rate.
+/// By picture size: the mask of the first channels, as many as the frame-rate budget allows at the full rate.
 const std::map<ZV_SCALE_VALUE, u32> kBudget = {
     {SCALE_ZV_CIF, 0xFFFF}, {SCALE_ZV_HALF_D1, 0xFF}, {SCALE_ZV_D1, 0xF}};
 
@@ -43,7 +44,7 @@ unsigned parse_number(const std::string &option, const std::string &text, unsign
   return number;
 }
 
-/// "1,3,5-8" to a mask with bit 0 for number 1.
+/// Converts a list such as "1,3,5-8" to a mask with bit 0 for number 1.
 u32 parse_list(const std::string &option, const std::string &text, unsigned highest) {
   u32 mask = 0;
   for (std::size_t at = 0, comma = 0; comma != std::string::npos; at = comma + 1) {
@@ -111,7 +112,7 @@ RecordOptions parse_options(int argc, char **argv) {
         std::fputs(kHelp, stdout);
         std::exit(0);
       default:
-        throw UsageError("see --help for the options");  // getopt_long has named the culprit
+        throw UsageError("see --help for the options");  // getopt_long has printed the wrong option
     }
   }
   if (optind < argc) throw UsageError(std::string("'") + argv[optind] + "' is not an option; see --help");

@@ -20,12 +20,12 @@ struct RecordOptions {
   std::filesystem::path output = "recordings";
 };
 
-/// A command line that makes no sense; what() says what is wrong and what is possible.
+/// Thrown for a wrong command line; what() says what is wrong and what is possible.
 struct UsageError : std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
-/// Prints the help and ends the program when asked for it. Throws UsageError.
+/// Parses the command line. For --help prints the help and ends the program. Throws UsageError.
 RecordOptions parse_options(int argc, char **argv);
 
 #endif

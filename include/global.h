@@ -5,7 +5,7 @@
 #ifndef GLOBAL_H
 #define GLOBAL_H
 
-/** What DemoDialog::UpdateUI() is told: the activity that has just started or stopped. */
+/** The activity that has just started or stopped; the argument of DemoDialog::UpdateUI(). */
 enum UI_STATUS {
   PREVIEW_START = 0,
   PREVIEW_STOP = 1,
@@ -17,14 +17,14 @@ enum UI_STATUS {
   MOTION_STOP = 7
 };
 
-/** What the sixteen channel check boxes show and edit. */
+/** The channel set that the sixteen channel check boxes show and edit. */
 enum CHANNEL_SETTING_MODE {
-  ENABLE_PREVIEW = 0, /**< the previewed channels */
-  ENABLE_AUDIO = 1,   /**< the recorded audio inputs, boxes 1 to 4 */
-  ENABLE_RECORD = 2,  /**< the recorded channels */
+  ENABLE_PREVIEW = 0, /**< the channels in the preview */
+  ENABLE_AUDIO = 1,   /**< the audio inputs to record, boxes 1 to 4 */
+  ENABLE_RECORD = 2,  /**< the channels to record */
   VIDEO_STATUS = 3,   /**< the last video-loss status, read only */
   MOTION_STATUS = 4,  /**< the last motion status, read only */
-  INITIAL_CASE = 5    /**< nothing; a click changes nothing */
+  INITIAL_CASE = 5    /**< no set; a click changes nothing */
 };
 
 #endif

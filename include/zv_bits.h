@@ -1,8 +1,7 @@
 /**
  * @file zv_bits.h
- * Helpers for register values, and a delay that does not sleep.
- *
- * Context of all: any thread, any state. The bit helpers never fail and never block.
+ * Helpers for the bits of register values, and a delay that does not sleep. They need no open card and
+ * never fail.
  */
 #ifndef ZV_BITS_H
 #define ZV_BITS_H
@@ -25,11 +24,11 @@ extern "C" {
 u32 mask_bit(u32 value, u32 mask);
 
 /**
- * Picks bits out.
+ * Keeps some bits.
  *
  * @param value  a register's content
  * @param mask   the bits to keep
- * @return the bits of @p value that @p mask has
+ * @return @p value with all bits outside @p mask cleared
  *
  * Context: any thread; any state. Does not block.
  */
@@ -47,11 +46,11 @@ u32 get_bit(u32 value, u32 mask);
 u32 set_bit(u32 value, u32 mask);
 
 /**
- * Puts bits back.
+ * Puts saved bits back.
  *
  * @param value  a register's content
  * @param mask   the bits to replace
- * @param saved  what get_bit() gave for @p mask earlier; other bits of it must be 0
+ * @param saved  an earlier result of get_bit() for @p mask; its other bits must be 0
  * @return @p value with the bits of @p mask taken from @p saved
  *
  * Context: any thread; any state. Does not block.
@@ -59,11 +58,11 @@ u32 set_bit(u32 value, u32 mask);
 u32 restore_bit(u32 value, u32 mask, u32 saved);
 
 /**
- * Busy-waits.
+ * Busy-waits: runs in a loop until the time has passed.
  *
- * @param us  microseconds of wall-clock time that pass at least
+ * @param us  the shortest wait, in microseconds of wall-clock time
  *
- * Context: any thread; any state. Does not sleep: the caller keeps its processor all the time.
+ * Context: any thread; any state. Blocks for @p us microseconds without sleeping.
  */
 void zv_delay(u32 us);
 

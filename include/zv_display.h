@@ -2,10 +2,10 @@
  * @file zv_display.h
  * The preview picture in detail: layouts, single windows, picture-in-picture and zoom.
  *
- * The functions work on the display state inside an open card, which zv_display_open() hands out and
- * which lives until zv_Close(). Those with a result answer -1 for a refusal, which changes nothing, and for
- * a null display. Zoom and picture-in-picture need the 1-picture layout and exclude each other; while either
- * is on, the layout is frozen.
+ * The functions work on the display state of an open card. zv_display_open() returns a pointer to it, which
+ * is valid until zv_Close(). Functions that return an int return -1 when they refuse (nothing changes) and
+ * for a null display. Zoom and picture-in-picture need the 1-picture layout and exclude each other; while
+ * either is on, the layout cannot change.
  */
 #ifndef ZV_DISPLAY_H
 #define ZV_DISPLAY_H
@@ -17,19 +17,20 @@ extern "C" {
 #endif
 
 /**
- * Reads the display size, frames the screen, turns zoom off and applies a layout. Zoom goes off in
- * the 1-picture layout only.
+ * Reads the display size, draws the frame around the screen and applies a layout. Turns zoom off only when
+ * @p mode is the 1-picture layout and no picture-in-picture is on. While a picture-in-picture is on or zoom
+ * stays on, only stores @p mode: the windows keep the places they had.
  *
  * @param handle  the open card
  * @param mode    a ZV_VIDEO_MODE, 0-5
- * @return the display state, the card's own; null for a bad handle or mode
+ * @return the display state, owned by the card; null for a bad handle or a mode above 5
  *
  * Context: control thread; open or capturing. Does not block.
  */
 ZV_DISPLAY *zv_display_open(HANDLE handle, u32 mode);
 
 /**
- * Does nothing: the display state goes with the card.
+ * Does nothing: zv_Close() frees the display state.
  *
  * @param display  a display state or null
  *
@@ -38,34 +39,34 @@ ZV_DISPLAY *zv_display_open(HANDLE handle, u32 mode);
 void zv_display_close(ZV_DISPLAY *display);
 
 /**
- * Lays the windows out.
+ * Applies a layout: gives every window its place.
  *
  * @param display     the display state
  * @param mode        a ZV_VIDEO_MODE, 0-5
  * @param resolution  the ZV_RESOLUTION of the inputs; other values count as 704 pixels
- * @return 0; -1 while zoom or picture-in-picture is on, or for a bad mode
+ * @return 0; -1 while zoom or a picture-in-picture is on, or for a mode above 5
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_display_mux_mode(ZV_DISPLAY *display, u32 mode, u32 resolution);
 
 /**
- * Shows one channel on the whole display; the layout is the 1-picture layout then.
+ * Shows one channel on the whole display and makes the 1-picture layout the stored mode.
  *
  * @param display  the display state
- * @param channel  0-15; with another number the display is empty
- * @return 0; -1 while zoom or picture-in-picture is on
+ * @param channel  0-15; any other number hides all windows
+ * @return 0; -1 while zoom or a picture-in-picture is on
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_display_select_channel(ZV_DISPLAY *display, u32 channel);
 
 /**
- * Replaces the flags of a window.
+ * Replaces all flags of a window.
  *
  * @param display  the display state
  * @param window   0-15
- * @param flags    ZV_WINDOW_ENABLED, ZV_WINDOW_PIP
+ * @param flags    the new flags: ZV_WINDOW_ENABLED, ZV_WINDOW_PIP, both or 0
  * @return the driver's result, 0 on success; -1 for a window above 15
  *
  * Context: control thread; open or capturing. Does not block.
@@ -73,13 +74,13 @@ int zv_display_select_channel(ZV_DISPLAY *display, u32 channel);
 int zv_display_channel_mode(ZV_DISPLAY *display, u32 window, u32 flags);
 
 /**
- * Tells which channel is shown at a point. With a picture-in-picture on, it is that channel at any
- * point.
+ * Returns the channel shown at a point of the display. While a picture-in-picture is on, its channel is
+ * returned for every point.
  *
  * @param display  the display state
  * @param x        pixels from the left
  * @param y        lines from the top
- * @return a channel, 0-15; -1 where no window is
+ * @return a channel, 0-15; -1 when no window contains the point
  *
  * Context: control thread; open or capturing. Does not block.
  */
@@ -97,36 +98,36 @@ int zv_display_pos2channel(ZV_DISPLAY *display, u32 x, u32 y);
 int zv_display_motion_trace(ZV_DISPLAY *display, u32 on);
 
 /**
- * Magnifies a region of the picture.
+ * Magnifies a part of the picture.
  *
  * @param display  the display state
- * @param level    0 is off; what the others magnify, and which of them it refuses, is the card's affair
- * @param x        left edge of the region, pixels; kept between 0 and half the display
- * @param y        top edge of the region, lines; kept between 0 and half the display
- * @return the driver's result, 0 on success; -1 outside the 1-picture layout or with a
- *         picture-in-picture on
+ * @param level    0 turns zoom off; the card decides what other levels do and which it rejects
+ * @param x        left edge of the part, pixels; clamped to 0 ... half the display width
+ * @param y        top edge of the part, lines; clamped to 0 ... half the display height
+ * @return the driver's result, 0 on success; -1 outside the 1-picture layout or while a
+ *         picture-in-picture is on
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_display_zoom(ZV_DISPLAY *display, u32 level, int x, int y);
 
 /**
- * Shows a channel in a small window, a third of the display wide and high, or takes it away. A
- * second channel leaves the first on screen until the next layout.
+ * Shows a channel in a small window, a third of the display wide and high, or removes that window. If
+ * another channel is already shown as picture-in-picture, it stays on screen until a layout is applied.
  *
  * @param display  the display state
- * @param channel  0-15, one that is not shown; -1 takes the picture-in-picture away
- * @param x        left edge, pixels; kept on the display and rounded down to a multiple of 8
- * @param y        top edge, lines; the same
- * @return 0; -1 outside the 1-picture layout, with zoom on, for a channel already shown or unknown,
- *         or with nothing to take away
+ * @param channel  0-15, a channel that is not shown; -1 removes the picture-in-picture
+ * @param x        left edge, pixels; clamped so that the window fits, and rounded down to a multiple of 8
+ * @param y        top edge, lines; clamped and rounded in the same way
+ * @return 0; -1 outside the 1-picture layout, while zoom is on, for a channel that is already shown or
+ *         does not exist, or when there is no picture-in-picture to remove
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_display_pip(ZV_DISPLAY *display, int channel, u32 x, u32 y);
 
 /**
- * Moves the picture-in-picture; it stays on the display, at multiples of 8.
+ * Moves the picture-in-picture. Its position is clamped and rounded as in zv_display_pip().
  *
  * @param display  the display state
  * @param dx       pixels to the right, any int

@@ -2,18 +2,19 @@
  * @file zv_lib.h
  * The Zarvo Capture SDK: a card with 16 video channels and 4 audio inputs.
  *
- * Order of use: zv_Open(); zv_RegisterCallBack(), zv_SetVideoStandard(), zv_SetResolution(); for a
- * recording zv_SetVideoEncodeConfig() per channel, zv_EnableVideoRecordChannels(),
+ * Order of use: zv_Open(), zv_RegisterCallBack(), zv_SetVideoStandard(), zv_SetResolution(); for a
+ * recording zv_SetVideoEncodeConfig() for each channel, zv_EnableVideoRecordChannels(),
  * zv_EnableAudioChannels(), zv_Start(), zv_Stop(); at the end zv_Close().
  *
- * One card is open per process. A function with an int result answers ZV_OK or one of the statuses
- * named with it; on an error nothing has changed unless its comment says so. A function with a
- * status answers ZV_ERR_PARAM for a handle that is null, dead or not from zv_Open(), unless its comment
- * says otherwise, and for a null pointer where it needs a record. Channel masks have bit n for channel n.
+ * A process has one card open at a time. A function that returns an int returns ZV_OK or one of the
+ * statuses that its comment lists; when it fails, it changes nothing unless its comment says otherwise. A
+ * function that returns a status returns ZV_ERR_PARAM for a bad handle (null, closed, or not from
+ * zv_Open()), unless its comment says otherwise, and for a null record pointer. Bit n of a channel mask
+ * is channel n.
  *
- * The "Context" of a function tells which thread may call it, in which state, and whether it blocks.
- * The words used there (control thread, closed, open, capturing, blocks) are explained in
- * docs/threading.md.
+ * The "Context" of a function names the threads that may call it, the states it is allowed in, and
+ * whether it blocks. docs/threading.md explains the words that it uses (control thread, any thread,
+ * closed, open, capturing, blocks).
  */
 #ifndef ZV_LIB_H
 #define ZV_LIB_H
@@ -25,75 +26,85 @@ extern "C" {
 #endif
 
 /**
- * Opens the card and brings it into a known state: NTSC, 720 pixels, one preview picture, neutral
- * picture properties, motion detection off, no channel encoded.
+ * Opens the card and switches its motion detection off. The SDK starts with NTSC, 720 pixels, the
+ * 1-picture layout and no channel enabled; zv_SetVideoStandard() and zv_SetResolution() send standard
+ * and width to the card. Picture properties, privacy masks and motion thresholds stay as the card has
+ * them.
  *
- * @param handle  receives the handle; written on success only
+ * @param handle  receives the handle; written only on success
  * @return ZV_OK; ZV_ERR_PARAM for a null @p handle; ZV_ERR_OPEN when a device node is missing or
- *         refused; ZV_ERR_ALREADY_OPEN; ZV_ERR_NO_MEMORY when a buffer or mapping is not to be had,
- *         with "Zarvo SDK: Open Error! Error Code = 3." printed
+ *         cannot be opened; ZV_ERR_ALREADY_OPEN when this process has a card open; ZV_ERR_NO_MEMORY when
+ *         a buffer or mapping cannot be allocated: prints "Zarvo SDK: Open Error! Error Code = 3."
  *
  * Context: control thread; closed. Does not block.
  */
 int zv_Open(HANDLE *handle);
 
 /**
- * Closes the card and releases everything; the handle is dead afterwards. Turns the preview and
- * motion detection off. Call zv_Stop() and zv_DisableWatchDog() before; threads that still run are
- * ended first, but no stop command is sent for them to the encoder.
+ * Closes the card and releases all memory; the handle is invalid afterwards. Turns the preview and
+ * motion detection off. Call zv_Stop() and zv_DisableWatchDog() before. Threads that still run are ended
+ * first, but the encoder gets no stop command.
  *
- * @param handle  the open card; anything when no card is open, which is no error
- * @return ZV_OK, also when no card is open; ZV_ERR_PARAM for another handle while a card is open;
- *         ZV_ERR_CLOSE when closing a device node failed, or when called from a callback: the card
- *         then still counts as open, and another zv_Close() goes on with the nodes that are left
+ * @param handle  the open card; ignored when no card is open
+ * @return ZV_OK, also when no card is open; ZV_ERR_PARAM for a bad handle while a card is open;
+ *         ZV_ERR_CLOSE when a device node cannot be closed, or when called from a callback: capture and
+ *         watchdog have ended, the card still counts as open, and another zv_Close() closes the
+ *         remaining nodes
  *
- * Context: control thread; open or closed, not capturing, watchdog off. Blocks for the threads that
- * are still there.
+ * Context: control thread; closed or open, not capturing, watchdog off. Blocks until the threads that
+ * still run have ended.
  */
 int zv_Close(HANDLE handle);
 
 /**
- * Sets who receives encoded data. A null callback means: read and thrown away.
+ * Sets the functions that receive encoded data. For a null callback the SDK reads the data and discards
+ * it.
  *
  * @param handle  the open card
  * @param mpeg4   receives MPEG-4 frames; an intra frame begins with its 20-byte stream header
- * @param mjpeg   receives Motion-JPEG pictures, each a complete JPEG file
+ * @param mjpeg   receives Motion-JPEG pictures, each a complete JPEG file. The data end at the last byte
+ *                0xD9 that the card delivered, normally the end of the EOI marker; a picture without an
+ *                EOI can therefore end early at a stray 0xD9, and without any 0xD9 it is discarded
  * @param audio   receives 48-byte audio blocks of the enabled inputs
- * @return ZV_OK; ZV_ERR_PARAM
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle
  *
- * Context: control thread; open or capturing: the next frame goes to the new callback, a call of the
- * old one may still be running. Does not block.
+ * Context: control thread; open or capturing. While capturing, the next frame goes to the new callback,
+ * but a call of the old callback may still be running. Does not block.
  */
 int zv_RegisterCallBack(HANDLE handle, ZV_STREAM_CALLBACK mpeg4, ZV_STREAM_CALLBACK mjpeg,
                         ZV_STREAM_CALLBACK audio);
 
 /**
- * Starts capture: frames and audio blocks of the enabled channels reach the callbacks.
+ * Starts capture: the callbacks receive frames and audio blocks of the enabled channels.
  *
  * @param handle  the open card
- * @return ZV_OK, also when already capturing; ZV_ERR_PARAM; ZV_ERR_CONFIG when zv_CheckVideoEncodeConfig()
- *         refuses the stored settings; ZV_ERR_THREAD_CREATE after "Zarvo SDK: Start Error!
- *         Error Code = 12." and a full zv_Stop(), which wipes the encoder settings
+ * @return ZV_OK, also when already capturing; ZV_ERR_PARAM for a bad handle; ZV_ERR_CONFIG when
+ *         zv_CheckVideoEncodeConfig() refuses the stored settings; ZV_ERR_THREAD_CREATE when a thread
+ *         cannot be created: prints "Zarvo SDK: Start Error! Error Code = 12." and does all of zv_Stop(),
+ *         which wipes the encoder settings
  *
- * Context: control thread, not from a callback; open or capturing. Blocks for about a millisecond.
+ * Context: control thread, not from a callback; open or capturing. Blocks about 1 ms; if a callback has
+ * called zv_Stop(), also until that callback returns.
  */
 int zv_Start(HANDLE handle);
 
 /**
  * Stops capture. Disables all channels and audio inputs and wipes the encoder settings of all
- * channels: store them again before the next zv_Start(). No callback runs after it has returned.
+ * channels: store them again before the next zv_Start(). After it has returned ZV_OK, no callback runs.
  *
- * @param handle  the open card; anything when not capturing, which is no error
- * @return ZV_OK, also when not capturing; ZV_ERR_PARAM; ZV_ERR_THREAD_JOIN when a capture thread
- *         could not be joined, as when called from a callback
+ * @param handle  the open card; ignored when not capturing
+ * @return ZV_OK, also when not capturing; ZV_ERR_PARAM for a bad handle while capturing;
+ *         ZV_ERR_THREAD_JOIN when a capture thread cannot be joined, for example when called from a
+ *         callback: capture has stopped and the settings are wiped all the same; the next zv_Start() or
+ *         zv_Close() joins the thread
  *
- * Context: control thread, not from a callback; any state. Blocks for about 30 milliseconds and
- * until a running callback returns: take no lock here that a callback waits for.
+ * Context: control thread, not from a callback; any state. Blocks about 30 ms plus the rest of a running
+ * callback: do not hold a lock that a callback may wait for.
  */
 int zv_Stop(HANDLE handle);
 
 /**
- * Tells the input width.
+ * Returns the input width.
  *
  * @param handle  the open card
  * @return a ZV_RESOLUTION; 0 for a bad handle
@@ -103,18 +114,19 @@ int zv_Stop(HANDLE handle);
 u32 zv_GetResolution(HANDLE handle);
 
 /**
- * Sets the input width, sends the current standard again and lays the preview out anew.
+ * Sets the input width. Sends the current video standard again, as zv_SetVideoStandard() does, and
+ * applies the preview mode to the new width, as zv_SetPreviewMode() does.
  *
  * @param handle      the open card
  * @param resolution  a ZV_RESOLUTION, 0 or 1
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_RESOLUTION
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_RESOLUTION for another @p resolution
  *
  * Context: control thread; open. Does not block.
  */
 int zv_SetResolution(HANDLE handle, u32 resolution);
 
 /**
- * Tells the video standard.
+ * Returns the video standard.
  *
  * @param handle  the open card
  * @return a ZV_VIDEO_STANDARD; 0 for a bad handle
@@ -124,120 +136,127 @@ int zv_SetResolution(HANDLE handle, u32 resolution);
 u32 zv_GetVideoStandard(HANDLE handle);
 
 /**
- * Sets the video standard of inputs, encoder and display. A display that is running is opened again
- * with the new size, its zoom off and its layout applied.
+ * Sets the video standard of inputs, encoder and display. If the display is running (from the first
+ * zv_Start() at the latest), opens it again as zv_display_open() does: reads the new size, turns zoom
+ * off and applies the stored preview mode. While a picture-in-picture is on, or zoom is on and the
+ * stored mode is not the 1-picture layout, zoom stays as it is and the stored mode is not applied: the
+ * windows keep the places they had.
  *
  * @param handle    the open card
  * @param standard  a ZV_VIDEO_STANDARD, 0 or 1
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_STANDARD
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_STANDARD for another @p standard
  *
  * Context: control thread; open. Does not block.
  */
 int zv_SetVideoStandard(HANDLE handle, u32 standard);
 
 /**
- * Chooses the display windows of the preview and turns its output on, or off for mask 0. Bit n is
- * window n, which shows channel n unless the focus channel was moved. Ends the mark, though not the
- * picture, of a picture-in-picture.
+ * Enables exactly the preview windows of @p mask and turns the preview output on; mask 0 turns the
+ * output off. Bit n is window n, which shows channel n unless zv_SetFocusChannel() has swapped it.
+ * Clears ZV_WINDOW_PIP on a picture-in-picture window; the window stays on screen.
  *
  * @param handle  the open card
  * @param mask    windows, bits 0-15
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL when a bit above 15 is set
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL when a bit above 15 is set
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_EnablePreviewChannels(HANDLE handle, u32 mask);
 
 /**
- * Fetches the newest preview picture, packed UYVY.
+ * Reads the newest preview picture, packed UYVY.
  *
  * @param handle   the open card
- * @param picture  receives the picture, which stays the card's and is overwritten in time; left
- *                 alone unless there is one: a result from 1 to 0x240000 and a buffer the SDK knows
- * @return what the driver's read returned: bytes of the picture, 0 for none yet, negative on failure;
- *         -1 for a bad handle or a null @p picture
+ * @param picture  receives a pointer into the card's buffer, valid until the card overwrites it; set
+ *                 only when the result is 1 to 0x240000 and the driver named a known buffer
+ * @return the result of the driver's read: bytes of the picture, 0 when there is none yet, negative on
+ *         failure; -1 for a bad handle or a null @p picture
  *
- * Context: any thread; open or capturing. Blocks as long as the driver's read takes, longer
- * while another thread is in it.
+ * Context: any thread; open or capturing. Blocks for the driver's read, and while another thread is
+ * inside this function.
  */
 int zv_GetPreviewScreen(HANDLE handle, u8 **picture);
 
 /**
- * Copies a channel's stored encoder settings out.
+ * Copies a channel's stored encoder settings into @p config.
  *
  * @param handle   the open card
  * @param channel  0-15
  * @param config   receives the settings
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle or a null @p config; ZV_ERR_CHANNEL for a channel above 15
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_GetVideoEncodeConfig(HANDLE handle, u32 channel, ZV_VIDEO_CONFIG *config);
 
 /**
- * Stores a channel's encoder settings. The card gets them from zv_EnableVideoRecordChannels().
+ * Stores a channel's encoder settings. zv_EnableVideoRecordChannels() sends them to the card.
  *
  * @param handle   the open card
  * @param channel  0-15
  * @param config   the settings; stored even when ZV_ERR_CONFIG is returned
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL; ZV_ERR_CONFIG when `enable` is set without a scale
- *         (a line is printed) or two-field mode is asked for at another interval than 0
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle or a null @p config; ZV_ERR_CHANNEL for a channel above
+ *         15; ZV_ERR_CONFIG when `enable` is set without a scale (prints a line), or when two-field mode
+ *         is set with an interval other than 0
  *
  * Context: control thread; open. Does not block.
  */
 int zv_SetVideoEncodeConfig(HANDLE handle, u32 channel, const ZV_VIDEO_CONFIG *config);
 
 /**
- * Checks all stored settings against the card's budget: sixteen CIF channels at the full rate, where
- * a half-D1 picture counts as two and a D1 picture as four, and rates count in whole frames.
+ * Checks the stored settings of all channels, enabled or not, against the card's frame-rate budget:
+ * sixteen CIF channels at the full rate. A half-D1 picture counts as two CIF pictures, a D1 picture as
+ * four; two-field mode counts twice; a rate counts as a whole number of frames a second, rounded down.
  *
  * @param handle  the open card
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CONFIG over budget (a line is printed) or for two-field mode
- *         with D1 or at another interval than 0. A scale outside ZV_SCALE_VALUE is named in a
- *         printed line and weighs nothing
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CONFIG over budget (prints a line), or for
+ *         two-field mode with D1 or with an interval other than 0. A scale outside ZV_SCALE_VALUE prints
+ *         a line and counts as 0
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_CheckVideoEncodeConfig(HANDLE handle);
 
 /**
- * Enables exactly the channels of @p mask for encoding, checks the budget and sends all settings to
- * the card. The settings of the other channels are wiped.
+ * Enables exactly the channels of @p mask for encoding, wipes the settings of the other channels, checks
+ * the budget and sends the settings of all channels to the card.
  *
  * @param handle  the open card
  * @param mask    channels, bits 0-15
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL when a bit above 15 is set; ZV_ERR_CONFIG when a
- *         channel of the mask has no scale (a line is printed) or zv_CheckVideoEncodeConfig()
- *         refuses: nothing is sent, but the stored settings stay as changed so far
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL when a bit above 15 is set; ZV_ERR_CONFIG
+ *         when a channel of the mask has no scale (prints a line) or zv_CheckVideoEncodeConfig()
+ *         refuses: nothing is sent; `enable` stays set and other channels stay wiped, up to the channel
+ *         that has no scale
  *
- * Context: control thread; open. Blocks for about 10 milliseconds.
+ * Context: control thread; open. Blocks about 10 ms.
  */
 int zv_EnableVideoRecordChannels(HANDLE handle, u32 mask);
 
 /**
- * Enables exactly the audio inputs of @p mask; at once when capturing.
+ * Enables exactly the audio inputs of @p mask. While capturing, this takes effect at the next audio
+ * block.
  *
  * @param handle  the open card
  * @param mask    inputs, bits 0-3
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL when a bit above 3 is set
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL when a bit above 3 is set
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_EnableAudioChannels(HANDLE handle, u32 mask);
 
 /**
- * Tells whether there is such an audio input; audio itself comes through the callback only.
+ * Checks the number of an audio input. Has no other effect: only the callback receives audio.
  *
  * @param handle   the open card
  * @param channel  0-3
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL for an input above 3
  *
  * Context: any thread; open or capturing. Does not block.
  */
 int zv_GetAudioStream(HANDLE handle, u32 channel);
 
 /**
- * Tells the preview layout that was asked for last.
+ * Returns the stored preview mode: the layout that was set last, whether or not it has been applied.
  *
  * @param handle  the open card
  * @return a ZV_VIDEO_MODE; 0 for a bad handle
@@ -247,19 +266,20 @@ int zv_GetAudioStream(HANDLE handle, u32 channel);
 u32 zv_GetPreviewMode(HANDLE handle);
 
 /**
- * Sets the preview layout. While zoom or a picture-in-picture is on, the picture stays as it is and
- * only the mode is stored.
+ * Stores the preview mode and applies its layout. While zoom or a picture-in-picture is on, only stores
+ * the mode: the preview does not change. If the stored mode is then not the 1-picture layout,
+ * zv_display_zoom() and zv_display_pip() refuse, so neither can be turned off until mode 0 is set again.
  *
  * @param handle  the open card
  * @param mode    a ZV_VIDEO_MODE, 0-5
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_MODE
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_MODE for a mode above 5
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_SetPreviewMode(HANDLE handle, u32 mode);
 
 /**
- * Tells which channel is at the first display position, the large one of the 6- and 8-picture
+ * Returns the channel in the first display position, which is the large window of the 6- and 8-picture
  * layouts.
  *
  * @param handle  the open card
@@ -270,11 +290,13 @@ int zv_SetPreviewMode(HANDLE handle, u32 mode);
 u32 zv_GetFocusChannel(HANDLE handle);
 
 /**
- * Swaps a channel into the first display position. The windows follow with the next layout.
+ * Swaps a channel with the channel in the first display position. The routing changes at once, the
+ * window records with the next zv_SetPreviewMode(): the preview shows the swap by then at the latest.
  *
  * @param handle   the open card
  * @param channel  0-15
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL, also when no display position carries the channel
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL for a channel above 15, or when no display
+ *         position shows the channel
  *
  * Context: control thread; open or capturing. Does not block.
  */
@@ -285,7 +307,7 @@ int zv_SetFocusChannel(HANDLE handle, u32 channel);
  *
  * @param handle   the open card
  * @param channel  0-15
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL for a channel above 15
  *
  * Context: control thread; open or capturing. Does not block.
  */
@@ -296,7 +318,7 @@ int zv_EnableVideoChannelNumber(HANDLE handle, u32 channel);
  *
  * @param handle   the open card
  * @param channel  0-15
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL for a channel above 15
  *
  * Context: control thread; open or capturing. Does not block.
  */
@@ -307,8 +329,9 @@ int zv_DisableVideoChannelNumber(HANDLE handle, u32 channel);
  *
  * @param handle    the open card
  * @param channel   0-15
- * @param property  receives user units; a hue between two register steps reads up to 2 degrees off
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL
+ * @param property  receives user units; the hue may differ by 2 degrees from the hue that was set
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle or a null @p property; ZV_ERR_CHANNEL for a channel above
+ *         15
  *
  * Context: control thread; open or capturing. Does not block.
  */
@@ -319,111 +342,120 @@ int zv_GetVideoProperty(HANDLE handle, u32 channel, ZV_VIDEO_PROPERTY *property)
  *
  * @param handle    the open card
  * @param channel   0-15
- * @param property  hue -180 to 180, made even toward zero in this record; saturation and contrast
- *                  0 to 200; brightness -25 to 25
- * @return ZV_OK; ZV_ERR_CHANNEL; ZV_ERR_PARAM, also for a value out of range: nothing is written then
+ * @param property  hue -180 to 180 (the function rounds it toward zero to an even number and writes that
+ *                  back into the record); saturation and contrast 0 to 200; brightness -25 to 25
+ * @return ZV_OK; ZV_ERR_CHANNEL for a channel above 15; ZV_ERR_PARAM for a bad handle, a null
+ *         @p property or a value out of range
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_SetVideoProperty(HANDLE handle, u32 channel, ZV_VIDEO_PROPERTY *property);
 
 /**
- * Tells a channel's motion threshold as last set, or as the card had it when it was opened.
+ * Returns a channel's stored motion threshold: the value set last, or the value the card had in
+ * zv_Open(), 0 if the card did not report one.
  *
  * @param handle       the open card
  * @param channel      0-15
  * @param sensitivity  receives 0-0xFFFF
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle or a null @p sensitivity; ZV_ERR_CHANNEL for a channel
+ *         above 15
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_GetMotionSensitivity(HANDLE handle, u32 channel, u32 *sensitivity);
 
 /**
- * Sets the motion threshold of all blocks of a channel; areas marked before are lost.
+ * Sets the motion threshold of all blocks of a channel. This overwrites the areas that
+ * zv_MarkMotionArea() has excluded.
  *
  * @param handle       the open card
  * @param channel      0-15
  * @param sensitivity  0-0xFFFF; 0xFFFF never reports motion
- * @return ZV_OK; ZV_ERR_CHANNEL; ZV_ERR_PARAM, also for a value out of range; ZV_ERR_NO_MEMORY
- *         without a buffer for the map; ZV_ERR_DEVICE when the driver refused the map. With the last
- *         two the value is stored nevertheless
+ * @return ZV_OK; ZV_ERR_CHANNEL for a channel above 15; ZV_ERR_PARAM for a bad handle or a value out of
+ *         range; ZV_ERR_NO_MEMORY when there is no buffer for the map; ZV_ERR_DEVICE when the driver
+ *         refuses the map. ZV_ERR_NO_MEMORY and ZV_ERR_DEVICE leave the new value stored
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_SetMotionSensitivity(HANDLE handle, u32 channel, u32 sensitivity);
 
 /**
- * Takes the 16 x 16-pixel blocks of an area out of a channel's motion detection, or in again.
+ * Excludes the 16 x 16 blocks of an area from motion detection, or includes them again with the
+ * channel's threshold. The number of blocks comes from width and height alone, so an area that is not
+ * aligned to 16 pixels can miss its last block.
  *
  * @param handle   the open card
  * @param channel  0-15
- * @param rect     pixels and lines inside the input picture; one without extent changes nothing
- * @param mark     non-zero: out; 0: in, with the channel's sensitivity
- * @return ZV_OK; ZV_ERR_CHANNEL; ZV_ERR_PARAM, also for a rectangle outside the picture or reversed;
- *         ZV_ERR_NO_MEMORY without a buffer for the map; ZV_ERR_DEVICE when the driver refused the map
+ * @param rect     pixels and lines inside the input picture; an empty rectangle changes nothing
+ * @param mark     non-zero: exclude; 0: include
+ * @return ZV_OK; ZV_ERR_CHANNEL for a channel above 15; ZV_ERR_PARAM for a bad handle, a null @p rect, or
+ *         a rectangle that is reversed or outside the picture; ZV_ERR_NO_MEMORY when there is no buffer
+ *         for the map; ZV_ERR_DEVICE when the driver refuses the map
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_MarkMotionArea(HANDLE handle, u32 channel, const ZV_RECT *rect, u32 mark);
 
 /**
- * Starts motion detection on all channels and shows its marks on the preview.
+ * Starts motion detection on all channels and shows motion marks on the preview.
  *
  * @param handle  the open card
- * @return ZV_OK; ZV_ERR_PARAM
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_StartMotionDetection(HANDLE handle);
 
 /**
- * Stops motion detection on all channels and hides its marks.
+ * Stops motion detection on all channels and hides the motion marks.
  *
  * @param handle  the open card
- * @return ZV_OK; ZV_ERR_PARAM
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_StopMotionDetection(HANDLE handle);
 
 /**
- * Tells which channels show motion now; channels without video never do.
+ * Returns the channels that show motion now, without the channels that have lost their video.
  *
  * @param handle  the open card
  * @return channel mask; 0 for a bad handle
  *
- * Context: any thread; open or capturing: frames that follow carry these bits until the next poll
- * of the video data thread. Does not block.
+ * Context: any thread; open or capturing. While capturing, this also replaces the motion bits that
+ * frames are tagged with, until the video data thread polls again. Does not block.
  */
 u32 zv_GetMotionStatus(HANDLE handle);
 
 /**
- * Blanks a rectangle of a channel's picture; an empty one takes the mask away.
+ * Sets a channel's privacy mask: the card blanks this rectangle of the picture. An empty rectangle
+ * removes the mask.
  *
  * @param handle   the open card
  * @param channel  0-15
- * @param rect     pixels and lines inside the input picture; the card rounds to multiples of 8
- * @return ZV_OK; ZV_ERR_CHANNEL; ZV_ERR_PARAM, also for a rectangle outside the picture or reversed
+ * @param rect     pixels and lines inside the input picture; the card rounds them to multiples of 8
+ * @return ZV_OK; ZV_ERR_CHANNEL for a channel above 15; ZV_ERR_PARAM for a bad handle, a null @p rect, or
+ *         a rectangle that is reversed or outside the picture
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_SetShieldRect(HANDLE handle, u32 channel, const ZV_RECT *rect);
 
 /**
- * Reads a channel's mask from the card.
+ * Reads a channel's privacy mask from the card.
  *
  * @param handle   the open card
  * @param channel  0-15
  * @param rect     receives the rectangle, all edges multiples of 8
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_CHANNEL
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle or a null @p rect; ZV_ERR_CHANNEL for a channel above 15
  *
  * Context: control thread; open or capturing. Does not block.
  */
 int zv_GetShieldRect(HANDLE handle, u32 channel, ZV_RECT *rect);
 
 /**
- * Tells which channels have lost their video.
+ * Returns the channels that have lost their video.
  *
  * @param handle  the open card
  * @return channel mask; all 16 bits for a bad handle
@@ -433,7 +465,7 @@ int zv_GetShieldRect(HANDLE handle, u32 channel, ZV_RECT *rect);
 u32 zv_GetVideoStatus(HANDLE handle);
 
 /**
- * Tells which audio inputs have no signal.
+ * Returns the audio inputs that have no signal.
  *
  * @param handle  the open card
  * @return input mask, bits 0-3; all 4 bits for a bad handle
@@ -443,24 +475,27 @@ u32 zv_GetVideoStatus(HANDLE handle);
 u32 zv_GetAudioStatus(HANDLE handle);
 
 /**
- * Tells the board revision.
+ * Returns the board revision.
  *
  * @param handle  the open card
- * @return 0, 1 or 2; 3 when the board's answer is unknown or missing, and for a bad handle
+ * @return 0, 1 or 2; 3 for a bad handle, or when the board does not reply or its reply is unknown
  *
  * Context: any thread; open or capturing. Does not block.
  */
 u32 zv_GetHardwareVersion(HANDLE handle);
 
 /**
- * Starts the board's watchdog and a thread that feeds it every 30 seconds: when the process dies or
- * hangs, the board resets the machine. A board that does not answer ends the thread with a line on
- * standard output.
+ * Starts the board's watchdog and a thread that feeds it every 30 seconds. When the feeding stops without
+ * zv_DisableWatchDog() or zv_Close(), for example because the process is killed, the board resets the
+ * machine. The thread does not notice when another thread of the process hangs. If the board does not
+ * reply, the thread prints a line, turns the watchdog off and ends.
  *
  * @param handle  the open card
- * @return ZV_OK, also when it runs already; ZV_ERR_PARAM; ZV_ERR_THREAD_CREATE
+ * @return ZV_OK, also when it already runs; ZV_ERR_PARAM for a bad handle; ZV_ERR_THREAD_CREATE when the
+ *         thread cannot be created
  *
- * Context: control thread; open or capturing. Blocks only for a thread that is just ending.
+ * Context: control thread; open or capturing. Blocks only while an earlier watchdog thread is still
+ * ending.
  */
 int zv_EnableWatchDog(HANDLE handle);
 
@@ -468,11 +503,12 @@ int zv_EnableWatchDog(HANDLE handle);
  * Stops the watchdog and its thread.
  *
  * @param handle  the open card
- * @return ZV_OK, also when it does not run; ZV_ERR_PARAM; ZV_ERR_THREAD_JOIN; ZV_ERR_DEVICE when
- *         the board does not confirm: the watchdog may still be running
+ * @return ZV_OK, also when it does not run; ZV_ERR_PARAM for a bad handle; ZV_ERR_THREAD_JOIN when the
+ *         thread cannot be joined; ZV_ERR_DEVICE when the board does not confirm the stop: the watchdog
+ *         may still be running
  *
- * Context: control thread; open or capturing. Blocks for a few milliseconds, or as long as the
- * driver holds the thread in a command.
+ * Context: control thread; open or capturing. Blocks for a few milliseconds, or until the driver
+ * finishes a command of the thread.
  */
 int zv_DisableWatchDog(HANDLE handle);
 
@@ -480,21 +516,21 @@ int zv_DisableWatchDog(HANDLE handle);
  * Reads a codec-chip register and prints it.
  *
  * @param handle  the open card
- * @param reg     register address, any u32; what the driver does not give reads as 0
+ * @param reg     register address, any u32; reads as 0 when the driver does not answer
  * @param value   receives the value
- * @return ZV_OK; ZV_ERR_PARAM
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle or a null @p value
  *
  * Context: any thread; open or capturing. Does not block.
  */
 int zv_GetTarnRegisterValue(HANDLE handle, u32 reg, u32 *value);
 
 /**
- * Writes a codec-chip register, reads it back and prints what it reads.
+ * Writes a codec-chip register, reads it back and prints the value read.
  *
  * @param handle  the open card
- * @param reg     register address, any u32; what the driver does not give reads as 0
+ * @param reg     register address, any u32; reads as 0 when the driver does not answer
  * @param value   the value to write; not changed
- * @return ZV_OK; ZV_ERR_PARAM
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle or a null @p value
  *
  * Context: any thread; open or capturing. Does not block.
  */
@@ -505,22 +541,22 @@ int zv_SetTarnRegisterValue(HANDLE handle, u32 reg, const u32 *value);
  *
  * @param handle  the open card
  * @param chip    decoder, 0-3; channels 4k to 4k + 3 are on chip k
- * @param reg     register number, any u8; what the driver does not give reads as 0
+ * @param reg     register number, any u8; reads as 0 when the driver does not answer
  * @param value   receives the value
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_DEVICE for a chip above 3
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle or a null @p value; ZV_ERR_DEVICE for a chip above 3
  *
  * Context: any thread; open or capturing. Does not block.
  */
 int zv_GetTW2815RegisterValue(HANDLE handle, u8 chip, u8 reg, u8 *value);
 
 /**
- * Writes a register of a video decoder, reads it back and prints what it reads.
+ * Writes a register of a video decoder, reads it back and prints the value read.
  *
  * @param handle  the open card
- * @param chip    decoder, 0-3
- * @param reg     register number, any u8; what the driver does not give reads as 0
+ * @param chip    decoder, 0-3; channels 4k to 4k + 3 are on chip k
+ * @param reg     register number, any u8; reads as 0 when the driver does not answer
  * @param value   the value to write; not changed
- * @return ZV_OK; ZV_ERR_PARAM; ZV_ERR_DEVICE for a chip above 3
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle or a null @p value; ZV_ERR_DEVICE for a chip above 3
  *
  * Context: any thread; open or capturing. Does not block.
  */

@@ -2,8 +2,8 @@
  * @file zv_type.h
  * Types, enumerations, records and status codes of the Zarvo Capture SDK.
  *
- * Compiles on its own as C11 and as C++20. Every enumerator has an explicit value: item lists,
- * recorded settings and the card itself rely on the numbers.
+ * The header compiles on its own as C11 and as C++20. Every enumerator has an explicit value: lists of
+ * items, stored settings and the card itself rely on the numbers.
  */
 #ifndef ZV_TYPE_H
 #define ZV_TYPE_H
@@ -19,7 +19,7 @@ typedef uint16_t u16;
 typedef uint32_t u32;
 typedef int32_t i32;
 
-/** An open card. Opaque; made by zv_Open(), dead after zv_Close(). */
+/** An open card. Opaque; zv_Open() creates it, zv_Close() makes it invalid. */
 typedef void *HANDLE;
 
 /** Number of video channels of a card; channels are numbered 0 to ZV_CHANNELS - 1. */
@@ -40,18 +40,19 @@ typedef void *HANDLE;
  * @param length   number of bytes at @p data
  * @param flags    ZV_FLAG_MOTION and ZV_FLAG_VIDEO_LOSS of a video channel; 0 for audio
  *
- * Context: video callbacks run on the video data thread, the audio callback on the audio data
- * thread, both at once. A slow callback delays the frames behind it. It may call functions whose
- * Context says any thread; zv_Start(), zv_Stop() and zv_Close() belong to the control thread.
+ * Context: video callbacks run on the video data thread, the audio callback on the audio data thread; the
+ * two threads run at the same time. A slow callback delays the frames that follow. A callback may call
+ * functions whose Context says any thread. It must not call zv_Start(), zv_Stop() or zv_Close(), which
+ * belong to the control thread.
  */
 typedef void (*ZV_STREAM_CALLBACK)(u32 channel, u8 *data, i32 length, i32 flags);
 
-/** Status of an SDK call. 4, 5 and 13 are not used. */
+/** Status of an SDK call. The numbers 4, 5 and 13 are not used. */
 enum {
-  ZV_OK = 0,                 /**< success */
+  ZV_OK = 0,                 /**< the call succeeded */
   ZV_ERR_OPEN = 1,           /**< a device node could not be opened */
   ZV_ERR_ALREADY_OPEN = 2,   /**< a card is already open in this process */
-  ZV_ERR_NO_MEMORY = 3,      /**< a buffer could not be allocated or a region not mapped */
+  ZV_ERR_NO_MEMORY = 3,      /**< a buffer could not be allocated or a region could not be mapped */
   ZV_ERR_MODE = 6,           /**< preview mode outside ZV_VIDEO_MODE 0-5 */
   ZV_ERR_CHANNEL = 7,        /**< channel number or channel mask out of range */
   ZV_ERR_STANDARD = 8,       /**< video standard other than 0 or 1 */
@@ -61,7 +62,7 @@ enum {
   ZV_ERR_THREAD_CREATE = 12, /**< a thread could not be created */
   ZV_ERR_THREAD_JOIN = 14,   /**< a thread could not be joined */
   ZV_ERR_CLOSE = 15,         /**< closing a device node failed */
-  ZV_ERR_DEVICE = 16         /**< the driver or the hardware refused or did not answer */
+  ZV_ERR_DEVICE = 16         /**< the driver or the hardware refused or did not reply */
 };
 
 /** Video standard of all inputs. */
@@ -104,15 +105,15 @@ typedef enum ZV_SCALE_VALUE {
 /** Which fields of a half-height picture are encoded. */
 typedef enum ZV_TWOFIELD_MODE { TWOFIELD_DISABLE = 0, TWOFIELD_ENABLE = 1 } ZV_TWOFIELD_MODE;
 
-/** Motion-JPEG quality, one for the whole card: the last enabled channel's choice holds. */
+/** Motion-JPEG quality. The card has one for all channels: the last Motion-JPEG channel sets it. */
 typedef enum ZV_JPEG_QUALITY {
   JPEG_QP_ZV_LOW = 0,
   JPEG_QP_ZV_MEDIUM = 1,
   JPEG_QP_ZV_HIGH = 2,     /**< the same as medium */
-  JPEG_QP_ZV_UNSUPPORT = 3 /**< no quality: leaves it to the other channels */
+  JPEG_QP_ZV_UNSUPPORT = 3 /**< keeps the quality of the Motion-JPEG channels before, else medium */
 } ZV_JPEG_QUALITY;
 
-/** Frame rate of a channel. Both standards share the numbers. */
+/** Frame rate of a channel, in frames a second. NTSC and PAL names share the same numbers. */
 typedef enum ZV_INTERVAL_VALUE {
   INTERVAL_ZV_30FPS_NTSC = 0,
   INTERVAL_ZV_27FPS_NTSC = 1,
@@ -156,7 +157,7 @@ typedef struct ZV_RECT {
   u32 y_end;   /**< bottom edge, not below y_start */
 } ZV_RECT;
 
-/** Picture properties of a channel in user units. */
+/** Picture properties of a channel, in user units. */
 typedef struct ZV_VIDEO_PROPERTY {
   i32 hue;        /**< degrees, -180 to 180, even; 0 is neutral */
   i32 saturation; /**< percent, 0 to 200; 100 is neutral */
@@ -167,23 +168,23 @@ typedef struct ZV_VIDEO_PROPERTY {
 /** Encoder settings of a channel. */
 typedef struct ZV_VIDEO_CONFIG {
   ZV_VIDEO_CODEC mjpeg;       /**< codec of the channel */
-  ZV_SCALE_VALUE scale;       /**< picture size; SCALE_ZV_NO_ENCODE switches the channel off */
+  ZV_SCALE_VALUE scale;       /**< picture size; SCALE_ZV_NO_ENCODE: the channel is not encoded */
   u32 gop;                    /**< MPEG-4: frames from one intra frame to the next, from 1 */
   u32 qp;                     /**< MPEG-4: quantiser, 1 to 31 */
   ZV_INTERVAL_VALUE interval; /**< frame rate */
-  ZV_TWOFIELD_MODE twofield;  /**< encode both fields of a half-height picture; needs interval 0 */
+  ZV_TWOFIELD_MODE twofield;  /**< whether to encode both fields at half height; needs interval 0 */
   ZV_JPEG_QUALITY jpeg_qp;    /**< Motion-JPEG quality */
   u32 enable;                 /**< 1 while the channel is enabled for encoding */
-  i32 CBRValue;               /**< constant bit rate, bits a second */
-  u32 CBREnable;              /**< non-zero: hold CBRValue instead of qp */
+  i32 CBRValue;               /**< target of the constant bit rate, bits a second */
+  u32 CBREnable;              /**< non-zero: encode at CBRValue; 0: encode with qp */
   u32 QPMinMaxEnable;         /**< non-zero: keep the quantiser between QPMin and QPMax */
-  u32 QPMax;                  /**< upper bound, above QPMin and at most 29 to reach the card */
-  u32 QPMin;                  /**< lower bound, at least 1 to reach the card */
+  u32 QPMax;                  /**< upper bound; must be above QPMin and at most 29, else no range is sent */
+  u32 QPMin;                  /**< lower bound; must be at least 1, else no range is sent */
 } ZV_VIDEO_CONFIG;
 
-/** ZV_DISPLAY_WINDOW flags: the window takes part in the preview. */
+/** Flag of a ZV_DISPLAY_WINDOW: the window is part of the preview. */
 #define ZV_WINDOW_ENABLED 0x1u
-/** ZV_DISPLAY_WINDOW flags: the window is the picture-in-picture. */
+/** Flag of a ZV_DISPLAY_WINDOW: the window is the picture-in-picture. */
 #define ZV_WINDOW_PIP 0x2u
 
 /** One window of the preview picture. The end edges are exclusive. */
@@ -198,15 +199,15 @@ typedef struct ZV_DISPLAY_WINDOW {
   u32 flags;   /**< ZV_WINDOW_ENABLED, ZV_WINDOW_PIP */
 } ZV_DISPLAY_WINDOW;
 
-/** State of the preview picture. Read it, change it through the zv_display functions only. */
+/** State of the preview picture. Programs may read it; only the zv_display functions may change it. */
 typedef struct ZV_DISPLAY {
   i32 fd;                       /**< descriptor of the display device */
   u32 width;                    /**< display width, pixels; 0 until the display is opened */
   u32 height;                   /**< display height, lines; 0 until the display is opened */
-  u32 mode;                     /**< current layout, a ZV_VIDEO_MODE */
+  u32 mode;                     /**< stored layout, a ZV_VIDEO_MODE */
   u32 zoom;                     /**< zoom level; 0 is off */
   ZV_DISPLAY_WINDOW window[16]; /**< the windows */
-  ZV_DISPLAY_WINDOW *pip;       /**< the picture-in-picture window, or null */
+  ZV_DISPLAY_WINDOW *pip;       /**< the picture-in-picture window; null when there is none */
 } ZV_DISPLAY;
 
 #ifdef __cplusplus

@@ -1,7 +1,7 @@
 /**
  * @file zv_video.h
- * One channel's encoder settings, to the card and back. zv_EnableVideoRecordChannels() sends the
- * settings of all channels; these are for programs that look after single channels themselves.
+ * Sends and reads back the encoder settings of one channel. zv_EnableVideoRecordChannels() sends the
+ * settings of all channels; these functions are for programs that manage single channels themselves.
  */
 #ifndef ZV_VIDEO_H
 #define ZV_VIDEO_H
@@ -13,25 +13,27 @@ extern "C" {
 #endif
 
 /**
- * Sends a channel's stored settings to the encoder, without any check of the budget. A quantiser
- * range is sent only if 1 <= QPMin < QPMax <= 29; one sent earlier stays in force until the next.
+ * Sends a channel's stored settings to the encoder without checking the frame-rate budget. Sends the
+ * quantiser range only if QPMinMaxEnable is set and 1 <= QPMin < QPMax <= 29; otherwise the encoder
+ * keeps the range that it got last.
  *
  * @param handle   the open card
  * @param channel  0-15
- * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL for a channel above 15
  *
  * Context: control thread; open. Blocks for half a millisecond.
  */
 int zv_set_video_config(HANDLE handle, u32 channel);
 
 /**
- * Reads scale, interval, GOP and quantiser of a channel back from the encoder into its stored
- * settings, and sets `enable` when the channel is encoded. An interval no ZV_INTERVAL_VALUE stands
- * for becomes INTERVAL_ZV_INVALID; one sent in two-field mode reads as if it were sent without.
+ * Reads scale, interval, GOP and quantiser of a channel from the encoder into its stored settings. Sets
+ * `enable` to 1 if the channel has a scale, else to 0. An interval code without a ZV_INTERVAL_VALUE
+ * becomes INTERVAL_ZV_INVALID. Two-field mode cannot be read back: settings sent with it come back with
+ * another interval.
  *
  * @param handle   the open card
  * @param channel  0-15
- * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL
+ * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL for a channel above 15
  *
  * Context: control thread; open. Does not block.
  */

@@ -1,4 +1,4 @@
-// The lists of frame rates, and how a cut rate finds its label again.
+// The lists of frame rates, and the label for the rate in a header.
 #include "recording/frame_rates.h"
 
 #include <cstdlib>

@@ -1,6 +1,6 @@
 /**
  * @file frame_rates.h
- * The frame rates a recording can have, as the labels an operator chooses.
+ * The frame rates of recordings, as the labels that an operator chooses.
  */
 #ifndef RECORDING_FRAME_RATES_H
 #define RECORDING_FRAME_RATES_H
@@ -9,17 +9,18 @@
 
 #include "recording/header.h"
 
-/// Frames a second, falling; the place in the list is the ZV_INTERVAL_VALUE. A null ends each list.
+/// Frames a second, the highest first; the index is the ZV_INTERVAL_VALUE. Each list ends with null.
 extern const char *const ntsc_fps_str[];
 extern const char *const pal_fps_str[];
 
 namespace recording {
 
-/// The list of a standard.
+/// Returns the list of a standard.
 const char *const *frame_rate_list(ZV_VIDEO_STANDARD standard);
 
-/// The label behind a header's rate, which is cut to a whole number: a rate that is not in the list stands
-/// for the first label that is cut to it, as 22 for "22.5". The picture's height tells the standard.
+/// Returns the label of a header's rate. A header holds only the whole part of a label: 22 for "22.5". If the
+/// number itself is no label, returns the first label with that whole part, or the number if there is none.
+/// The picture's height tells the standard.
 std::string frame_rate_label(const RECORD_FILE_HEADER &header);
 
 }  // namespace recording

@@ -1,4 +1,4 @@
-// Makes and reads the header of a video recording.
+// Builds and reads the header of a video recording.
 #include "recording/header.h"
 
 #include <unistd.h>

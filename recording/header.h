@@ -1,6 +1,6 @@
 /**
  * @file header.h
- * The header of every video recording.
+ * The header of a video recording.
  */
 #ifndef RECORDING_HEADER_H
 #define RECORDING_HEADER_H
@@ -13,12 +13,12 @@
 
 #include "zv_type.h"
 
-/// 32 bytes at the start of a ".rec" file, integers little-endian. The stream follows at once.
+/// The first 32 bytes of a ".rec" file; the stream follows. Integers are little-endian.
 struct RECORD_FILE_HEADER {
   char codec_tag[4];           ///< "MPG4" or "MJPG", no terminator
   std::int32_t record_width;   ///< pixels
   std::int32_t record_height;  ///< lines
-  std::int32_t frame_rate;     ///< frames a second, cut to a whole number; 0 when not known
+  std::int32_t frame_rate;     ///< frames a second, truncated to a whole number; 0 when unknown
   char channel_label[16];      ///< "Channel 1" to "Channel 16", padded with zero bytes
 };
 
@@ -31,16 +31,16 @@ struct PictureSize {
   int width;
   int height;
 };
-/// Size of the recorded picture. `scale` is not SCALE_ZV_NO_ENCODE.
+/// Returns the size of the recorded picture. `scale` must not be SCALE_ZV_NO_ENCODE.
 PictureSize picture_size(ZV_SCALE_VALUE scale, ZV_VIDEO_STANDARD standard, ZV_RESOLUTION resolution);
 
-/// `rate` is a label of the frame-rate lists; `channel` counts from 0.
+/// Builds a header. `rate` is a label of the frame-rate lists; `channel` counts from 0.
 RECORD_FILE_HEADER make_header(ZV_VIDEO_CODEC codec, PictureSize size, const std::string &rate,
                                unsigned channel);
 
-/// The header at the current place of a file; none when the file is too short.
+/// Reads a header at the current position of a file. Returns none when the file is too short.
 std::optional<RECORD_FILE_HEADER> read_header(int file);
-/// None for an unknown tag: the file is no recording.
+/// Returns the codec of a header; none for an unknown tag, in a file that is not a recording.
 std::optional<ZV_VIDEO_CODEC> codec_of(const RECORD_FILE_HEADER &header);
 std::string label_of(const RECORD_FILE_HEADER &header);
 

@@ -1,4 +1,4 @@
-// Names and makes the folders of the recordings.
+// The names of folders and files of recordings, and the creation of the folders.
 #include "recording/tree.h"
 
 #include <sys/stat.h>

@@ -1,7 +1,7 @@
 /**
  * @file interval.h
- * Frame intervals: what each ZV_INTERVAL_VALUE means. The budget check and the encoder translation
- * share the table; each adds to the skip count by a rule of its own.
+ * The meaning of each ZV_INTERVAL_VALUE. The budget check and the encoder translation share this table;
+ * each has its own rule for adding 1 to the skip count.
  */
 #ifndef ZV_INTERVAL_H
 #define ZV_INTERVAL_H
@@ -10,7 +10,7 @@
 
 namespace zarvo {
 
-/// Keep mode encodes one frame of every skip + 1, drop mode all but one of every skip + 1.
+/// Keep mode encodes one frame of every skip + 1. Drop mode drops one frame of every skip + 1.
 struct FrameInterval {
   u32 skip;
   bool drop;
@@ -23,12 +23,12 @@ inline constexpr FrameInterval kIntervals[] = {
 inline constexpr u32 kIntervalCount = sizeof kIntervals / sizeof kIntervals[0];
 static_assert(kIntervalCount == INTERVAL_ZV_INVALID);
 
-/// The meaning of an interval value; an unknown one counts as every frame.
+/// Returns the skip count and mode of an interval value; an unknown value means every frame.
 constexpr FrameInterval frame_interval(u32 value) {
   return value < kIntervalCount ? kIntervals[value] : FrameInterval{0, false};
 }
 
-/// The interval value of a skip count and mode, or INTERVAL_ZV_INVALID.
+/// Returns the interval value of a skip count and mode, or INTERVAL_ZV_INVALID if there is none.
 constexpr u32 interval_value(FrameInterval interval) {
   for (u32 value = 0; value < kIntervalCount; ++value)
     if (kIntervals[value].skip == interval.skip && kIntervals[value].drop == interval.drop) return value;

@@ -1,31 +1,48 @@
+// A thread that its owner starts and joins.
 #include "worker.h"
+
+#include <csignal>
+#include <initializer_list>
 
 namespace zarvo {
 
 namespace {
 
-// Exit values of threads, which pthread_join() hands out as plain pointers.
+// Exit values of threads. An exit value is a void pointer, so these texts cannot be const.
 char cancel_state_failed[] = "ERROR:pthread_setcancelstate failed.\n";
 char cancel_type_failed[] = "ERROR:pthread_setcanceltype failed.\n";
+
+/// Creates a thread with all signals blocked except those of its own faults.
+bool create_thread(pthread_t &id, Worker::Routine routine, void *argument) {
+  sigset_t blocked;
+  sigset_t before;
+  sigfillset(&blocked);
+  for (const int fault : {SIGSEGV, SIGBUS, SIGFPE, SIGILL, SIGTRAP}) sigdelset(&blocked, fault);
+  pthread_sigmask(SIG_SETMASK, &blocked, &before);
+  const bool created = pthread_create(&id, nullptr, routine, argument) == 0;
+  pthread_sigmask(SIG_SETMASK, &before, nullptr);
+  return created;
+}
 
 }  // namespace
 
 bool Worker::start(Routine routine, void *argument) {
   void *result = nullptr;
   if (!join(result)) return false;
-  const std::lock_guard lock(mutex_);
-  joinable_ = pthread_create(&id_, nullptr, routine, argument) == 0;
-  return joinable_;
+  pthread_mutex_lock(&mutex_);
+  const bool created = joinable_ = create_thread(id_, routine, argument);
+  pthread_mutex_unlock(&mutex_);
+  return created;
 }
 
 bool Worker::join(void *&result) {
-  std::unique_lock lock(mutex_);
-  if (!joinable_) return true;
-  if (pthread_equal(id_, pthread_self()) != 0) return false;
-  joinable_ = false;
+  pthread_mutex_lock(&mutex_);
   const pthread_t id = id_;
-  lock.unlock();
-  return pthread_join(id, &result) == 0;
+  const bool waiting = joinable_;
+  const bool self = waiting && pthread_equal(id, pthread_self()) != 0;
+  joinable_ = self;
+  pthread_mutex_unlock(&mutex_);
+  return !waiting || (!self && pthread_join(id, &result) == 0);
 }
 
 void *make_cancellable() {

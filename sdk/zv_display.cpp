@@ -18,15 +18,17 @@ namespace {
 constexpr u32 kLayouts = MUX_MODE_ZV_INVALID;
 constexpr u32 kWindows = sizeof(ZV_DISPLAY::window) / sizeof(ZV_DISPLAY_WINDOW);
 
-// By ZV_VIDEO_MODE: windows shown, columns and rows of the grid, scale of an ordinary window.
+// By ZV_VIDEO_MODE: the number of windows shown, of grid columns and rows, and the scale code of an ordinary
+// window.
 constexpr u32 disp_nr_channel[kLayouts] = {1, 4, 6, 8, 9, 16};
 constexpr u32 disp_div[kLayouts] = {1, 2, 3, 4, 3, 4};
 constexpr u32 disp_scale[kLayouts] = {1, 3, 4, 5, 4, 5};
 
-constexpr u32 kHidden = 0;    ///< scale of a window that is not shown
-constexpr u32 kPipScale = 4;  ///< a ninth of the display
+constexpr u32 kHidden = 0;    ///< scale code of a window that is not shown
+constexpr u32 kPipScale = 4;  ///< scale code of the picture-in-picture, a third of the display wide and high
 
-/// The large window 0 of a layout, in grid cells a side, and the cells the others take.
+/// A layout whose window 0 is larger: its side in grid cells, its scale code, and the cells of the other
+/// windows.
 struct LargeWindow {
   u32 cells;
   u32 scale;
@@ -46,8 +48,8 @@ const LargeWindow *large_window(u32 mode) {
   }
 }
 
-constexpr u32 kGridStride = 4;  ///< cells a row in the grid's mask, whatever the layout
-constexpr u32 kEdge = 2;        ///< the last borders and the screen frame stay this far inside
+constexpr u32 kGridStride = 4;  ///< bits from one row to the next in the cell mask, in every layout
+constexpr u32 kEdge = 2;        ///< distance of the last borders and the screen frame from the edge
 
 constexpr u32 multiple_of_8(u32 value) {
   return value & ~7u;
@@ -79,7 +81,7 @@ int send_frame(const ZV_DISPLAY &display, u32 number, const ZV_DISPLAY_WINDOW &w
                driver::FrameRect{number, window.x_start, window.y_start, window.x_end, window.y_end, 1, 0});
 }
 
-/// The shape is frozen while a magnified picture or a second one is on it.
+/// The layout must not change while zoom or picture-in-picture is on.
 bool frozen(const ZV_DISPLAY &display) {
   return display.zoom != 0 || display.pip != nullptr;
 }
@@ -96,7 +98,7 @@ driver::Grid even_grid(const ZV_DISPLAY &display, u32 div) {
   return grid;
 }
 
-/// Gives window `i` its place in the layout, and its cell in the grid's mask.
+/// Places window `i` in the layout and sets its bit in the cell mask.
 void lay_out(ZV_DISPLAY &display, u32 mode, u32 i, driver::Grid &grid) {
   ZV_DISPLAY_WINDOW &window = display.window[i];
   if (i >= disp_nr_channel[mode]) return place(window, kHidden, 0, 0, {0, 0});
@@ -113,7 +115,7 @@ void lay_out(ZV_DISPLAY &display, u32 mode, u32 i, driver::Grid &grid) {
 }
 
 constexpr u32 kPlainSource[driver::kSourceGroups] = {0x00000000, 0x10000000, 0x20000000, 0x30000000};
-/// Three columns of a picture as wide as the input.
+/// Source words for a three-column layout when the display is as wide as the input.
 constexpr u32 kThirdSource[driver::kSourceGroups] = {0x00001000, 0x10001002, 0x200012BA, 0x300012BC};
 
 void send_source(const ZV_DISPLAY &display, const u32 (&words)[driver::kSourceGroups]) {
@@ -125,12 +127,12 @@ void finish_update(const ZV_DISPLAY &display, driver::Grid &grid) {
   issue(display.fd, driver::DISP_IOC_END_UPDATE);
 }
 
-/// An origin kept between 0 and `limit`, wide enough for any int added to any edge.
+/// Clamps to 0 ... limit. The value has 64 bits so that any edge plus any int fits.
 u32 clamped(std::int64_t value, u32 limit) {
   return static_cast<u32>(std::clamp<std::int64_t>(value, 0, limit));
 }
 
-/// Shows a window as picture-in-picture as near to (x, y) as the display allows.
+/// Shows a window as picture-in-picture at (x, y), clamped so that it fits on the display.
 int show_pip(const ZV_DISPLAY &display, ZV_DISPLAY_WINDOW &window, std::int64_t x, std::int64_t y) {
   const Size size = cell_size(display, 3);
   place(window, kPipScale, multiple_of_8(clamped(x, display.width - size.width)),

@@ -1,6 +1,6 @@
 /**
  * @file zv_video.cpp
- * One channel's encoder settings, from the stored record to the encoder device and back.
+ * Sends one channel's stored encoder settings to the encoder device and reads them back.
  */
 #include "zv_video.h"
 
@@ -15,15 +15,15 @@ namespace zarvo {
 
 namespace {
 
-/// The bounds the encoder can hold its quantiser between.
+/// Returns whether the encoder accepts the quantiser range.
 bool usable_qp_range(const ZV_VIDEO_CONFIG &config) {
   constexpr u32 kHighestQp = 29;
   return config.QPMinMaxEnable != 0 && config.QPMax > config.QPMin && config.QPMin != 0 &&
          config.QPMax <= kHighestQp;
 }
 
-/// The interval record of a channel. The encoder counts fields: a one-field picture that keeps
-/// frames skips one field more.
+/// Returns the interval record of a channel. For one-field pictures in keep mode the encoder takes skip count
+/// n as one field of every n-th frame and 0 as both fields, so the count is 1 higher than the table entry.
 driver::Interval encoder_interval(const ZV_VIDEO_CONFIG &config, u32 channel) {
   auto [skip, drop] = frame_interval(word_of(config.interval));
   if (!drop && word_of(config.twofield) == TWOFIELD_DISABLE && word_of(config.scale) != SCALE_ZV_D1) ++skip;
@@ -45,7 +45,8 @@ int get_video_config(ZV_CARD &card, u32 channel) {
   const bool d1 = scale.value == driver::kScaleCodeD1;
   const bool drop = interval.code >> driver::kIntervalDropShift != 0;
   const u32 count = interval.code & driver::kIntervalSkipMask;
-  // In keep mode a one-field picture has one field more than its table entry; count 0 has no entry.
+  // In keep mode the count of a one-field picture is 1 higher than its table entry. Count 0 wraps around
+  // and matches no entry.
   const u32 skip = drop || d1 ? count : count - 1;
 
   ZV_VIDEO_CONFIG &config = card.config[channel];

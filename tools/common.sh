@@ -1,5 +1,5 @@
 # shellcheck shell=bash
-# What demo.sh, test.sh and the end-to-end tests share. Sourced, never run.
+# Functions that demo.sh, test.sh and the end-to-end tests share. To be sourced, not run.
 
 ZARVO_ROOT=$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)
 
@@ -10,11 +10,11 @@ die() {
   exit 1
 }
 
-# install_missing: installs the packages of tools/packages.txt that are not there. Asks nothing.
+# install_missing: installs the missing packages of tools/packages.txt, without questions.
 install_missing() {
   local as_root=() missing=() package
   command -v dpkg-query >/dev/null && command -v apt-get >/dev/null ||
-    die "this script installs its tools with apt-get (Debian 12); elsewhere install what tools/packages.txt names"
+    die "this script installs its tools with apt-get (Debian 12); elsewhere install the packages of tools/packages.txt yourself"
   while read -r package; do
     dpkg-query -W -f '${db:Status-Status}\n' "$package" 2>/dev/null | grep -qx installed || missing+=("$package")
   done < <(grep -v '^#' "$ZARVO_ROOT/tools/packages.txt")
@@ -28,7 +28,7 @@ install_missing() {
   "${as_root[@]}" env DEBIAN_FRONTEND=noninteractive apt-get install -q -y --no-install-recommends "${missing[@]}"
 }
 
-# build PRESET [TARGET...] [-- CMAKE-OPTION...]: configures and builds build/PRESET, with ccache if it is there.
+# build PRESET [TARGET...] [-- CMAKE-OPTION...]: configures and builds build/PRESET, with ccache if it is installed.
 build() {
   local preset=$1 targets=() options=()
   shift
@@ -44,13 +44,13 @@ build() {
     cmake --build --preset "$preset" -j "$(nproc)" ${targets[0]:+--target "${targets[@]}"})
 }
 
-# real_card: this machine has one.
+# real_card: whether this machine has a card.
 real_card() { [ -e /dev/zarvo_enc0 ]; }
 
-# use_card CARD-LIBRARY: fills the array ON_CARD with the command that puts a program on the card of this
-# machine, or else on the virtual card: "${ON_CARD[@]}" PROGRAM .... A program built with a sanitizer needs
-# the sanitizer's runtime in front of the card. ZARVO_PRELOAD names one more library, to stand behind it.
-# The list of libraries has no quoting, so the card stands in it by its name alone and is found by its folder.
+# use_card CARD-LIBRARY: sets the array ON_CARD to a command prefix. "${ON_CARD[@]}" PROGRAM ... runs the
+# program on the card of this machine if there is one, else on the virtual card. A program built with a
+# sanitizer needs the sanitizer's runtime before the card. ZARVO_PRELOAD names one more library, after the card.
+# LD_PRELOAD has no quoting, so it holds only the name of the card; LD_LIBRARY_PATH holds its folder.
 use_card() {
   local runtime folder
   ON_CARD=(env)
@@ -63,7 +63,7 @@ use_card() {
     "LD_PRELOAD=${runtime:+$runtime:}${1##*/}${ZARVO_PRELOAD:+:$ZARVO_PRELOAD}${LD_PRELOAD:+:$LD_PRELOAD}")
 }
 
-# wait_until SECONDS COMMAND...: waits for a condition, false when it has not come true in that time.
+# wait_until SECONDS COMMAND...: repeats the command until it succeeds; fails after that time.
 wait_until() {
   local latest=$((SECONDS + $1))
   shift

@@ -1,13 +1,13 @@
 # shellcheck shell=bash
-# An operator made of xdotool: opens the demo application on a display of its own, clicks widgets by
-# their object names, waits for lines and windows, and takes screenshots. Sourced, never run; needs
-# common.sh. The caller sets PROGRAM, CARD and WIDGET_MAP to the built files.
+# A scripted operator, made with xdotool: it opens the demo application on a display of its own, clicks
+# widgets by their object names, waits for lines and windows, and takes screenshots. To be sourced after
+# common.sh, not run. The caller sets PROGRAM, CARD and WIDGET_MAP to the built files.
 
 OPERATOR_FOLDER=   # display number, log, widget positions; removed at the end
 DIALOG=            # X window of the dialog
 declare -A WIDGET=()  # object name to "x y" in the dialog
 
-# open_display: an X server without a screen, and a window manager on it.
+# open_display: starts an X server without a screen, and a window manager on it.
 open_display() {
   OPERATOR_FOLDER=$(mktemp -d)
   trap close_display EXIT
@@ -34,7 +34,7 @@ close_display() {
   rm -rf "$OPERATOR_FOLDER"
 }
 
-# start_program FOLDER: the demo application in that working directory; its lines go to FOLDER/output.log.
+# start_program FOLDER: starts the demo application in that working directory; its output goes to FOLDER/output.log.
 start_program() {
   LOG=$1/output.log
   use_card "$CARD"
@@ -48,11 +48,11 @@ start_program() {
 
 dialog_shown() { DIALOG=$(xdotool search --onlyvisible --name '^Tarn Demo$' | head -n 1) && [ -n "$DIALOG" ]; }
 
-# The positions depend on fonts and style, so the same dialog tells them, on the same display.
+# The positions depend on fonts and style, so widget_map reads them from the same dialog on the same display.
 read_widget_map() {
   local name x y
   while read -r name x y; do WIDGET[$name]="$x $y"; done < <("${ON_CARD[@]}" "$WIDGET_MAP" 2>/dev/null | sed -n 's/^widget //p')
-  [ ${#WIDGET[@]} -gt 0 ] || die "$WIDGET_MAP told no widget positions"
+  [ ${#WIDGET[@]} -gt 0 ] || die "$WIDGET_MAP printed no widget positions"
 }
 
 focus_dialog() { xdotool windowactivate --sync "$DIALOG"; }
@@ -64,7 +64,7 @@ click() {
   xdotool windowactivate --sync "$DIALOG" mousemove --sync --window "$DIALOG" ${WIDGET[$1]} click 1
 }
 
-# choose COMBO INDEX: opens the list and picks the item, as a hand with arrow keys does.
+# choose COMBO INDEX: opens the list and chooses the item with the arrow keys.
 choose() {
   local keys=(Home) n
   WINDOWS=$(program_windows)
@@ -86,12 +86,12 @@ enter() {
   xdotool key ctrl+a type --delay 5 -- "$2"
 }
 
-# wait_line PATTERN [COUNT [SECONDS]]: until the program has printed that many lines with the pattern.
+# wait_line PATTERN [COUNT [SECONDS]]: waits until the program has printed that many lines with the pattern.
 wait_line() { wait_until "${3:-20}" has_lines "$1" "${2:-1}" || die "the program did not print '$1': $(tail -n 5 "$LOG")"; }
 has_lines() { [ "$(grep -c -- "$1" "$LOG")" -ge "$2" ]; }
 lines() { grep -c -- "$1" "$LOG"; }
 
-# wait_preview: until the preview window is there and its caption tells a rate; PREVIEW is the window.
+# wait_preview: waits until the preview window exists and its caption shows a rate; sets PREVIEW to the window.
 wait_preview() {
   wait_until 20 preview_shown || die "no preview window appeared: $(tail -n 5 "$LOG")"
   xdotool windowmove "$PREVIEW" 780 40 2>/dev/null
@@ -102,13 +102,13 @@ preview_gone() { ! preview_shown; }
 preview_runs() { [[ $(preview_caption) =~ ^Preview\ FPS\ :\ [1-9] ]]; }
 preview_caption() { xdotool getwindowname "$PREVIEW"; }
 
-# preview_rate: the pictures of the last second, as the caption tells.
+# preview_rate: the pictures of the last second, as the caption shows.
 preview_rate() { preview_caption | sed 's/.*: //'; }
 
 # picture WINDOW FILE: a screenshot of a window, or of the whole screen for "root".
 picture() { import -silent -window "$1" "$2" && printf '  saved %s\n' "$2"; }
 
-# close_program: the operator closes the dialog; STATUS is what the program ended with.
+# close_program: closes the dialog; sets STATUS to the program's exit status.
 # shellcheck disable=SC2034 # STATUS is for the caller
 close_program() {
   focus_dialog
@@ -120,7 +120,7 @@ close_program() {
 }
 process_gone() { ! kill -0 "$1"; }
 
-# rate_near RATE: whether the caption tells that rate, give or take 2. The first second of a layout may be short.
+# rate_near RATE: whether the caption shows that rate, plus or minus 2. The first second of a layout may be short.
 rate_near() { local rate; rate=$(preview_rate) && [ "$rate" -ge $(($1 - 2)) ] && [ "$rate" -le $(($1 + 2)) ]; }
 
 # files_closed: whether the program has closed all its recordings.

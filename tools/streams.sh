@@ -1,18 +1,18 @@
 # shellcheck shell=bash
-# What ffmpeg says about a recorded stream. Sourced, never run.
+# What ffmpeg says about a recorded stream. To be sourced, not run.
 
 readonly RECORD_HEADER_BYTES=32
 
 # le32 FILE OFFSET: a little-endian word of a file.
 le32() { od -A n -t u4 -j "$2" -N 4 --endian=little "$1" | tr -d ' '; }
 
-# record_header FILE: the header of a .rec file in words.
+# record_header FILE: prints the header of a .rec file as text.
 record_header() {
   printf '%s %sx%s, %s fps, "%s"' "$(head -c 4 "$1")" "$(le32 "$1" 4)" "$(le32 "$1" 8)" "$(le32 "$1" 12)" \
     "$(tail -c +17 "$1" | head -c 16 | tr -d '\0')"
 }
 
-# stream_input FILE: the input options with which ffmpeg and ffprobe read the file, in the array STREAM.
+# stream_input FILE: sets the array STREAM to the input options with which ffmpeg and ffprobe read the file.
 stream_input() {
   case $1 in
     *.m4v) STREAM=(-f m4v) ;;
@@ -31,7 +31,7 @@ stream_input() {
   STREAM+=(-i "$1")
 }
 
-# decode_errors FILE: what ffmpeg complains about while decoding the whole file; nothing is right.
+# decode_errors FILE: prints ffmpeg's errors from decoding the whole file; nothing if there are none.
 decode_errors() {
   stream_input "$1" || { echo "not a recording of this system"; return; }
   ffmpeg -nostdin -v error "${STREAM[@]}" -f null - 2>&1 || echo "ffmpeg failed"
@@ -53,14 +53,14 @@ probe() {
 # decoded_frames FILE: number of video frames that decode.
 decoded_frames() { probe "$1" | cut -d , -f 4; }
 
-# save_frame FILE NUMBER PNG: the frame with that number, from 0.
+# save_frame FILE NUMBER PNG: saves the frame with that number, counted from 0.
 save_frame() {
   stream_input "$1" &&
     ffmpeg -nostdin -y -v error "${STREAM[@]}" -vf "select=eq(n\,$2)" -frames:v 1 "$3"
 }
 
-# report_streams FILE...: a line a file, with its header fields if it has any, its contents and ffmpeg's verdict.
-# False when a file is missing, empty or does not decode without an error line.
+# report_streams FILE...: prints a line for each file: header fields if it has any, contents, ffmpeg's verdict.
+# Fails if a file is missing, empty or does not decode without an error line.
 report_streams() {
   local file errors bad=0
   for file in "$@"; do

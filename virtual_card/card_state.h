@@ -1,7 +1,7 @@
 /**
  * @file card_state.h
- * What the card has been told: the settings behind its registers and commands. The devices write it,
- * the engine draws and encodes from a copy.
+ * The settings that commands and registers have set. The devices write them; the engine draws and encodes
+ * from a copy.
  */
 #ifndef VIRTUAL_CARD_CARD_STATE_H
 #define VIRTUAL_CARD_CARD_STATE_H
@@ -21,7 +21,7 @@ inline constexpr unsigned kAudioInputs = ZV_AUDIO_CHANNELS;
 inline constexpr u32 kMaxWidth = 720;
 inline constexpr u32 kNarrowWidth = 704;
 inline constexpr u32 kMaxLines = kPal.lines;
-/// Motion threshold of every block at power-up.
+/// The motion threshold of every block at power-up.
 inline constexpr u16 kDefaultMotionLevel = 12;
 
 struct EncoderSettings {
@@ -31,10 +31,10 @@ struct EncoderSettings {
   u32 qp = 0;
   driver::Cbr cbr{};
   driver::QpRange qp_range{};
-  bool number_overlay = false;  ///< the channel number is burnt into the encoded picture
+  bool number_overlay = false;  ///< draw the channel number into the encoded picture
 };
 
-/// Decoder registers of a channel, 128 neutral.
+/// The picture properties in a channel's decoder registers; 128 is neutral.
 struct PictureSettings {
   u8 hue = 128;
   u8 saturation = 128;
@@ -47,12 +47,12 @@ struct PictureSettings {
 struct ChannelState {
   EncoderSettings encoder;
   PictureSettings picture;
-  driver::Mask mask{};  ///< pixels and lines, already in the chip's units of 8; empty: no mask
+  driver::Mask mask{};  ///< pixels and lines, multiples of 8; empty: no mask
   Scene scene = Scene::moving;
   bool lost = false;
 };
 
-/// What DISP_IOC_BEGIN_UPDATE and END_UPDATE change at one stroke.
+/// The layout settings that are changed together between DISP_IOC_BEGIN_UPDATE and DISP_IOC_END_UPDATE.
 struct Layout {
   std::array<ZV_DISPLAY_WINDOW, 16> window{};
   driver::Zoom zoom{};
@@ -62,7 +62,7 @@ struct Layout {
 
 struct DisplayState {
   Layout layout;
-  std::array<u32, 16> routing{};  ///< channel shown at each window; this, not window.channel, decides
+  std::array<u32, 16> routing{};  ///< channel that each window shows; window.channel is not used
   bool on = false;
   bool motion_trace = false;
 };
@@ -72,7 +72,7 @@ struct CardState {
   u32 width = kMaxWidth;
   bool encoding = false;  ///< between ENC_IOC_START and ENC_IOC_STOP
   u32 mjpeg_quality = driver::kMjpegFine;
-  u32 motion_enable = 0;  ///< bit n: detection on channel n
+  u32 motion_enable = 0;  ///< bit n: motion detection on channel n
   u32 sound_present = 0xF;
   std::array<ChannelState, kChannels> channel{};
   DisplayState display;

@@ -1,3 +1,4 @@
+// A bounded queue between the card's encoders and the host's reads.
 #include <algorithm>
 
 #include "frame_queue.h"

@@ -1,7 +1,7 @@
 /**
  * @file frame_queue.h
- * A bounded queue of frames between the card's encoders and the host's reads. A full queue loses the
- * new frame and counts it; it never blocks the card.
+ * A bounded queue of frames between the card's encoders and the host's reads. When it is full, it drops and
+ * counts the new frame; it never blocks the card.
  */
 #ifndef VIRTUAL_CARD_FRAME_QUEUE_H
 #define VIRTUAL_CARD_FRAME_QUEUE_H
@@ -21,12 +21,12 @@ namespace virtual_card {
 
 class FrameQueue {
  public:
-  /// `capacity` in bytes of frame data.
+  /// `capacity` is in bytes of frame data.
   explicit FrameQueue(std::size_t capacity);
 
-  /// False when the frame was lost.
+  /// Appends a frame. Returns false when the queue is full and the frame is lost.
   bool push(ReadyFrame frame);
-  /// Pushes the frame that `make` returns. One for which memory is short is lost.
+  /// Appends the frame that `make` returns. On bad_alloc the frame is lost.
   template <typename Make>
   void push_new(Make make) {
     try {
@@ -35,21 +35,22 @@ class FrameQueue {
       missed(1);
     }
   }
-  /// The oldest frame, waiting for one at most `wait`; none after the wait or a wake().
+  /// Removes and returns the oldest frame. Waits for one at most `wait`; returns none after that time or a
+  /// wake().
   std::optional<ReadyFrame> pop(std::chrono::microseconds wait);
-  /// Ends the waits of pop() now in progress.
+  /// Ends the waits of the pop() calls that are in progress.
   void wake();
-  /// Forgets the frames, not the counters.
+  /// Drops the frames without counting them as lost.
   void clear();
-  /// Counts a frame that went to the host past the queue.
+  /// Counts a frame that a read returned without the queue.
   void passed();
-  /// Counts frames that the card came too late to make.
+  /// Counts frames as lost that the card could not make, or not in time.
   void missed(std::uint64_t frames);
   void reset_counters();
   StreamCounters counters() const;
 
  private:
-  mutable std::mutex mutex_;  ///< guards everything below
+  mutable std::mutex mutex_;  ///< guards all members below
   std::condition_variable filled_;
   std::deque<ReadyFrame> frames_;
   std::size_t capacity_;

@@ -1,3 +1,4 @@
+// Builds ready-made frames with correct descriptors.
 #include <cstring>
 
 #include "card_state.h"

@@ -1,6 +1,6 @@
 /**
  * @file video_standard.h
- * The two video standards: lines of a frame and the exact period of a field.
+ * The two video standards: lines of a frame and exact period of a field.
  */
 #ifndef VIRTUAL_CARD_VIDEO_STANDARD_H
 #define VIRTUAL_CARD_VIDEO_STANDARD_H
@@ -13,12 +13,12 @@
 namespace virtual_card {
 
 struct VideoStandard {
-  u32 lines;               ///< of a frame
-  int nominal_frames;      ///< frames a second, rounded: what a burnt-in clock counts
+  u32 lines;               ///< lines of a frame
+  int nominal_frames;      ///< frames a second, rounded; the clock in the picture counts these
   std::int64_t period_ns;  ///< a field lasts exactly period_ns / period_parts nanoseconds
   std::int64_t period_parts;
 
-  /// Duration of a number of fields, rounded once: it does not drift.
+  /// Returns the duration of a number of fields. It is rounded only once, so rounding errors do not add up.
   constexpr std::chrono::nanoseconds duration(std::int64_t fields) const {
     return std::chrono::nanoseconds{fields * period_ns / period_parts};
   }
@@ -31,7 +31,7 @@ struct VideoStandard {
 inline constexpr VideoStandard kNtsc{480, 30, 50'050'000, 3};  // 1001 / 60000 s
 inline constexpr VideoStandard kPal{576, 25, 20'000'000, 1};   // 1 / 50 s
 
-/// The standard of a ZV_VIDEO_STANDARD; every value but NTSC is PAL.
+/// Returns the standard of a ZV_VIDEO_STANDARD; every value but NTSC is PAL.
 constexpr const VideoStandard &video_standard(u32 standard) {
   return standard == VIDEO_STANDARD_ZV_NTSC ? kNtsc : kPal;
 }

@@ -1,12 +1,12 @@
 /**
  * @file virtual_card.h
- * Control of the virtual card: what a hand at the machine could do to a real one, for tests and
- * benchmarks. Programs that only use the card never need this header.
+ * Control of the virtual card for tests and benchmarks: unplug cameras, move the clock, inject faults, read
+ * counters. Programs that only use the card do not need this header.
  *
- * All functions may be called from any thread. The card of this process is made at the first use of
- * a device node or of this interface, with the options of the environment variable ZARVO_VIRTUAL_CARD.
- * Channels count from 0 to 15, audio inputs and decoder chips from 0 to 3, one less than the numbers that
- * people read, in the environment variable too. One that does not exist throws std::out_of_range.
+ * All functions may be called from any thread. The first use of a device node or of this interface creates
+ * the card of this process, with the options of the environment variable ZARVO_VIRTUAL_CARD. Channels count
+ * from 0 to 15, audio inputs and decoder chips from 0 to 3; operators, and the environment variable, count
+ * from 1. A channel, input or chip that does not exist throws std::out_of_range.
  */
 #ifndef VIRTUAL_CARD_H
 #define VIRTUAL_CARD_H
@@ -18,19 +18,19 @@
 #include <string>
 #include <vector>
 
-// The library exports these functions and nothing else of its own.
+// The library exports these functions and the libc names, nothing else.
 #pragma GCC visibility push(default)
 
 namespace virtual_card {
 
 // --- Power -------------------------------------------------------------------------------------
 
-/// The card as built: power-up registers, all cameras plugged and moving, real-time clock, empty
-/// queues, no faults, no log, counters zero, no options. Only while no device node is open, else it
-/// says so on standard error and does nothing.
+/// Puts the card into its power-up state: initial registers, all cameras plugged and moving, real-time
+/// clock, empty queues, no faults, no log, counters zero, no options. While a device node is open, prints a
+/// line on standard error and does nothing.
 void reset();
 
-/// Number of descriptors on device nodes, and of mappings of their regions, now in use.
+/// Return the number of descriptors of device nodes and the number of mappings of their regions in use.
 int open_descriptors();
 int open_mappings();
 
@@ -42,83 +42,84 @@ enum class ClockMode {
   manual      ///< card time stands still until advance()
 };
 
-/// Card time begins at 0 again. Only while no device node is open, as reset(). `speed` counts with
-/// ClockMode::fast only.
+/// Sets the clock mode and starts card time at 0. Only ClockMode::fast uses `speed`. While a device node is
+/// open, or for a `speed` that is not above 0, prints a line on standard error and does nothing.
 void set_clock(ClockMode mode, double speed = 1.0);
 
-/// Manual clock: moves card time on, and returns when everything that became due has been drawn,
-/// encoded and queued. What is due at the very end of the time is not reached yet. Nothing happens
-/// with the other clocks.
+/// Manual clock: advances card time and returns when everything that became due has been drawn, encoded
+/// and queued. What is due exactly at the end of the step does not run yet. With the other clocks it does
+/// nothing.
 void advance(std::chrono::microseconds time);
-/// Manual clock: advance() by whole frames of the current standard, without rounding drift.
+/// Manual clock: advances by whole frames of the current standard; rounding errors do not add up.
 void advance_frames(int frames);
 
 // --- Cameras and audio inputs ------------------------------------------------------------------
 
 enum class Scene {
-  moving,  ///< bars, a moving object, the clock
-  still,   ///< bars and the channel number only: nothing moves
-  black    ///< a covered lens
+  moving,  ///< bars, a moving object, a running clock
+  still,   ///< bars and the channel number; nothing moves
+  black    ///< black, like a covered lens
 };
 
-/// The signal is lost: a blue picture, no motion, the decoder's video bit clear.
+/// Unplug or plug a camera. An unplugged camera has a blue picture and no motion, and its decoder's video bit
+/// is clear.
 void unplug_camera(unsigned channel);
 void plug_camera(unsigned channel);
-/// What is in front of a camera that has no film.
+/// Sets the scene in front of a camera. A film, if there is one, hides it.
 void set_scene(unsigned channel, Scene scene);
-/// Puts a video file in front of the camera; an empty path takes it away. False, with the reason in `error`,
-/// when it cannot be read as video.
+/// Puts a video file in front of a camera; an empty path removes it. Returns false, with the reason in
+/// `error`, when the file cannot be read as video.
 bool show_film(unsigned channel, const std::string &path, std::string *error = nullptr);
-/// No sound arrives: the decoder's audio bit is clear.
+/// Switch the sound of an audio input off or on. Without sound the decoder's audio bit is clear.
 void silence_input(unsigned input);
 void sound_input(unsigned input);
 
 // --- Ready-made data ---------------------------------------------------------------------------
 
-/// What the next read of a stream delivers: `area` is copied to the start of the stream's area as it
-/// is, and the read returns `result`. Nothing is checked, so that a card that lies can be played.
-/// For Motion JPEG the area starts at its descriptor, area offset 1024.
+/// Data for one read of a stream: the read copies `area` unchanged to the start of the stream's area and
+/// returns `result`. Neither is checked, so that a test can play a faulty card. The Motion-JPEG area starts
+/// at its descriptor, offset 1024.
 struct ReadyFrame {
   std::vector<std::uint8_t> area;
   long result;
 };
 
-/// An MPEG-4 frame with a right descriptor. `type` 0 is an intra frame; the time is card time.
+/// Returns an MPEG-4 frame with a correct descriptor. `type` 0 is an intra frame; `time` is the capture time
+/// in the descriptor.
 ReadyFrame mpeg4_frame(unsigned channel, unsigned type, const std::vector<std::uint8_t> &bitstream,
                        std::chrono::microseconds time = std::chrono::microseconds{0});
-/// A Motion-JPEG frame with a right descriptor around scan data (which ends in its own EOI).
+/// Returns a Motion-JPEG frame with a correct descriptor. `scan` is the scan data with its EOI marker.
 ReadyFrame mjpeg_frame(unsigned channel, unsigned width, unsigned height,
                        const std::vector<std::uint8_t> &scan);
 
-/// Frames wait in the stream's queue, in turn with the card's own; a full queue loses them.
+/// Append a frame to the stream's queue, behind the frames that wait there. A full queue drops it.
 void queue_mpeg4(ReadyFrame frame);
 void queue_mjpeg(ReadyFrame frame);
-/// Four blocks of 48 bytes, or whatever is given; 192 bytes at most reach the host.
+/// Appends audio data, normally four blocks of 48 bytes. The read delivers at most 192 bytes.
 void queue_audio(ReadyFrame blocks);
-/// The preview read stores `index` and returns `result`, once.
+/// The next preview read stores `index` and returns `result`. Several calls apply to several reads.
 void queue_preview(std::uint32_t index, long result);
 
-/// An endless supply of ready-made frames instead of the card's own encoders: the lists are
-/// delivered round and round from ENC_IOC_START on, `limit` reads of each stream at most.
+/// Ready-made frames that replace the card's encoders. From ENC_IOC_START each list is delivered again and
+/// again, in at most `limit` reads.
 struct Supply {
   std::vector<ReadyFrame> mpeg4;
   std::vector<ReadyFrame> mjpeg;
   std::vector<ReadyFrame> audio;
-  double video_rate = 0;  ///< frames of each stream a second of card time; 0: as fast as they are read
-  double audio_rate = 0;  ///< blocks of four a second of card time; 0: as fast as they are read
+  double video_rate = 0;  ///< frames a second of card time, each stream; 0: one for each read
+  double audio_rate = 0;  ///< reads of four blocks a second of card time; 0: one for each read
   std::uint64_t limit = ~std::uint64_t{0};
 };
 void set_supply(Supply supply);
-/// Back to the card's own encoders.
+/// Ends the supply: the card's encoders deliver again.
 void clear_supply();
 
-/// Reads of an empty stream return at once, as another driver's might, instead of waiting up to 10 ms.
+/// Makes reads of an empty stream return at once instead of waiting up to 10 ms, as other drivers may do.
 void set_nowait(bool on);
 
 // --- Registers and replies ---------------------------------------------------------------------
 
-/// What the chips hold, as the driver's register commands would read and write it; what hangs on a register
-/// changes with it.
+/// Read and write registers of the chips. A write has the same effects as the driver's register command.
 std::uint32_t codec_register(std::uint32_t address);
 void set_codec_register(std::uint32_t address, std::uint32_t value);
 std::uint32_t video_input_register(std::uint32_t address);
@@ -126,15 +127,16 @@ void set_video_input_register(std::uint32_t address, std::uint32_t value);
 std::uint8_t decoder_register(unsigned chip, unsigned address);
 void set_decoder_register(unsigned chip, unsigned address, std::uint8_t value);
 
-/// The board controller answers the next commands of this code with these replies, one each, then for
-/// itself again. A command is carried out only when its reply is the one that confirms it.
+/// Sets the board controller's replies to the next commands with this code, one reply for each command.
+/// After them it replies normally. If a scripted reply is not the confirming one, the command is not carried
+/// out.
 void script_board_replies(std::uint32_t command, std::vector<std::uint32_t> replies);
-/// The board revision that command 0x3A answers: 0x00, 0xBB, 0xCC or 0xDD.
+/// Sets the reply to the version command 0x3A: 0x00, 0xBB, 0xCC or 0xDD.
 void set_board_version(std::uint32_t reply);
-/// DISP_IOC_GET_MOTION answers these bits instead of what the card has detected, until reset.
+/// Makes DISP_IOC_GET_MOTION return these bits instead of the detected motion, until reset().
 void script_motion(std::uint32_t bits);
-/// What VIN_IOC_GET_MOTION_LEVELS answers for a channel, and its threshold until a map is set: 0 to 0xFFFF,
-/// which never moves.
+/// Sets the motion threshold of all blocks of a channel, which VIN_IOC_GET_MOTION_LEVELS then returns. 0xFFFF
+/// never reports motion.
 void set_motion_level(unsigned channel, std::uint16_t level);
 
 // --- Log ---------------------------------------------------------------------------------------
@@ -147,25 +149,25 @@ struct Call {
   Device device;
   std::uint32_t code = 0;  ///< ioctl: command code
   std::vector<std::uint8_t>
-      argument{};            ///< ioctl: the record as it came in, the motion map's thresholds behind it
-  std::uintptr_t value = 0;  ///< ioctl: the third argument itself; read: the buffer address
+      argument{};            ///< ioctl: the record before the command; a motion map's thresholds follow it
+  std::uintptr_t value = 0;  ///< ioctl: third argument; read: buffer address
   std::size_t size = 0;      ///< read: count; mmap and munmap: length
   int protection = 0;        ///< mmap
   int flags = 0;             ///< open and mmap
-  long result = 0;           ///< as the host got it; 0 for a mapping
+  long result = 0;           ///< result that the host received; 0 for a mapping
 };
 
-/// Starts the log afresh, or ends it. It is off at first.
+/// Clears the log and starts it, or stops it. The log is off at first.
 void record_log(bool on);
-/// What was done to the device nodes since record_log(true), in order.
+/// Returns the calls on device nodes since record_log(true), in order.
 std::vector<Call> log();
 
 // --- Faults ------------------------------------------------------------------------------------
 
-/// Makes an operation on the device nodes fail: the `countdown`-th matching one from now (1 is the
-/// next), once or from then on for good. `device` none matches every node, `code` 0 every command.
-/// The operation then does nothing, but for close, which reports the error and closes the descriptor
-/// all the same, as Linux does.
+/// Makes an operation on the device nodes fail with `error`: the `countdown`-th matching operation from now
+/// (1 is the next), and with `for_good` all that follow. `device` none matches every node, `code` 0 every
+/// command. A failing operation does nothing, except close: it fails and still closes the descriptor, as in
+/// Linux.
 struct Fault {
   Operation operation;
   int countdown = 1;
@@ -174,18 +176,18 @@ struct Fault {
   Device device = Device::none;
   std::uint32_t code = 0;
 };
-/// There is one injector; a new fault replaces the old one and sets the hits to 0.
+/// Sets the fault and the number of hits to 0. There is only one fault: it replaces an earlier one.
 void inject(Fault fault);
 void clear_fault();
-/// How often the fault has struck.
+/// Returns how many operations the fault has made fail.
 int fault_hits();
 
 // --- Counters ----------------------------------------------------------------------------------
 
 struct StreamCounters {
-  std::uint64_t made = 0;       ///< frames encoded, or supplied and come due
-  std::uint64_t delivered = 0;  ///< frames handed to a read
-  std::uint64_t lost = 0;       ///< frames dropped since the host was too slow
+  std::uint64_t made = 0;       ///< frames encoded, or supplied and due; lost ones too
+  std::uint64_t delivered = 0;  ///< frames that a read returned
+  std::uint64_t lost = 0;       ///< frames dropped: queue full, or the card could not make them
 };
 
 struct Counters {
@@ -194,7 +196,7 @@ struct Counters {
   StreamCounters audio;
   std::uint64_t previews = 0;         ///< preview pictures composed
   std::uint64_t watchdog_kicks = 0;   ///< times the watchdog was started or fed
-  std::uint64_t watchdog_resets = 0;  ///< times it would have reset the machine
+  std::uint64_t watchdog_resets = 0;  ///< times the watchdog would have reset the machine
   bool watchdog_running = false;
 };
 Counters counters();

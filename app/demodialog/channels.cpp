@@ -1,5 +1,4 @@
-/// Channel selection: one row of sixteen boxes that shows and edits three channel sets and shows two
-/// kinds of status.
+// Channel selection: sixteen check boxes that show and edit three channel sets and show two kinds of status.
 #include <unistd.h>
 
 #include <cstdio>
@@ -15,18 +14,18 @@ namespace {
 constexpr unsigned kAudioMask = (1u << ZV_AUDIO_CHANNELS) - 1u;
 constexpr const char *kAudioChannelsError = "ERROR:zv_EnableAudioChannels Error!";
 
-/// Sends the preview set. The preview thread changes the same windows.
+/// Sends the preview set, under the mutex, since the preview thread changes the same windows.
 void send_preview_channels() {
   const std::lock_guard lock(layout_mutex);
   sdk_ok(zv_EnablePreviewChannels(zv_handle, g_preview_ch), "ERROR:zv_EnablePreviewChannels Error!");
 }
 
-/// Makes the first `count` boxes editable and the others not.
+/// Enables the first `count` boxes and disables the other boxes.
 void enable_boxes(unsigned count) {
   for (unsigned n = 0; n < ZV_CHANNELS; ++n) g_check_handle[n]->setEnabled(n < count);
 }
 
-/// Shows a status on the boxes, which then belong to none of the editing modes.
+/// Shows a status on the boxes and leaves the editing mode.
 void show_status(DemoDialog &dialog, unsigned status, const QString &title) {
   dialog.SetCheckBox(status);
   enable_boxes(0);

@@ -1,3 +1,7 @@
+/**
+ * @file demodialog.h
+ * The operator's dialog.
+ */
 #ifndef DEMODIALOG_H
 #define DEMODIALOG_H
 
@@ -9,8 +13,8 @@
 #include "global.h"
 #include "ui_demodialog.h"
 
-/// The operator's dialog. The form makes the widgets and connects them; each panel's slots stand in
-/// a source of their own. All of it runs on the GUI thread.
+/// The dialog. The form creates and connects the widgets; each panel's slots are in a source file of their
+/// own. All functions run on the GUI thread.
 class DemoDialog : public QDialog, public Ui::DemoDialog {
   Q_OBJECT
 
@@ -91,7 +95,7 @@ class DemoDialog : public QDialog, public Ui::DemoDialog {
   void init();
   void destroy();
 
-  std::optional<FormFit> form_fit;  // none until the widgets exist
+  std::optional<FormFit> form_fit;  // empty until the widgets exist
 };
 
 #endif

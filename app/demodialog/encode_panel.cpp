@@ -1,5 +1,5 @@
-/// The encode panel: one encoder configuration for every recorded channel, and the number of channels
-/// its quality allows.
+// The encode panel: one encoder configuration for all recorded channels, and the number of channels that its
+// quality allows.
 #include <unistd.h>
 
 #include <cstdio>
@@ -18,7 +18,7 @@ constexpr u32 kDefaultGop = 30;
 constexpr i32 kKilo = 1024;
 constexpr i32 kMega = 1048576;
 
-// Items to values; 0 stands for the first item, which chooses none of the values.
+// The values of the items of the combo boxes. 0 belongs to the first item, which chooses no value.
 constexpr u32 kQuantisers[] = {0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 30};
 constexpr i32 kBitRates[] = {0,         64 * kKilo, 128 * kKilo, 256 * kKilo, 512 * kKilo,
                              1 * kMega, 2 * kMega,  3 * kMega,   4 * kMega,   5 * kMega,
@@ -26,12 +26,12 @@ constexpr i32 kBitRates[] = {0,         64 * kKilo, 128 * kKilo, 256 * kKilo, 51
 constexpr u32 kGops[] = {kDefaultGop, 1, 2, 3, 5, 10, 15, 20, 25, 30};
 constexpr ZV_JPEG_QUALITY kJpegQualities[] = {JPEG_QP_ZV_LOW, JPEG_QP_ZV_HIGH};
 
-// Range of the quantiser, and what is stored where the operator gives no bound.
+// The highest upper bound of the quantiser, and the bounds stored when the operator enters none.
 constexpr int kHighestQpMax = 59;
 constexpr u32 kDefaultQpMax = 15;
 constexpr u32 kDefaultQpMin = 2;
 
-/// edtScale, by ZV_SCALE_VALUE.
+/// The texts of edtScale, by ZV_SCALE_VALUE.
 const char *const kScaleNames[] = {
     QT_TRANSLATE_NOOP("DemoDialog", "No Encoding"), QT_TRANSLATE_NOOP("DemoDialog", "Half D1"),
     QT_TRANSLATE_NOOP("DemoDialog", "CIF"), QT_TRANSLATE_NOOP("DemoDialog", "D1")};
@@ -55,7 +55,7 @@ void keep_quantiser_range(u32 enable, u32 max, u32 min) {
   zv_config.QPMin = min;
 }
 
-/// "None" is chosen: nothing can be recorded.
+/// Disables recording, since the operator has chosen "None".
 void switch_recording_off(DemoDialog &dialog) {
   for (QRadioButton *mode : {dialog.radioEnRecord, dialog.radioEnAudio}) {
     mode->setEnabled(false);
@@ -71,7 +71,7 @@ void switch_recording_off(DemoDialog &dialog) {
   dialog.btnRecordStop->setEnabled(false);
 }
 
-/// Takes the picture size, and with it the field mode and the channels that may be recorded.
+/// Stores the picture size, and the field mode and the channels that it allows.
 void choose_quality(DemoDialog &dialog, const Quality &quality) {
   const bool d1 = quality.scale == SCALE_ZV_D1;
   if (d1) dialog.combowTwoField->setCurrentIndex(0);
@@ -83,7 +83,7 @@ void choose_quality(DemoDialog &dialog, const Quality &quality) {
   dialog.btnRecordStart->setEnabled(true);
 }
 
-/// Lets the boxes edit the record set, with the allowed channels chosen.
+/// Makes the boxes show and edit the record set.
 void show_record_set(DemoDialog &dialog) {
   dialog.radioEnRecord->setEnabled(true);
   dialog.radioEnAudio->setEnabled(true);
@@ -95,7 +95,8 @@ void show_record_set(DemoDialog &dialog) {
   g_channel_mode = ENABLE_RECORD;
 }
 
-/// Hands every channel its settings: the panel's to the recorded ones, the clean ones to the others.
+/// Stores the settings of all channels: the panel's settings for recorded channels, clean settings for the
+/// others.
 void store_configs() {
   for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) {
     if (g_record_ch >> channel & 1u) {
@@ -106,7 +107,8 @@ void store_configs() {
   }
 }
 
-/// Reads back the first channel that encodes, or channel 16 when none does. False when a read failed.
+/// Reads back the settings of the first channel that has a scale, or of channel 16 when no channel has one.
+/// Returns false when a read fails.
 bool read_first_encoding(ZV_VIDEO_CONFIG &record) {
   for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) {
     if (!sdk_ok(zv_GetVideoEncodeConfig(zv_handle, channel, &record),
@@ -175,7 +177,7 @@ void DemoDialog::SetGOP() {
   zv_config.gop = item_value(kGops, comboGOPValue->currentIndex(), kDefaultGop);
 }
 
-// A fixed quantiser and a held bit rate exclude each other: choosing one puts the other back.
+// A fixed quantiser and a constant bit rate exclude each other: choosing one resets the other.
 void DemoDialog::SetQP() {
   const u32 qp = item_value(kQuantisers, comboQPvalue->currentIndex(), 0u);
   if (qp == 0) {

@@ -1,3 +1,4 @@
+// Stretches the form so that all texts fit.
 #include "form_fit.h"
 
 #include <QComboBox>
@@ -12,7 +13,7 @@
 
 namespace {
 
-// Room around a text, pixels: frame and padding, and a combo box's arrow.
+// Pixels around a text: frame and padding, and the arrow of a combo box.
 constexpr int kPadding = 4;
 constexpr int kArrow = 22;
 

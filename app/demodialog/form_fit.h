@@ -1,15 +1,19 @@
+/**
+ * @file form_fit.h
+ * Stretches the form so that all texts fit.
+ */
 #ifndef FORM_FIT_H
 #define FORM_FIT_H
 
 #include <QGroupBox>
 #include <vector>
 
-/// Gives the dialog's groups and the widgets in them the places of the form or, where a larger font,
-/// another style or a longer text needs more room, those places stretched just as far as it takes:
-/// by one factor across and one down for the whole dialog. Each group can get no smaller than that.
+/// Places the dialog's groups and the widgets in them as in the form. If a font, a style or a text needs more
+/// room, stretches all places by two factors, one for widths and one for heights, which are only as large as
+/// necessary. The result is the minimum size of each group.
 class FormFit {
  public:
-  /// The dialog as the form has made it, before it is first fitted.
+  /// Takes the places from the dialog. Create it after setupUi() and before the first fit().
   explicit FormFit(const QWidget &dialog);
   void fit() const;
 

@@ -1,3 +1,4 @@
+// The life of the dialog: construction, language change, exit and destruction.
 #include <unistd.h>
 
 #include <QEvent>
@@ -17,7 +18,8 @@ namespace {
 constexpr QSize kLeastSize(728, 780);
 constexpr int kTestPasses = 10;
 
-// A card that opens once but not again is of no use to an operator: it is tried before it is used.
+// Opens and closes the card several times before it is used: a card that can be opened only once is of no
+// use.
 void test_open_close() {
   for (int pass = 0; pass < kTestPasses; ++pass) {
     const std::string tried = " Error!, try count = " + std::to_string(pass);
@@ -36,7 +38,8 @@ void open_card() {
   sdk_ok(zv_SetResolution(zv_handle, zv_resolution), "ERROR:zv_zv_SetResolution Error!");
 }
 
-// The form gives a combo box's items their texts by number, so there must be as many as it knows.
+// Replaces the items of a combo box by the same number of empty items: retranslateUi() sets their texts by
+// number.
 void refill(QComboBox *combo) {
   const int items = combo->count();
   combo->clear();
@@ -50,7 +53,7 @@ DemoDialog::DemoDialog(QWidget *parent, const char *name, bool modal, unsigned i
   setModal(modal);
   setupUi(this);
   form_fit.emplace(*this);
-  if (name != nullptr) setObjectName(QString::fromUtf8(name));  // an empty one, too
+  if (name != nullptr) setObjectName(QString::fromUtf8(name));  // also an empty name
   languageChange();
   resize(kLeastSize.expandedTo(minimumSizeHint()));
   init();
@@ -61,7 +64,7 @@ DemoDialog::~DemoDialog() {
 }
 
 void DemoDialog::languageChange() {
-  // The chosen items stay chosen: the settings they stand for have not changed.
+  // Keep the chosen items: their settings have not changed.
   QList<std::pair<QComboBox *, int>> chosen;
   for (QComboBox *combo : findChildren<QComboBox *>())
     if (combo != comboFrameRate) chosen.emplace_back(combo, combo->currentIndex());
@@ -106,7 +109,7 @@ void DemoDialog::init() {
     range.slider->setRange(range.least, range.most);
     range.slider->setValue(0);
   }
-  // The sliders follow the edits.
+  // Set the edits after the sliders: each edit moves its slider.
   for (const Range &range : ranges) range.edit->setText(QLatin1String(range.neutral));
 
   edtRecordPath->setText(QFile::decodeName(g_filepath));
@@ -122,7 +125,7 @@ void DemoDialog::ExitDialog() {
   sleep(1);
   join_preview_thread();
   pthread_mutex_destroy(&thread_mutex);
-  thread_mutex = PTHREAD_MUTEX_INITIALIZER;  // valid for whoever is closed or built next
+  thread_mutex = PTHREAD_MUTEX_INITIALIZER;  // valid for a dialog that is closed or created later
   if (g_finish_record == 0) {
     zv_Stop(zv_handle);
     CloseFile();
@@ -131,7 +134,7 @@ void DemoDialog::ExitDialog() {
 }
 
 void DemoDialog::destroy() {
-  // What uses the card must not outlive it, even when the dialog goes without ExitDialog().
+  // End everything that uses the card before it is closed, also when ExitDialog() was not called.
   timer.stop();
   stop_preview_thread();
   join_preview_thread();

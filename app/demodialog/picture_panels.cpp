@@ -1,5 +1,5 @@
-/// The panels that edit one card setting each: picture properties, focus, privacy mask, motion
-/// sensitivity, motion areas, motion detection. Numbers go to the SDK as typed; it alone refuses.
+// The panels that edit one card setting each: picture properties, focus, privacy mask, motion sensitivity,
+// motion areas, motion detection. Numbers go to the SDK as typed; only the SDK checks them.
 #include <cstdio>
 #include <cstring>
 #include <mutex>
@@ -11,7 +11,7 @@
 
 namespace {
 
-/// One picture property: its place in the form and in the record.
+/// A picture property: its edit, its slider, its member in the record and its printed line.
 struct PropertyRow {
   QLineEdit *DemoDialog::*edit;
   QSlider *DemoDialog::*slider;
@@ -28,8 +28,8 @@ const PropertyRow kProperties[] = {
      "Brightness = %d\n"},
 };
 
-/// One edge of a rectangle: its edit in the mask panel and in the motion area panel, its field in both
-/// records, and its line.
+/// An edge of a rectangle: its edits in the mask panel and the motion area panel, its member in both records,
+/// and its printed line.
 struct EdgeRow {
   QLineEdit *DemoDialog::*mask_edit;
   QLineEdit *DemoDialog::*area_edit;
@@ -44,14 +44,14 @@ const EdgeRow kEdges[] = {
     {&DemoDialog::edtBottom, &DemoDialog::edtMBottom, &ZV_RECT::y_end, "channel %d : Bottom= %d\n"},
 };
 
-/// What the mask panel shows where nothing could be read: every byte 9.
+/// If the mask cannot be read, the panel shows numbers of which every byte is 9.
 constexpr int kUnreadByte = 0x09;
 
 u32 channel_of(const QComboBox *combo) {
   return static_cast<u32>(combo->currentIndex());
 }
 
-/// A typed number as the SDK takes it; a negative one becomes a large one, which the SDK refuses.
+/// Returns the number in an edit as unsigned. A negative number becomes a large one, which the SDK refuses.
 u32 unsigned_in(const QLineEdit *edit) {
   return static_cast<u32>(number_in(edit));
 }

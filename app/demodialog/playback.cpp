@@ -1,4 +1,4 @@
-/// Hands a recording to a player outside this program.
+// Starts a player program for a recording.
 #include <QDir>
 #include <QFileDialog>
 #include <QFileInfo>
@@ -11,13 +11,13 @@
 
 namespace {
 
-/// Qt takes a double quote in a typed name for the end of a name. Here what stands in the edit is the name
-/// when there is such a file.
+/// A file dialog that accepts names with a double quote. Qt takes a double quote in a typed name for the
+/// end of the name; this dialog takes the whole text of the edit as the name if such a file exists.
 class RecordingChooser : public QFileDialog {
  public:
   using QFileDialog::QFileDialog;
 
-  /// The chosen file, symbolic links resolved; empty before one was chosen.
+  /// Returns the chosen file with symbolic links resolved; empty when no file is chosen.
   QString chosen() const {
     const QString file = typed_.isEmpty() ? selectedFiles().value(0) : typed_;
     const QString resolved = QFileInfo(file).canonicalFilePath();
@@ -37,7 +37,8 @@ class RecordingChooser : public QFileDialog {
   QString typed_;
 };
 
-/// Lets the operator choose a recording in the working directory; empty when the choice is cancelled.
+/// Lets the operator choose a recording, starting in the working directory. Returns an empty path when the
+/// operator cancels.
 QByteArray choose_recording(QWidget *parent) {
   RecordingChooser chooser(parent, DemoDialog::tr("Choose a file to playback"), QDir::currentPath(),
                            QStringLiteral("Video (*.rec);; Audio (*.aud)"));
@@ -47,8 +48,8 @@ QByteArray choose_recording(QWidget *parent) {
   return chooser.exec() == QDialog::Accepted ? QFile::encodeName(chooser.chosen()) : QByteArray();
 }
 
-/// The path as one word of the shell, whatever characters it has: single quotes keep everything but a
-/// single quote, which is put between two quoted pieces.
+/// Returns a path as one word of the shell, whatever characters it has. The word is in single quotes; a
+/// single quote in the path ends the quoting, is escaped, and starts the quoting again.
 std::string shell_word(const QByteArray &path) {
   std::string word = "'";
   for (const char c : path) {

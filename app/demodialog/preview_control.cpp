@@ -1,3 +1,4 @@
+// Starts and stops the preview; sets split, standard and resolution.
 #include <cstdlib>
 
 #include "app_state.h"

@@ -1,6 +1,6 @@
 /**
  * @file qualities.h
- * The items of comboQualityMode.
+ * The picture sizes that comboQualityMode offers, and the number of channels that each allows.
  */
 #ifndef QUALITIES_H
 #define QUALITIES_H
@@ -8,23 +8,23 @@
 #include "panel_helpers.h"
 #include "zv_type.h"
 
-/// A picture size, and its share of what the card can encode.
+/// A picture size and its share of the card's encoding budget.
 struct Quality {
   ZV_SCALE_VALUE scale;
   int cif_pictures;  ///< size in CIF pictures
 };
 
-/// In the order of the items; "None" is the first.
+/// The qualities in the order of the items; "None" is the first item.
 inline constexpr Quality kQualities[] = {
     {SCALE_ZV_NO_ENCODE, 0}, {SCALE_ZV_CIF, 1}, {SCALE_ZV_HALF_D1, 2}, {SCALE_ZV_D1, 4}};
 
-/// The quality of an item; "None" for an index without one.
+/// Returns the quality of an item, or "None" for an index without an item.
 inline Quality quality_of(int item) {
   return item_value(kQualities, item, kQualities[0]);
 }
 
-/// How many channels the card encodes at the full rate: sixteen CIF channels with one field, or as many
-/// pictures in another size. Two fields count twice.
+/// Returns how many channels the card encodes at the full rate: its budget is sixteen one-field CIF channels.
+/// Two fields count twice.
 constexpr int allowed_channels(const Quality &quality, ZV_TWOFIELD_MODE fields) {
   if (quality.scale == SCALE_ZV_NO_ENCODE) return 0;
   return ZV_CHANNELS / (quality.cif_pictures * (fields == TWOFIELD_ENABLE ? 2 : 1));

@@ -1,4 +1,5 @@
-/// Starting, stopping and rotating a recording, its three settings, and the callbacks that write it.
+// Starts and stops a recording, starts new files every hour, reads the three recording settings, and has the
+// callbacks that write the files.
 #include <sys/stat.h>
 #include <sys/vfs.h>
 #include <unistd.h>
@@ -22,8 +23,8 @@ constexpr const char *kNoSpace = "No enough disk space";
 
 constexpr int kBytesPerKilobit = 1024 / 8;
 
-/// Appends a delivery to the file open for it; false when there is none. The GUI thread opens the files
-/// before the capture starts and closes them after it has ended, so no lock is needed.
+/// Appends data to the open file with this index. Returns false when no such file is open. The GUI thread
+/// opens the files before capture starts and closes them after it has ended, so no lock is needed.
 template <std::size_t N>
 bool append(FILE *const (&files)[N], unsigned index, const unsigned char *data, int length) {
   if (index >= N || !files[index]) return false;
@@ -31,14 +32,15 @@ bool append(FILE *const (&files)[N], unsigned index, const unsigned char *data, 
   return true;
 }
 
-/// A folder this process can enter, with a path short enough for all the paths below it.
+/// Returns whether a path is a folder that this process can enter, and short enough for all paths below it.
 bool is_root(const QByteArray &path) {
   if (static_cast<std::size_t>(path.size()) > recording::kMaxRootBytes || path.contains('\0')) return false;
   struct stat info {};
   return stat(path.constData(), &info) == 0 && S_ISDIR(info.st_mode) && access(path.constData(), X_OK) == 0;
 }
 
-/// A number typed into a recording setting. One out of its range, or none, is replaced by 10 in the edit.
+/// Returns the number in the edit of a recording setting. Replaces a number out of range, or no number, by
+/// 10 in the edit.
 int setting_in(QLineEdit *edit, int lowest, int highest) {
   constexpr int kFallback = 10;
   const int value = number_in(edit);
@@ -70,7 +72,7 @@ void audio_call_back(unsigned int ch, unsigned char *data, int length, int) {
 }
 
 void DemoDialog::StartRecord() {
-  // A second start would truncate the files that the capture threads are writing.
+  // A second start would truncate the files that the capture threads write.
   if (timer.isActive()) return;
   if (std::strlen(g_filepath) > recording::kMaxRootBytes || !CheckDiskSpace(g_filepath)) {
     std::puts(kNoSpace);

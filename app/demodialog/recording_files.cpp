@@ -1,4 +1,5 @@
-// The recording files of the dialog: the folders, and opening, heading and closing the files of an hour.
+// The recording files of the dialog: creates the folders, opens the files of an hour, writes their headers
+// and closes them.
 #include <cstdio>
 #include <string>
 
@@ -13,13 +14,13 @@ namespace {
 
 using recording::Kind;
 
-/// Makes the day's folders of one kind and keeps the path of the day.
+/// Creates the day's folders of a kind and stores the path of the day's folder.
 void make_day(const std::string &root, Kind kind, const std::tm &now, char (&kept)[256]) {
   recording::make_day_folder(root, kind, now);
   std::snprintf(kept, sizeof kept, "%s", recording::day_folder(root, kind, now).c_str());
 }
 
-/// Null when the file cannot be opened or there is no day folder.
+/// Opens a recording file. Returns null when it cannot be opened or there is no day folder.
 FILE *open_file(const char *day_path, unsigned index, const std::string &name) {
   if (*day_path == '\0') return nullptr;
   return recording::open_unbuffered(recording::channel_folder(day_path, index) + "/" + name);
@@ -30,7 +31,7 @@ void close_entry(FILE *&entry) {
   entry = nullptr;
 }
 
-/// Size of the recorded picture; "None" keeps the last size.
+/// Stores the size of the recorded picture. "None" does not change the size.
 void update_record_size(ZV_SCALE_VALUE scale) {
   if (scale == SCALE_ZV_NO_ENCODE) return;
   const auto [width, height] = recording::picture_size(scale, zv_format, zv_resolution);

@@ -1,3 +1,4 @@
+// Enables and disables widgets when an activity starts or stops.
 #include <vector>
 
 #include "app_state.h"
@@ -7,10 +8,10 @@ namespace {
 
 struct Row {
   std::vector<QWidget *> widgets;
-  const char *effect;  // one sign for each UI_STATUS
+  const char *effect;  // one character for each UI_STATUS
 };
 
-// What a sign of the table does to the enabled state of the row's widgets.
+// Enables or disables the widgets of a row as a character of its effect says.
 void apply(const Row &row, char sign) {
   bool on = false;
   switch (sign) {
@@ -36,13 +37,13 @@ void apply(const Row &row, char sign) {
 
 }  // namespace
 
-// + on, - off, blank as it was; on only if: r no recording runs, p no preview runs, a the boxes do
-// not show the audio inputs.
+// Characters: + enables, - disables, blank changes nothing. r enables if no recording runs, p if no preview
+// runs, a if the boxes do not show the audio inputs; otherwise they disable.
 void DemoDialog::UpdateUI(UI_STATUS status) {
   const std::vector<QWidget *> first_four(g_check_handle, g_check_handle + 4);
   const std::vector<QWidget *> other_twelve(g_check_handle + 4, g_check_handle + 16);
   const Row table[] = {
-      // preview, recording, playback, motion: start and stop of each
+      // Two columns each, start and stop: preview, recording, playback, motion.
       {{btnPreviewStart}, "-+      "},
       {{btnPreviewStop}, "+-      "},
       {{radioNTSC, radioPAL, radio720, radio704}, "-r-p    "},

@@ -1,4 +1,4 @@
-/// Videoplayer FILE: plays a video recording (".rec") with ffplay, or with mpv where ffplay is missing.
+// Videoplayer FILE: plays a video recording (".rec") with ffplay, or with mpv if ffplay is not installed.
 #include <cstdio>
 
 #include "launch.h"
@@ -7,13 +7,13 @@
 
 namespace {
 
-/// The demuxer that splits the stream behind the header into frames.
+/// Returns the name of the demuxer that splits the stream behind the header into frames.
 const char *stream_format(ZV_VIDEO_CODEC codec) {
   return codec == VIDEO_CODEC_ZV_MJPEG ? "mjpeg" : "m4v";
 }
 
-/// A camera's picture is 4:3 whatever its size in pixels; the pixels of a half-height one are not square. The
-/// players skip the header, so that they can seek in the file.
+/// Returns the command lines of both players. They show every picture as 4:3, whatever its size in pixels.
+/// The players get the whole file, so that they can seek, and skip the header themselves.
 std::vector<players::PlayerCommand> player_commands(const RECORD_FILE_HEADER &header,
                                                     const std::string &format, const std::string &file) {
   const std::string title = recording::label_of(header) + " - " + players::base_name(file);
@@ -45,5 +45,5 @@ int main(int argc, char **argv) {
     std::fprintf(stderr, "%s: no recording header\n", argv[1]);
     return 1;
   }
-  return players::hand_over(player_commands(*header, stream_format(*codec), argv[1]));
+  return players::run_first_installed(player_commands(*header, stream_format(*codec), argv[1]));
 }

@@ -1,3 +1,4 @@
+// Opens a recording and starts an installed player.
 #include "launch.h"
 
 #include <fcntl.h>
@@ -11,7 +12,7 @@
 namespace players {
 namespace {
 
-/// Returns only when the program cannot be run; then errno tells why.
+/// Replaces this process by a program. Returns only when that fails; errno then holds the reason.
 void run(const PlayerCommand &command) {
   std::vector<char *> argv = {const_cast<char *>(command.program.c_str())};
   for (const std::string &argument : command.arguments) argv.push_back(const_cast<char *>(argument.c_str()));
@@ -46,8 +47,8 @@ std::string base_name(const std::string &path) {
   return path.substr(path.rfind('/') + 1);
 }
 
-int hand_over(const std::vector<PlayerCommand> &commands) {
-  // Whoever started this program may have left its own descriptors open, the card's among them.
+int run_first_installed(const std::vector<PlayerCommand> &commands) {
+  // Do not pass on descriptors of the program that started this one, for example those of the card.
   closefrom(STDERR_FILENO + 1);
   bool installed = false;
   for (const PlayerCommand &command : commands) {

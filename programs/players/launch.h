@@ -1,6 +1,6 @@
 /**
  * @file launch.h
- * What both players have in common: opening a recording and handing it to an installed player.
+ * Functions that both players use: open a recording and start an installed player.
  */
 #ifndef LAUNCH_H
 #define LAUNCH_H
@@ -12,22 +12,22 @@
 
 namespace players {
 
-/// A player to hand a recording to, with its arguments.
+/// A player program and its arguments.
 struct PlayerCommand {
   std::string program;
   std::vector<std::string> arguments;
 };
 
-/// Opens the one FILE argument of a player for reading. -1 when it is no file with more than `header` bytes;
-/// the reason or the usage stands on standard error then.
+/// Opens the only argument, FILE, for reading. Returns the descriptor. If FILE is not a regular file with
+/// more than `header` bytes, prints the reason or the usage on standard error and returns -1.
 int open_argument(int argc, char **argv, off_t header);
 
-/// The last part of a path.
+/// Returns the last part of a path.
 std::string base_name(const std::string &path);
 
-/// Replaces this process by the first of the players that is installed; all descriptors but the standard ones
-/// are closed. Returns 1, with a message on standard error, when no player can be run.
-int hand_over(const std::vector<PlayerCommand> &commands);
+/// Closes all descriptors but the standard ones and replaces this process by the first of the players that is
+/// installed. If none can be run, prints a message on standard error and returns 1.
+int run_first_installed(const std::vector<PlayerCommand> &commands);
 
 }  // namespace players
 

@@ -1,6 +1,6 @@
 /**
  * @file audio.cpp
- * The audio data thread.
+ * The audio data thread, which reads audio blocks and calls the audio callback.
  */
 #include <unistd.h>
 
@@ -32,7 +32,7 @@ void *get_audio_data_thread(void *argument) {
   const RunFlag running{zv_audio_thread_enable, mutex_zv_audio_enable};
   while (running.is_set()) {
     if (card.audio_mask != 0) {
-      // The count is in blocks: the driver fills one block an input.
+      // The driver takes the count in blocks, not bytes: it fills one block for each input.
       if (read(card.g723_fd, audio_buf, driver::kAudioReadCount) <= 0) continue;
       deliver_blocks(card);
     }

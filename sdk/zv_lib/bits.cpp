@@ -1,3 +1,4 @@
+// The bit helpers and the busy-wait delay.
 #include "zv_bits.h"
 
 #include <sys/time.h>
@@ -33,5 +34,5 @@ std::int64_t wall_clock_us() {
 void zv_delay(u32 us) {
   std::int64_t start = wall_clock_us();
   for (std::int64_t now = start; now - start < us; now = wall_clock_us())
-    if (now < start) start = now;  // someone has set the clock back
+    if (now < start) start = now;  // the clock was set back: count from here
 }

@@ -1,16 +1,16 @@
 /**
  * @file capture.cpp
- * Start and stop of capture, and the video data thread that takes frames from the encoder to the
- * callbacks. Frames stay where the driver put them: a header goes into the space in front.
+ * Start and stop of capture, and the video data thread, which passes frames from the encoder to the
+ * callbacks. Frames are not copied: the header is written into the space in front of them.
  */
 #include <unistd.h>
 
 #include <cstdint>
-#include <cstdio>
 #include <cstring>
 
 #include "command.h"
 #include "internal.h"
+#include "print.h"
 #include "stream_headers.h"
 #include "zv_bits.h"
 #include "zv_card.h"
@@ -31,10 +31,10 @@ namespace {
 
 constexpr std::uint64_t kPollPeriod = 100000;  ///< microseconds of capture time
 
-/// What the video data thread keeps between frames.
+/// State that the video data thread keeps between frames.
 struct VideoState {
   JpegHeader jpeg_header = jpeg_header_template();
-  std::uint64_t next_poll = 0;  ///< capture time of the next look at motion and video loss
+  std::uint64_t next_poll = 0;  ///< capture time from which motion and video loss are polled again
 };
 
 struct Mpeg4Frame : driver::Mpeg4Head {
@@ -47,8 +47,8 @@ u32 word_at(const u8 *bytes) {
   return word;
 }
 
-/// The one place where an MPEG-4 descriptor is believed. False when the frame would reach beyond
-/// the MPEG-4 area.
+/// Reads the MPEG-4 descriptor. Only this function takes values from it, so it checks them. Returns false
+/// when the frame would exceed the MPEG-4 area.
 bool parse_mpeg4(const u8 *area, Mpeg4Frame &frame) {
   frame = {driver::unpacked_head(word_at(area)),
            std::uint64_t{word_at(area + driver::kMpeg4TimeSeconds)} * 1000000 +
@@ -56,7 +56,8 @@ bool parse_mpeg4(const u8 *area, Mpeg4Frame &frame) {
   return frame.length <= driver::kMpeg4AreaSize - driver::kMpeg4DescriptorSize;
 }
 
-/// The same for a Motion-JPEG read: a descriptor, some data, nothing beyond what was asked for.
+/// The same for Motion JPEG. Returns false unless the read returned a descriptor and data, no more than was
+/// asked for, and a known channel.
 bool parse_mjpeg(const u8 *area, ssize_t result, driver::MjpegDescriptor &frame) {
   if (result <= static_cast<ssize_t>(driver::kMjpegDescriptorSize) ||
       result > static_cast<ssize_t>(driver::kMjpegReadSize))
@@ -80,8 +81,8 @@ void deliver(ZV_STREAM_CALLBACK callback, u32 channel, u8 *data, std::size_t len
   if (callback != nullptr) callback(channel, data, static_cast<i32>(length), static_cast<i32>(flags));
 }
 
-/// Hands the MPEG-4 frame just read on. False when the header of an intra frame cannot be made:
-/// the frame is then neither delivered nor released.
+/// Delivers the MPEG-4 frame that was just read. Returns false when the header of an intra frame cannot be
+/// built: the frame is then neither delivered nor released to the driver.
 bool take_mpeg4(ZV_CARD &card, VideoState &state) {
   Mpeg4Frame frame{};
   if (!parse_mpeg4(mpeg4_buf, frame)) return true;
@@ -105,7 +106,9 @@ bool take_mpeg4(ZV_CARD &card, VideoState &state) {
   return true;
 }
 
-/// Hands a Motion-JPEG read on as a whole picture.
+/// Delivers one Motion-JPEG read as a complete JPEG. The data end at the last byte 0xD9: it is the second
+/// byte of the EOI marker, and padding follows. The 0xFF in front is not checked, so a broken picture
+/// without an EOI can be cut at a stray 0xD9.
 void take_mjpeg(ZV_CARD &card, VideoState &state, ssize_t result) {
   driver::MjpegDescriptor frame{};
   if (!parse_mjpeg(mjpeg_buf, result, frame) || start_flag == 0) return;
@@ -113,7 +116,7 @@ void take_mjpeg(ZV_CARD &card, VideoState &state, ssize_t result) {
   const u8 *scan = mjpeg_buf + driver::kMjpegDataOffset;
   std::size_t scan_length = static_cast<std::size_t>(result) - driver::kMjpegDescriptorSize;
   while (scan_length > 0 && scan[scan_length - 1] != kEoiEnd) --scan_length;
-  if (scan_length == 0) return;  // without an EOI it is no picture
+  if (scan_length == 0) return;  // no 0xD9, so no EOI
   jpeg_set_sof(state.jpeg_header, frame.width, frame.height);
   u8 *data = mjpeg_buf + driver::kMjpegDataOffset - kJpegHeaderSize;
   std::memcpy(data, state.jpeg_header.data(), kJpegHeaderSize);
@@ -121,8 +124,8 @@ void take_mjpeg(ZV_CARD &card, VideoState &state, ssize_t result) {
           update_flags(card, frame.channel));
 }
 
-/// Encoder reads have no destination: the frame appears in the mapped stream region. The compiler is
-/// kept from seeing the null, which it would take for a mistake.
+/// Reads a frame into the mapped stream region. The driver expects a null buffer; volatile hides the null
+/// from the compiler, which would warn about it.
 ssize_t read_stream(const ZV_CARD &card, std::size_t count) {
   void *volatile none = nullptr;
   return read(card.enc_fd, none, count);
@@ -150,7 +153,7 @@ void *get_video_data_thread(void *argument) {
   return nullptr;
 }
 
-/// One of the two capture threads with what belongs to it.
+/// A capture thread, its routine, its run flag and its exit value.
 struct CaptureThread {
   Worker &worker;
   Worker::Routine routine;
@@ -165,7 +168,7 @@ const CaptureThread kAudio{zv_audio_capture_thread,
                            zv_audio_thread_result};
 
 bool start_thread(const CaptureThread &thread, ZV_CARD &card) {
-  // A thread that stopped itself from its callback must be gone before the flag is set again.
+  // If a callback has stopped the thread, join it first: it would see the flag set again and run on.
   if (!thread.worker.join(thread.result)) return false;
   thread.running.exchange(1);
   if (thread.worker.start(thread.routine, &card)) return true;
@@ -202,12 +205,12 @@ int start_capture(ZV_CARD &card) {
   const u32 state = read_codec(card, driver::kRegDisplayState);
   write_codec(card, driver::kRegDisplayState, set_bit(state, driver::kDisplayStateBit));
   if (start_thread(kVideo, card) && start_thread(kAudio, card)) {
-    // A callback may have stopped capture before the second thread was there.
+    // A callback may have called zv_Stop() before the audio thread was started.
     if (start_flag == 0) stop_threads();
     usleep(1000);
     return ZV_OK;
   }
-  std::printf("Zarvo SDK: Start Error! Error Code = %d.\n", ZV_ERR_THREAD_CREATE);
+  print("Zarvo SDK: Start Error! Error Code = %d.\n", ZV_ERR_THREAD_CREATE);
   stop_capture(card);
   return ZV_ERR_THREAD_CREATE;
 }

@@ -1,12 +1,13 @@
 /**
  * @file encode_config.cpp
- * Encoder settings of the channels: store, check against the frame-rate budget, enable.
+ * Stores the encoder settings of the channels, checks them against the frame-rate budget and enables
+ * channels.
  */
-#include <cstdio>
 
 #include "command.h"
 #include "internal.h"
 #include "interval.h"
+#include "print.h"
 #include "zv_card.h"
 #include "zv_lib.h"
 
@@ -14,7 +15,7 @@ namespace zarvo {
 
 namespace {
 
-/// Copies a record into a stored one, word by word.
+/// Copies a record word by word, since the video data thread may read the stored one.
 void store_config(ZV_VIDEO_CONFIG &stored, const ZV_VIDEO_CONFIG &record) {
   set_word(stored.mjpeg, word_of(record.mjpeg));
   set_word(stored.scale, word_of(record.scale));
@@ -37,7 +38,7 @@ int set_encode_config(ZV_CARD &card, u32 channel, const ZV_VIDEO_CONFIG *record)
   ZV_VIDEO_CONFIG &config = card.config[channel];
   store_config(config, *record);
   if (config.enable != 0 && word_of(config.scale) == SCALE_ZV_NO_ENCODE) {
-    std::printf("Error: zv_SetVideoEncodeConfig--invalid scale value.\n");
+    print("Error: zv_SetVideoEncodeConfig--invalid scale value.\n");
     return ZV_ERR_CONFIG;
   }
   const bool two_field_slow = word_of(config.twofield) == TWOFIELD_ENABLE && word_of(config.interval) != 0;
@@ -51,12 +52,12 @@ int get_encode_config(ZV_CARD &card, u32 channel, ZV_VIDEO_CONFIG *record) {
   return ZV_OK;
 }
 
-/// How the budget sees one channel's configuration.
+/// What the budget check needs of a channel's configuration.
 struct Load {
   u32 skip;
   bool drop;
   bool d1;
-  bool both_fields;  ///< two fields of every frame
+  bool both_fields;  ///< both fields of every frame are encoded
 };
 
 Load load_of(const ZV_VIDEO_CONFIG &config) {
@@ -68,14 +69,14 @@ Load load_of(const ZV_VIDEO_CONFIG &config) {
   return {skip, interval.drop, d1, two_field && skip == 0};
 }
 
-/// Frames a second, in whole frames as the card's budget counts them.
+/// Returns frames a second, rounded down to a whole number as the card's budget counts.
 u32 counted_rate(const Load &load, u32 base) {
   if (load.both_fields) return load.drop ? 0 : base;
   const u32 group = load.skip + (load.d1 ? 1 : 0);
   return load.drop ? (group - 1) * base / group : base / group;
 }
 
-/// Size of a channel's pictures in CIF pictures.
+/// Returns the size of a channel's picture in CIF pictures.
 u32 weight_of(const ZV_VIDEO_CONFIG &config, const Load &load, u32 channel) {
   switch (word_of(config.scale)) {
     case SCALE_ZV_NO_ENCODE:
@@ -87,8 +88,8 @@ u32 weight_of(const ZV_VIDEO_CONFIG &config, const Load &load, u32 channel) {
     case SCALE_ZV_D1:
       return 4;
     default:
-      std::printf("Error: invalid scale value, channel = %d, scale = %d.\n", static_cast<int>(channel),
-                  static_cast<int>(word_of(config.scale)));
+      print("Error: invalid scale value, channel = %d, scale = %d.\n", static_cast<int>(channel),
+            static_cast<int>(word_of(config.scale)));
       return 0;
   }
 }
@@ -97,7 +98,7 @@ u32 weight_of(const ZV_VIDEO_CONFIG &config, const Load &load, u32 channel) {
 
 int check_encode_config(ZV_CARD &card) {
   const u32 base = card.standard == VIDEO_STANDARD_ZV_NTSC ? 30 : 25;
-  // Sixteen CIF channels at the full rate.
+  // The budget is sixteen CIF channels at the full rate.
   const float budget = static_cast<float>(ZV_CHANNELS * base);
   float total = 0;
   for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) {
@@ -107,7 +108,7 @@ int check_encode_config(ZV_CARD &card) {
     if (word_of(config.twofield) == TWOFIELD_ENABLE && (load.skip != 0 || load.d1)) return ZV_ERR_CONFIG;
     total += static_cast<float>(weight_of(config, load, channel) * rate);
     if (total > budget) {
-      std::printf("Error: zv_CheckVideoEncodeConfig--Exceed maximum total frame rate!!\n");
+      print("Error: zv_CheckVideoEncodeConfig--Exceed maximum total frame rate!!\n");
       return ZV_ERR_CONFIG;
     }
   }
@@ -116,7 +117,8 @@ int check_encode_config(ZV_CARD &card) {
 
 namespace {
 
-/// Marks the channels of `mask` enabled and wipes the others, up to the first that cannot be.
+/// Sets `enable` on the channels of `mask` and wipes the other channels. Returns ZV_ERR_CONFIG at the first
+/// channel of `mask` that has no scale.
 int mark_channels(ZV_CARD &card, u32 mask) {
   for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) {
     ZV_VIDEO_CONFIG &config = card.config[channel];
@@ -126,7 +128,7 @@ int mark_channels(ZV_CARD &card, u32 mask) {
     }
     config.enable = 1;
     if (word_of(config.scale) == SCALE_ZV_NO_ENCODE) {
-      std::printf(
+      print(
           "ZarvoSDK: Error: zv_EnableVideoRecordChannels--invalid scale value of Channel%d. Please confirm  "
           "video config first.\n",
           static_cast<int>(channel));
@@ -136,7 +138,7 @@ int mark_channels(ZV_CARD &card, u32 mask) {
   return ZV_OK;
 }
 
-/// The card has one quality register: every Motion-JPEG channel writes it, the last one's word stays.
+/// Writes the card's only quality register once for each Motion-JPEG channel; the last word written stays.
 void send_jpeg_quality(const ZV_CARD &card) {
   // By ZV_JPEG_QUALITY.
   constexpr u32 kQualityWords[] = {driver::kMjpegCoarse, driver::kMjpegFine, driver::kMjpegFine};

@@ -1,6 +1,6 @@
 /**
  * @file motion.cpp
- * Motion detection: thresholds, areas, on and off, and which channels move.
+ * Motion detection: thresholds, excluded areas, start and stop, and the motion bits.
  */
 #include <algorithm>
 
@@ -23,7 +23,7 @@ void disable_motion(const ZV_CARD &card) {
 
 namespace {
 
-/// Gives every block of a rectangle of blocks the same threshold.
+/// Sends the same threshold for all blocks of a rectangle of blocks.
 int send_thresholds(ZV_CARD &card, driver::MotionMap area, u32 threshold) {
   if (card.motion_map == nullptr) return ZV_ERR_NO_MEMORY;
   std::fill_n(card.motion_map, area.columns * area.rows, static_cast<u16>(threshold));
@@ -55,8 +55,8 @@ constexpr u32 blocks_of(u32 pixels) {
 int mark_area(ZV_CARD &card, u32 channel, const ZV_RECT *rect, u32 mark) {
   if (channel >= ZV_CHANNELS) return ZV_ERR_CHANNEL;
   if (rect == nullptr || !fits_input(card, *rect)) return ZV_ERR_PARAM;
-  // Counted from the size, not from the far edge: an area off the 16-pixel raster may end a block
-  // before its last pixel.
+  // The number of blocks comes from width and height alone, not from the end edges: an area that is not
+  // aligned to 16 pixels can miss its last block.
   const driver::MotionMap area{channel,
                                rect->x_start / driver::kMotionBlock,
                                rect->y_start / driver::kMotionBlock,

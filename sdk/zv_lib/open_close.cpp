@@ -1,18 +1,18 @@
 /**
  * @file open_close.cpp
- * Bringing the card up and giving everything back, and the state of the one open card.
+ * Opens and closes the card, and defines the state of the one open card.
  */
 #include <fcntl.h>
 #include <malloc.h>
 #include <sys/mman.h>
 #include <unistd.h>
 
-#include <cstdio>
 #include <cstdlib>
 #include <new>
 
 #include "command.h"
 #include "internal.h"
+#include "print.h"
 #include "zv_card.h"
 #include "zv_lib.h"
 
@@ -57,7 +57,7 @@ namespace {
 pthread_mutex_t *const kMutexes[] = {&mutex_zv_enable, &mutex_zv_audio_enable, &mutex_watchdog,
                                      &mutex_preview};
 
-/// The descriptors in the order the nodes are opened and closed.
+/// A device node: its path and its descriptor. kNodes lists the nodes in the order of opening and closing.
 struct Node {
   const DevicePath &path;
   i32 ZV_CARD::*fd;
@@ -77,6 +77,8 @@ void close_nodes(const Descriptors &fds, std::size_t count) {
 bool open_nodes(Descriptors &fds) {
   for (std::size_t i = 0; i < kNodeCount; ++i) {
     fds[i] = open(kNodes[i].path.data(), O_RDWR);
+    // A program that the host starts must not hold the card.
+    if (fds[i] >= 0) fcntl(fds[i], F_SETFD, FD_CLOEXEC);
     if (fds[i] < 0) {
       close_nodes(fds, i);
       return false;
@@ -85,14 +87,14 @@ bool open_nodes(Descriptors &fds) {
   return true;
 }
 
-/// A shared region of a device, or null.
+/// Maps a region of a device. Returns null on failure.
 u8 *map_region(i32 fd, std::size_t size, int protection) {
   void *region = mmap(nullptr, size, protection, MAP_SHARED, fd, 0);
   return region == MAP_FAILED ? nullptr : static_cast<u8 *>(region);
 }
 
-/// Where a preview mapping belongs: the index the driver left in the word, else the loop's. An index
-/// given twice must not push an earlier mapping out.
+/// Chooses the entry of preview_buf for a mapping: the index that the driver wrote into the word, else the
+/// loop's index, else a free entry. A driver that names an index twice must not overwrite a mapping.
 u8 *&preview_slot(u32 driver_index, u32 loop_index) {
   for (u32 index : {driver_index, loop_index, 0u, 1u, 2u})
     if (index < driver::kPreviewBuffers && preview_buf[index] == nullptr) return preview_buf[index];
@@ -109,7 +111,7 @@ bool map_previews(i32 fd) {
   return true;
 }
 
-/// Gives back every region and buffer there is, the record last.
+/// Unmaps all regions and frees all buffers, the record last.
 void release_memory(ZV_CARD *card) {
   if (mpeg4_buf != nullptr) munmap(mpeg4_buf, driver::kStreamRegionSize);
   std::free(audio_buf);
@@ -125,8 +127,8 @@ void release_memory(ZV_CARD *card) {
   std::free(card);
 }
 
-/// The zeroed record with all regions mapped and all buffers allocated; or a message, and null with
-/// nothing kept.
+/// Allocates the zeroed record, maps all regions and allocates all buffers. On failure prints a line,
+/// releases everything and returns null.
 ZV_CARD *acquire_memory(const Descriptors &fds) {
   void *memory = std::malloc(sizeof(ZV_CARD));
   ZV_CARD *card = memory != nullptr ? new (memory) ZV_CARD{} : nullptr;
@@ -142,7 +144,7 @@ ZV_CARD *acquire_memory(const Descriptors &fds) {
     return preview_scratch != nullptr && card->motion_map != nullptr;
   };
   if (acquired()) return card;
-  std::printf("Zarvo SDK: Open Error! Error Code = %d.\n", ZV_ERR_NO_MEMORY);
+  print("Zarvo SDK: Open Error! Error Code = %d.\n", ZV_ERR_NO_MEMORY);
   release_memory(card);
   return nullptr;
 }
@@ -162,7 +164,7 @@ void set_defaults(ZV_CARD &card) {
   }
 }
 
-/// The registers a card needs before anything else; motion detection is off on all channels.
+/// Writes the decoder setup registers and switches motion detection off on all channels.
 void set_up_chips(const ZV_CARD &card) {
   for (const auto &[address, value] : driver::kDecoderSetup) write_decoder(card, 0, address, value);
   disable_motion(card);
@@ -193,7 +195,7 @@ int open_card_record(HANDLE *handle) {
 }
 
 int close_card(ZV_CARD &card) {
-  // Nobody may use the descriptors once they are closed, nor the memory once it is given back.
+  // The threads use the descriptors and the memory: join them before anything is closed or freed.
   const bool capture_joined = join_capture();
   if (!join_watchdog() || !capture_joined) return ZV_ERR_CLOSE;
   if (card.disp_fd >= 0) {
@@ -201,8 +203,8 @@ int close_card(ZV_CARD &card) {
     stop_motion_detection(card);
   }
   for (const Node &node : kNodes) {
-    // The number is given up first: a close that fails has released it all the same, and it may
-    // belong to someone else by the time zv_Close() is called again.
+    // Forget the number first. A close() that fails has released it too, and another thread may own that
+    // number when zv_Close() is called again.
     const i32 fd = card.*node.fd;
     card.*node.fd = -1;
     card.display.fd = card.disp_fd;

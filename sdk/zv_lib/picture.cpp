@@ -1,6 +1,6 @@
 /**
  * @file picture.cpp
- * Picture properties: user units to and from the registers of the video decoders.
+ * Picture properties: converts user units to and from the registers of the video decoders.
  */
 #include <algorithm>
 
@@ -13,14 +13,14 @@ namespace zarvo {
 
 namespace {
 
-/// A property of ZV_VIDEO_PROPERTY: its user range, which the register's 256 steps are spread over.
+/// A member of ZV_VIDEO_PROPERTY and its user range, which maps to the 256 steps of a register.
 struct Property {
   i32 ZV_VIDEO_PROPERTY::*field;
   i32 min;
   i32 max;
 };
 
-/// In the order of the registers.
+/// The properties in the order of their registers.
 constexpr Property kProperties[] = {{&ZV_VIDEO_PROPERTY::hue, -180, 180},
                                     {&ZV_VIDEO_PROPERTY::saturation, 0, 200},
                                     {&ZV_VIDEO_PROPERTY::contrast, 0, 200},
@@ -31,7 +31,7 @@ constexpr i32 even_toward_zero(i32 value) {
   return value - value % 2;
 }
 
-/// Hue is even, so a hue between two steps is rounded up by two degrees, the others by one.
+/// The increment for rounding up a value between two steps. Hue is even, so it is rounded up by 2.
 constexpr i32 round_up(const Property &property) {
   return property.field == &ZV_VIDEO_PROPERTY::hue ? 2 : 1;
 }
@@ -56,7 +56,7 @@ void inverse_translate_video_property(ZV_VIDEO_PROPERTY &user, const ZV_VIDEO_PR
 
 namespace {
 
-/// Where a channel's four registers begin.
+/// The decoder of a channel and the address of the first of its four property registers.
 struct PropertyBlock {
   u8 chip;
   u8 address;

@@ -1,7 +1,6 @@
 /**
- * @file preview_mode.cpp
- * The preview: layout, channels shown, the picture, focus channel; and the channel numbers of encoded
- * pictures.
+ * @file preview.cpp
+ * The preview: layout, windows, picture, focus channel; and the channel number in encoded pictures.
  */
 #include <unistd.h>
 
@@ -43,12 +42,13 @@ int enable_preview_channels(ZV_CARD &card, u32 mask) {
 
 int preview_screen(ZV_CARD &card, u8 **picture) {
   if (picture == nullptr) return -1;
-  // The driver answers with one word, but it is asked for a whole picture: the scratch buffer has
-  // room for one, so that nobody's memory suffers from a generous driver.
+  // The read asks for a whole picture, but the driver writes only one word. The scratch buffer is large
+  // enough for a whole picture, in case a driver writes more.
   u32 index = driver::kPreviewBuffers;
   pthread_mutex_lock(&mutex_preview);
   std::memcpy(preview_scratch, &index, sizeof index);
-  const ssize_t result = read(card.disp_fd, preview_scratch, driver::kPreviewBufferSize);
+  const ssize_t result =
+      uninterrupted([&] { return read(card.disp_fd, preview_scratch, driver::kPreviewBufferSize); });
   std::memcpy(&index, preview_scratch, sizeof index);
   pthread_mutex_unlock(&mutex_preview);
   const bool whole = result > 0 && static_cast<std::size_t>(result) <= driver::kPreviewBufferSize;
@@ -74,7 +74,7 @@ u32 focus_channel(ZV_CARD &card) {
   return routed_channel(read_video_input(card, routing_register(0)));
 }
 
-/// The display position 1-15 that carries a channel; ZV_CHANNELS when none does.
+/// Returns the display position 1-15 that shows a channel, or ZV_CHANNELS if there is none.
 u32 position_of(const ZV_CARD &card, u32 channel) {
   u32 position = 1;
   while (position < ZV_CHANNELS &&

@@ -1,6 +1,6 @@
 /**
  * @file privacy_mask.cpp
- * The privacy mask of a channel.
+ * Sets and reads the privacy mask of a channel.
  */
 #include "command.h"
 #include "internal.h"

@@ -1,10 +1,10 @@
 /**
  * @file registers.cpp
- * Raw register access for diagnosis. Every access prints its line.
+ * Raw register access for diagnosis. Every access prints a line.
  */
-#include <cstdio>
 
 #include "command.h"
+#include "print.h"
 #include "zv_card.h"
 #include "zv_lib.h"
 
@@ -14,13 +14,13 @@ namespace {
 
 u32 show_codec(const ZV_CARD &card, u32 reg) {
   const u32 value = read_codec(card, reg);
-  std::printf("Tarn6400 Register 0x%x = 0x%x.\n", reg, value);
+  print("Tarn6400 Register 0x%x = 0x%x.\n", reg, value);
   return value;
 }
 
 u8 show_decoder(const ZV_CARD &card, u8 chip, u8 reg) {
   const u8 value = read_decoder(card, chip, reg);
-  std::printf("TW2815 %d Register 0x%x = 0x%x.\n", chip, reg, value);
+  print("TW2815 %d Register 0x%x = 0x%x.\n", chip, reg, value);
   return value;
 }
 

@@ -1,6 +1,6 @@
 /**
  * @file status.cpp
- * What the inputs and the board report.
+ * Video loss, audio loss and the board version.
  */
 #include <algorithm>
 #include <iterator>

@@ -1,3 +1,4 @@
+// Builds the MPEG-4 and JPEG stream headers.
 #include "stream_headers.h"
 
 #include <algorithm>
@@ -22,8 +23,8 @@ constexpr u8 low_byte(u32 value) {
   return static_cast<u8>(value & 0xFF);
 }
 
-/// Bytes 14 to 17: 13 bits of width, a marker, 13 bits of height, a marker, the interlaced flag and
-/// "overlapped motion compensation off".
+/// Writes bytes 14 to 17: 13 bits of width, a marker bit, 13 bits of height, a marker bit, the interlaced
+/// flag, the bit that disables overlapped block motion compensation, and two 0 bits.
 void write_layer(const Layer &layer) {
   g_mpeg4_header[14] = low_byte(layer.width >> 5);
   g_mpeg4_header[15] = low_byte((layer.width & 0x1F) << 3 | layer.height >> 11 | 0x04);
@@ -42,7 +43,7 @@ int make_MP4_header(ZV_CARD &card, u32 channel) {
       write_layer({width, height / 2, false});
       return 0;
     case SCALE_ZV_CIF:
-      // Half of 720 is no multiple of a macroblock: CIF is 352 wide at either input width.
+      // Half of 720 is not a multiple of 16, the width of a macroblock: CIF is 352 wide at both input widths.
       write_layer({width / 2 == 360 ? 352 : width / 2, height / 2, false});
       return 0;
     case SCALE_ZV_D1:
@@ -69,7 +70,7 @@ constexpr QuantTable kChrominance = {17, 18, 24, 47, 99, 99, 99, 99, 18, 21, 26,
 
 constexpr std::array<u8, 2> JPEG_SOI = {0xFF, 0xD8};
 
-/// Both quantisation tables as the encoder uses them: in zig-zag order, every entry doubled.
+/// Two DQT segments with the encoder's quantisation tables: zig-zag order, every entry doubled.
 constexpr std::array<u8, 138> JPEG_DQT = [] {
   constexpr u8 kZigZag[64] = {0,  1,  8,  16, 9,  2,  3,  10, 17, 24, 32, 25, 18, 11, 4,  5,
                               12, 19, 26, 33, 40, 48, 41, 34, 27, 20, 13, 6,  7,  14, 21, 28,
@@ -85,7 +86,8 @@ constexpr std::array<u8, 138> JPEG_DQT = [] {
   return segments;
 }();
 
-// ITU-T T.81 tables K.3 to K.6: class and number, codes of each length, values.
+// ITU-T T.81 tables K.3 to K.6. Each has a byte with class and number, 16 bytes with the number of codes of
+// each length, and the values.
 constexpr std::array<u8, 420> JPEG_DHT = {
     0xFF, 0xC4, 0x01, 0xA2,
     // DC luminance
@@ -131,7 +133,7 @@ constexpr std::size_t kSofOffset = kDhtOffset + JPEG_DHT.size();
 constexpr std::size_t kSosOffset = kSofOffset + JPEG_SOF.size();
 static_assert(kSosOffset + JPEG_SOS.size() == kJpegHeaderSize);
 
-/// Of the frame header: two bytes of height, two of width, high byte first.
+/// Offset in the frame header of the height; the width follows. Both have two bytes, high byte first.
 constexpr std::size_t kSofHeight = 5;
 
 }  // namespace

@@ -1,15 +1,15 @@
 /**
  * @file watchdog.cpp
- * The hardware watchdog and the thread that feeds it.
+ * Starts and stops the hardware watchdog and the thread that feeds it.
  */
 #include <time.h>
 #include <unistd.h>
 
 #include <cstdint>
-#include <cstdio>
 
 #include "command.h"
 #include "internal.h"
+#include "print.h"
 #include "zv_bits.h"
 #include "zv_card.h"
 #include "zv_lib.h"
@@ -22,13 +22,14 @@ void *zv_watchdog_thread_result;
 
 namespace {
 
-constexpr std::int64_t kKickIntervalMs = 30000;  ///< from one feed of the board to the next
-constexpr useconds_t kFlagPollUs = 5000;         ///< from one look at the flag and the clock to the next
+constexpr std::int64_t kKickIntervalMs = 30000;  ///< time between two feeds of the board
+constexpr useconds_t kFlagPollUs = 5000;         ///< time between two checks of flag and clock
 constexpr int kAttempts = 10;
 
 const RunFlag kRunning{zv_watchdog_thread_enable, mutex_watchdog};
 
-/// Repeats a board command until the controller gives the expected reply. `reply` is the last one.
+/// Repeats a board command until the controller sends the expected reply, at most kAttempts times. `reply`
+/// receives the last reply.
 bool handshake(const ZV_CARD &card, u32 command, u32 expected, u32 &reply) {
   for (int attempt = 0; attempt < kAttempts; ++attempt) {
     reply = board_command(card, command, 0);
@@ -47,7 +48,7 @@ std::int64_t now_ms() {
   return std::int64_t{now.tv_sec} * 1000 + now.tv_nsec / 1000000;
 }
 
-/// Feeds the watchdog until the run flag is cleared or the controller fails to answer.
+/// Feeds the watchdog until the run flag is cleared or the controller does not reply as expected.
 void feed(const ZV_CARD &card) {
   std::int64_t next_kick = now_ms() + kKickIntervalMs;
   while (kRunning.is_set()) {
@@ -60,7 +61,7 @@ void feed(const ZV_CARD &card) {
     write_codec(card, driver::kRegWatchdogTimer, driver::kWatchdogTimerOn);
     u32 reply = 0;
     if (!kick(card, reply)) {
-      std::printf("ERROR: Zarvo WatchDog reset failed. code = 0x%x.\n", reply);
+      print("ERROR: Zarvo WatchDog reset failed. code = 0x%x.\n", reply);
       return;
     }
   }
@@ -75,7 +76,7 @@ void *watchdog_thread(void *argument) {
     if (void *failure = make_cancellable()) return failure;
     feed(card);
   } else {
-    std::printf("ERROR: Zarvo WatchDog init failed. code = 0x%x\n", reply);
+    print("ERROR: Zarvo WatchDog init failed. code = 0x%x\n", reply);
   }
   kRunning.exchange(0);
   board_command(card, driver::kBoardWatchdogOff, 0);

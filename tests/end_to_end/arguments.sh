@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Wrong arguments of zarvo_record, wrong options of the virtual card, no card and a full disk: each
-# says what is wrong (and what is possible), and the exit status tells a script so.
+# Wrong arguments of zarvo_record, wrong options of the virtual card, no card, a full disk: the message
+# says what is wrong (and what is possible), and the exit status says that it failed.
 . "$(dirname "$0")/common.sh"
 
 # refused STATUS PATTERN OPTION...: that status, the pattern on standard error, and nothing recorded.
@@ -32,12 +32,12 @@ refused 2 'requires an argument' --scale
 refused 1 'frame-rate budget' --scale d1 --channels 1-5
 refused 1 '/dev/null/x' --output /dev/null/x
 
-# A device that is always full: a write error must not end as success. It ends the recording at once.
+# Catches: a write error that does not end the recording, or ends it as success. /dev/full fails every write.
 mkdir "$FOLDER/full"
 ln -s /dev/full "$FOLDER/full/ch01.m4v"
 refused 1 'No space left' --seconds 60 --channels 1 --output full
 
-# The card refuses options that it cannot understand, on standard error only.
+# The card reports options that it does not understand, on standard error only.
 for option in speed=fast lost=17 nonsense=1 camera3=/nowhere.mp4; do
   ZARVO_VIRTUAL_CARD=$option "${ON_CARD[@]}" "$ZARVO_RECORD" --seconds 1 --output "$FOLDER/card" \
     >"$FOLDER/stdout" 2>"$FOLDER/stderr" || true
@@ -46,7 +46,7 @@ for option in speed=fast lost=17 nonsense=1 camera3=/nowhere.mp4; do
   expect "the virtual card prints on standard output" test -z "$(grep -i virtual "$FOLDER/stdout")"
 done
 
-# Without a card in front.
+# Without any card.
 if ! real_card; then
   ON_CARD=(env)
   refused 1 'zv_Open failed with status 1' --channels 1

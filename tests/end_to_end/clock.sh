@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
 # A recording across the change of the hour, or of the day, with the wall clock moved by libfaketime:
-# two files a channel, both decode, and the change is told once.
+# each channel has two files, both decode, and the change is printed once.
 . "$(dirname "$0")/common.sh"
 
 case $1 in
@@ -24,7 +24,7 @@ click btnRecordStop
 expect "the recordings stay open after Stop" wait_until 10 files_closed
 end_program
 
-expect_equal "changes told" 1 "$(lines 'Hour changed')"
+expect_equal "lines about the change" 1 "$(lines 'Hour changed')"
 data=$FOLDER/work/Data
 files=()
 for channel in {1..16}; do

@@ -1,6 +1,6 @@
 # shellcheck shell=bash
-# The world of an end-to-end test: a folder of its own, the helpers of tools/, and checks that name
-# what they found. ctest gives the paths of the built programs. Sourced, never run.
+# What every end-to-end test begins with: a temporary folder, the helpers of tools/, and checks that say
+# what they found. ctest passes the paths of the built programs. To be sourced, not run.
 set -euo pipefail
 
 HERE=$(cd "$(dirname "${BASH_SOURCE[0]}")" && pwd)
@@ -35,10 +35,10 @@ expect() {
 # expect_equal WHAT EXPECTED ACTUAL
 expect_equal() { [ "$2" = "$3" ] || die "$1: expected '$2', got '$3'"; }
 
-# expect_decodes FILE...: every file is there and decodes without an error line.
+# expect_decodes FILE...: every file must exist and decode without an error line.
 expect_decodes() { report_streams "$@" || die "not all recordings decode"; }
 
-# open_program: the demo application in $FOLDER/work, on an invisible display.
+# open_program: starts the demo application in $FOLDER/work, on an invisible display.
 open_program() {
   mkdir -p "$FOLDER/work/Data"
   open_display
@@ -58,8 +58,8 @@ record_cif() {
   click btnRecordStart
 }
 
-# set_clock TIME: the program's wall clock, before its start or while it runs; it reads the offset from a
-# file. The clock of the card is another one and is left alone.
+# set_clock TIME: sets the program's wall clock, before its start or while it runs: libfaketime reads the
+# offset from a file. The card's clock does not change.
 set_clock() {
   ZARVO_PRELOAD=$(find /usr/lib -name libfaketimeMT.so.1 -print -quit)
   expect "libfaketime is missing" test -n "$ZARVO_PRELOAD"

@@ -1,16 +1,16 @@
 #!/usr/bin/env bash
-# The project that README.md shows, word for word: with this tree as a subfolder, and found after an
-# install into an empty prefix, with the SDK as static and as shared library. Each build records on the
-# virtual card; the installed programs run from a tree that has been moved.
+# Builds the project that README.md shows, word for word, in three ways: with this tree as a subfolder, with
+# the installed static SDK, and with the installed shared SDK. Each build records on the virtual card. The
+# shared install is moved first, and its programs must run from the new place.
 . "$(dirname "$0")/common.sh"
 
-# quietly COMMAND...: its output is shown when it fails.
+# quietly COMMAND...: runs it and shows its output only if it fails.
 quietly() { "$@" >"$FOLDER/log" 2>&1 || die "$*: $(cat "$FOLDER/log")"; }
 
 # block LANGUAGE: the code block of the README in that language.
 block() { awk -v begin="\`\`\`$1" '$0 == "```" { inside = 0 } inside; $0 == begin { inside = 1 }' "$ZARVO_ROOT/README.md"; }
 
-# project NAME [SED-SCRIPT]: the README's project in a folder of that name.
+# project NAME [SED-SCRIPT]: puts the README's project into a folder of that name.
 project() {
   mkdir "$FOLDER/$1"
   block cmake | sed "${2:-}" >"$FOLDER/$1/CMakeLists.txt"

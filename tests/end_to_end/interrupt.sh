@@ -1,9 +1,9 @@
 #!/usr/bin/env bash
-# Ctrl-C and a polite kill end a recording early, with status 0 and complete files.
-# A program that hangs before it records ends at once.
+# SIGINT and SIGTERM end a recording early, with status 0 and complete files. SIGINT also ends a program
+# that hangs before it records.
 . "$(dirname "$0")/common.sh"
 
-# A background job of a script ignores SIGINT; env gives the program the default back.
+# A background job of a script ignores SIGINT; env restores the default for the program.
 RECORD=(env --default-signal=INT "${ON_CARD[@]}" "$ZARVO_RECORD")
 
 for signal in INT TERM; do

@@ -1,13 +1,13 @@
 #!/usr/bin/env bash
-# kill -9 at random moments while 16 channels record. Every frame whose callback had returned is in the
-# files to the byte, and at most one more, torn. ZARVO_KILLS sets how many times (3).
+# kill -9 at random moments while 16 channels record. The files must hold every byte of each frame whose
+# callback had returned, and at most one more frame, cut off. ZARVO_KILLS is the number of kills (3).
 #
-# The card's log tells what was delivered: the host acknowledges a frame (ENC_IOC_MPEG4_DONE) after its
+# The card's log shows what was delivered: the SDK acknowledges a frame (ENC_IOC_MPEG4_DONE) after its
 # callback has returned.
 . "$(dirname "$0")/common.sh"
 
-readonly DESCRIPTOR_BYTES=64      # in front of each frame the card hands over; not in the file
-readonly STREAM_HEADER_BYTES=20   # put in front of each intra frame; not from the card
+readonly DESCRIPTOR_BYTES=64      # in front of each frame in the card's memory; not in the file
+readonly STREAM_HEADER_BYTES=20   # the SDK puts it in front of each intra frame
 readonly STREAM_HEADER_BEGINS='\x00\x00\x01\x20'
 
 # delivered: frames and bytes of the frames that the log shows as acknowledged.
@@ -46,7 +46,7 @@ for ((round = 1; round <= ${ZARVO_KILLS:-3}; ++round)); do
   expect "round $round: only $frames frames were delivered" test "$frames" -gt 100
   intra=$(cat "${files[@]}" | LC_ALL=C grep -aoP "$STREAM_HEADER_BEGINS" | wc -l)
   written=$(($(cat "${files[@]}" | wc -c) - 16 * RECORD_HEADER_BYTES))
-  # The last intra frame may be the torn one.
+  # The last intra frame may be the one that is cut off.
   least=$((bytes + (intra - 1) * STREAM_HEADER_BYTES))
   expect "round $round: $least bytes delivered, only $written in the files" test "$written" -ge "$least"
   found=0

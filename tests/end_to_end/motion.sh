@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# zarvo_motion: moving cameras are tagged, drawn ones and films, a lost one and a still film are not, and
-# the pictures of picture-in-picture and zoom differ from the plain one where they must and nowhere else.
+# zarvo_motion tags moving cameras, drawn ones and films; it tags neither a lost camera nor a still film. Its
+# pictures of picture-in-picture and zoom differ from the plain picture where they must and nowhere else.
 . "$(dirname "$0")/common.sh"
 
 ffmpeg -nostdin -v error -f lavfi -i testsrc2=s=320x240:r=25:d=2 -pix_fmt yuv420p "$FOLDER/moving.mp4"

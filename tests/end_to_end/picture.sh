@@ -1,12 +1,12 @@
 #!/usr/bin/env bash
-# The operator turns the colours of camera 6 and masks camera 7. Three cameras show the same plain red film,
-# so whatever differs in the decoded recordings, MPEG-4 and Motion JPEG, is what the operator asked for.
+# The operator changes the hue of camera 6 and masks camera 7. Three cameras show the same plain red film, so
+# every difference in the decoded recordings (MPEG-4 and Motion JPEG) comes from these two settings.
 . "$(dirname "$0")/common.sh"
 
 ffmpeg -nostdin -v error -f lavfi -i color=0xC03030:s=320x240:r=10:d=2 -pix_fmt yuv420p "$FOLDER/red.mp4"
 export ZARVO_VIRTUAL_CARD="camera5=$FOLDER/red.mp4;camera6=$FOLDER/red.mp4;camera7=$FOLDER/red.mp4"
 
-# colour PICTURE GEOMETRY: the mean colour of a rectangle.
+# colour PICTURE GEOMETRY: prints the mean colour of a rectangle.
 colour() {
   local red green blue
   read -r red green blue < <(convert "$1" -crop "$2" +repage -format \
@@ -17,10 +17,10 @@ colour() {
   else echo "$red,$green,$blue"; fi
 }
 
-# recording CAMERA: its file.
+# recording CAMERA: prints the path of its file.
 recording() { find "$FOLDER/work/Data/Video" -path "*CH0$1*" -name '*.rec'; }
 
-# enough_recorded: the frame to look at is on the disk. (Motion JPEG tells no rate on the output.)
+# enough_recorded: whether the file has the frame to compare. (For Motion JPEG the program prints no kbps line.)
 enough_recorded() { [ "$(decoded_frames "$(recording 7)")" -gt 20 ]; }
 
 # record_and_look CODEC: records with item CODEC of the list, decodes a frame of each camera.
@@ -42,7 +42,7 @@ record_and_look() {
   done
   expect_equal "middle of camera 5" red "$(colour "$FOLDER/5.png" 184x104+84+68)"
   expect_equal "masked middle of camera 7" grey "$(colour "$FOLDER/7.png" 184x104+84+68)"
-  expect_equal "camera 6, its colours turned" green "$(colour "$FOLDER/6.png" 336x224+8+8)"
+  expect_equal "camera 6 with another hue" green "$(colour "$FOLDER/6.png" 336x224+8+8)"
 }
 
 set_clock '2026-03-03 14:10:00' # far from a change of the hour

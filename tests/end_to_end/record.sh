@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# zarvo_record on the virtual card in real time: every file decodes without an error line, has the
-# size that was asked for, and 150 frames (PAL: 125) for 5 seconds.
+# zarvo_record on the virtual card in real time: every file decodes without an error line and has the
+# picture size of the options and 150 frames (PAL: 125) for 5 seconds.
 . "$(dirname "$0")/common.sh"
 
 # case: options | files | codec,width,height | frames
@@ -38,7 +38,7 @@ for file in "$FOLDER"/out/audio*.g726; do
   expect "$file has $(stat -c %s "$file") bytes instead of about 15000" test "$(stat -c %s "$file")" -ge 14400
 done
 
-# Interlaced pictures must say so, or players show combs on movement.
+# Catches: interlaced pictures without the interlaced flag, which players show with combs on movement.
 if [ "$1" = d1 ]; then
   expect "D1 is not marked as interlaced" grep -q 'interlaced_frame=1' \
     <(ffprobe -v error -f m4v -show_frames -read_intervals '%+#30' "${videos[0]}")

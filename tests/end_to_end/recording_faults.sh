@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# The disk fills up, or its folders vanish, while the dialog records; and a root that cannot be written.
-# The dialog lives on and says what it must, and no descriptor stays open.
+# While the dialog records, the disk fills up, its folders vanish, or the root becomes read-only. The dialog
+# keeps running and prints the lines it must, and no recording stays open.
 . "$(dirname "$0")/common.sh"
 
 if ! { [ "$(id -u)" -eq 0 ] && mkdir "$FOLDER/disk" && mount -t tmpfs -o size=8m tmpfs "$FOLDER/disk" 2>/dev/null; }; then
@@ -13,7 +13,7 @@ unmount_and_clean_up() {
   rm -rf "$FOLDER"
 }
 
-# use_root FOLDER: as the operator enters it, with a look at the disk every second.
+# use_root FOLDER: enters it as the operator does, with a check of the disk every second.
 use_root() {
   enter edtRecordPath "$1"
   enter edtTime 1
@@ -36,7 +36,7 @@ click btnRecordStart
 wait_line '^No enough disk space$' 2
 rm "$FOLDER/disk/filler"
 
-# The whole tree vanishes under a running recording, the root included.
+# The whole tree vanishes during a recording, with the root.
 mkdir "$FOLDER/vanishing"
 use_root "$FOLDER/vanishing"
 click btnRecordStart
@@ -45,8 +45,8 @@ rm -r "$FOLDER/vanishing"
 wait_line '^No enough disk space$' 3
 expect "recordings of a deleted root stay open" wait_until 10 files_closed
 
-# The root turns read-only under a running recording: nothing can be opened at the change of the hour, and
-# everything at the next one, when it can be written again.
+# The root becomes read-only during a recording: no file can be opened at the change of the hour. At the next
+# change the root is writable again, and all files can be opened.
 rm -r "$FOLDER"/disk/*
 use_root "$FOLDER/disk"
 click btnRecordStart
@@ -64,7 +64,7 @@ wait_line kbps $(($(lines kbps) + 2))
 click btnRecordStop
 expect_equal "files of the two hours that could be written" 32 "$(find "$FOLDER/disk" -name '*.rec' -size +0 | wc -l)"
 
-# Nothing can be made on a read-only disk: no file, and no crash on the missing ones.
+# Catches: a crash when a read-only disk leaves the program without any file.
 rm -r "$FOLDER"/disk/*
 mount -o remount,ro "$FOLDER/disk"
 use_root "$FOLDER/disk"

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# One session of an operator: choose CIF, record with the preview on, stop, open a recording. The
-# files are complete and the player gets the path that was picked, blanks and quotes included.
+# One session of an operator: choose CIF, record with the preview on, stop, open a recording. The files are
+# complete, and the player gets the chosen path with its blanks and quotes.
 . "$(dirname "$0")/common.sh"
 
 mkdir -p "$FOLDER/work"
@@ -36,7 +36,7 @@ xdotool key Return
 expect "the player was not started" wait_until 10 test -s "$FOLDER/work/player.log"
 expect_equal "arguments of the player" "1 $picked" "$(paste -s -d ' ' "$FOLDER/work/player.log")"
 
-# Closing while all of it runs: the recording must be complete and the program must end.
+# The operator closes the dialog during a recording and a preview: the files must be complete and the program must end.
 click btnRecordStart
 wait_line kbps $(($(lines kbps) + 3))
 end_program

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Start and Stop of the preview 50 times as fast as xdotool can: a lost Stop or a second thread in SDL
-# would leave a window, hang the dialog or crash the program.
+# Clicks Start and Stop of the preview 50 times as fast as xdotool can. Catches: a lost Stop, or a second
+# thread in SDL, which leaves a window, hangs the dialog or crashes the program.
 . "$(dirname "$0")/common.sh"
 
 open_program

@@ -19,9 +19,9 @@ std::uint8_t mark_of(Device device) {
   return static_cast<std::uint8_t>(static_cast<int>(device) + 1);
 }
 
-constinit std::array<std::atomic<std::uint8_t>, kTableSize> marks{};  // device + 1 of each number
-constinit std::array<std::atomic<int>, 4> open_counts{};              // marks of each device
-constinit std::atomic<pid_t> home{0};                                 // process of the card
+constinit std::array<std::atomic<std::uint8_t>, kTableSize> marks{};  // kForeign, kOrphan or device + 1
+constinit std::array<std::atomic<int>, 4> open_counts{};              // by device: open descriptors
+constinit std::atomic<pid_t> home{0};                                 // the process that the card belongs to
 
 struct Mapping {
   std::uintptr_t start;
@@ -29,9 +29,9 @@ struct Mapping {
   Device device;
 };
 constinit std::mutex mapping_mutex;           // guards mapping_list
-constinit std::atomic<int> mapping_count{0};  // its length, read without the lock
+constinit std::atomic<int> mapping_count{0};  // length of mapping_list, read without the lock
 std::vector<Mapping> &mapping_list() {
-  static auto *const list = new std::vector<Mapping>;  // outlives the destructors of the host
+  static auto *const list = new std::vector<Mapping>;  // never freed: the host's destructors may still unmap
   return *list;
 }
 

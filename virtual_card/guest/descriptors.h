@@ -1,8 +1,8 @@
 /**
  * @file descriptors.h
- * Which descriptors and mappings of the process belong to the card. A descriptor that does not is recognised
- * with one atomic load. In a process that shares this memory without being this process, like the child of a
- * vfork, no descriptor counts as the card's.
+ * The tables of descriptors and mappings of this process that belong to the card. A descriptor that is not
+ * the card's is recognised with one atomic load. In a vfork child, which shares this memory, no descriptor
+ * counts as the card's.
  */
 #ifndef VIRTUAL_CARD_DESCRIPTORS_H
 #define VIRTUAL_CARD_DESCRIPTORS_H
@@ -14,35 +14,35 @@
 
 namespace virtual_card::descriptors {
 
-/// Descriptors with higher numbers cannot be the card's.
+/// Number of entries in the descriptor table. Descriptors from this number on cannot be the card's.
 inline constexpr std::size_t kTableSize = 65536;
 
-/// What a descriptor number stands for.
+/// Tells whether a descriptor is the card's, and of which device.
 struct Owner {
   bool ours = false;
-  /// Device::none: a descriptor inherited through fork. Its card stayed with the parent.
+  /// Device::none for a descriptor inherited through fork: its card stayed in the parent.
   Device device = Device::none;
 };
 Owner owner(int fd);
-/// Whether the calling process is the one that the card is in.
+/// Returns whether the calling process is the one that the card belongs to.
 bool at_home();
-/// Makes the calling process the card's.
+/// Makes the calling process the one that the card belongs to.
 void settle();
 
-/// False when the number is beyond the table.
+/// Adds a descriptor. Returns false when its number is too high for the table.
 bool add(int fd, Device device);
-/// Removes a number; returns what it stood for.
+/// Removes a descriptor and returns its entry.
 Owner remove(int fd);
-/// A descriptor of the device, or -1.
+/// Returns an open descriptor of the device, or -1.
 int find(Device device);
 
 void add_mapping(void *address, std::size_t length, Device device);
-/// The device whose region lies in this range, if any.
+/// Returns the device of a mapping that overlaps this range, if there is one.
 std::optional<Device> mapping(const void *address, std::size_t length);
-/// Removes the mappings that lie wholly in this range; returns how many.
+/// Removes the mappings that lie completely in this range. Returns their number.
 int remove_mappings(const void *address, std::size_t length);
 
-/// Fork: the lock is held across it. In the child, all descriptors lose their card.
+/// Call these around fork(): the lock is held during it. In the child, all descriptors lose their card.
 void before_fork();
 void after_fork(bool child);
 

@@ -1,7 +1,7 @@
-// The libc names this library puts itself in front of, in every spelling a compiler can emit.
-// A line each: what is done with a call is decided in guest_calls.
+// The libc functions that this library replaces, in every spelling a compiler can emit. Each is one line;
+// guest_calls decides what to do with the call.
 
-// Fortified and large-file builds turn these names into inline functions and aliases of each other.
+// With these macros, libc's headers turn the names into inline functions and aliases of each other.
 #undef _FORTIFY_SOURCE
 #undef _FILE_OFFSET_BITS
 
@@ -16,7 +16,7 @@
 
 #define EXPORTED extern "C" __attribute__((visibility("default")))
 
-/// The argument behind `last`, which the caller need not have given: libc reads it the same way.
+/// Reads the argument behind `last`. The caller may have left it out; libc reads it in the same way.
 #define OPTIONAL(last, type)               \
   __extension__({                          \
     va_list list;                          \
@@ -25,7 +25,7 @@
     va_end(list);                          \
     value;                                 \
   })
-/// The mode of an open call, which is there only when a file can be created.
+/// Reads the mode of an open call, which exists only if the flags allow creating a file.
 #define MODE(flags) ((flags) & (O_CREAT | O_TMPFILE) ? OPTIONAL(flags, mode_t) : mode_t{0})
 
 // Names that no header declares.

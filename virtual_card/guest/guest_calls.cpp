@@ -1,4 +1,4 @@
-// Decides for each libc call of the program whether the card answers it.
+// Decides for each libc call of the host program whether the card or libc handles it.
 #include "guest_calls.h"
 
 #include <fcntl.h>
@@ -30,8 +30,8 @@ bool is_node(const char *path) {
   return path != nullptr && std::strncmp(path, kPrefix.data(), kPrefix.size()) == 0;
 }
 
-/// Runs a call of the card. A result from -4095 to -1 is a negated error number and goes into errno; lower
-/// ones are returned unchanged, as libc does.
+/// Runs a call of the card. A result from -4095 to -1 is a negated error number: it goes into errno, and the
+/// call returns -1. Results below -4095 are returned unchanged, as libc does.
 template <typename Function>
 long answer(Function call) {
   constexpr long kMaxError = 4095;
@@ -54,8 +54,8 @@ long answer(Function call) {
   return result;
 }
 
-/// Held while descriptors of nodes are made, copied or closed: a descriptor that open() copies must not be
-/// closed, and its number reused, in between.
+/// Held while a descriptor of a node is opened, copied or closed: while open() copies a descriptor, no other
+/// thread may close it and reuse its number.
 constinit std::mutex node_mutex;
 
 int open_node(const char *path, int flags) {
@@ -74,13 +74,14 @@ int open_node(const char *path, int flags) {
   }));
 }
 
-/// A call on a node's descriptor. A descriptor inherited through fork gets ENODEV.
+/// Runs a call on a node's descriptor. A descriptor inherited through fork gets ENODEV.
 template <typename Function>
 long answer_for(const Owner &node, Function call) {
   return answer([&]() -> long { return node.device == Device::none ? -ENODEV : call(Card::instance()); });
 }
 
-/// Takes the number out of the table before closing it: after close() another thread may get the same number.
+/// Closes a node's descriptor. Removes the number from the table first: after close() another thread may get
+/// the same number.
 long close_node(int fd) {
   const std::lock_guard lock(node_mutex);
   const Owner was = descriptors::remove(fd);
@@ -91,7 +92,7 @@ long close_node(int fd) {
   return error != 0 ? error : result;
 }
 
-/// Notes that `fd` is a second descriptor of the same node.
+/// Records `fd` as another descriptor of the node of `source`.
 int duplicated(const Owner &source, int fd) {
   if (fd < 0 || !source.ours) return fd;
   if (source.device != Device::none) Card::instance().duplicated();
@@ -102,14 +103,14 @@ int duplicated(const Owner &source, int fd) {
   return -1;
 }
 
-/// Notes that dup2 or dup3 has replaced a descriptor of a node.
+/// Records that dup2 or dup3 has replaced a descriptor of a node.
 void replaced(const Owner &target, int fd, int result) {
   if (result < 0 || !target.ours) return;
   descriptors::remove(fd);
   if (target.device != Device::none) Card::instance().closed();
 }
 
-/// Closes the nodes' descriptors of a range that is about to be closed at one stroke.
+/// Closes the nodes' descriptors in a range, before close_range() or closefrom() closes the whole range.
 void close_nodes(unsigned first, unsigned last) {
   for (unsigned fd = first; fd <= last && fd < descriptors::kTableSize; ++fd)
     if (owner(static_cast<int>(fd)).ours) guest::close(static_cast<int>(fd));
@@ -216,7 +217,7 @@ int dup(int fd) {
   return duplicated(owner(fd), real::dup(fd));
 }
 
-/// dup2 and dup3, where one of the two descriptors may be a node's.
+/// Does dup2 or dup3 when either of the two descriptors may be a node's.
 template <typename Function>
 int duplicate_to(int fd, int to, Function call) {
   if (fd == to || (!owner(fd).ours && !owner(to).ours)) return call();

@@ -1,7 +1,7 @@
 /**
  * @file guest_calls.h
- * What this library does with a libc call of the program it is a guest in: a call on a device node
- * goes to the card, every other one passes through untouched. errno changes only on failure.
+ * Handles the libc calls of the host program: a call on a device node goes to the card, every other call
+ * goes to libc unchanged. errno changes only on failure.
  */
 #ifndef VIRTUAL_CARD_GUEST_CALLS_H
 #define VIRTUAL_CARD_GUEST_CALLS_H

@@ -1,3 +1,4 @@
+// Removes this library from LD_PRELOAD.
 #include "preload.h"
 
 #include <dlfcn.h>
@@ -13,9 +14,9 @@ const char *base_name(const char *path) {
   return slash == nullptr ? path : slash + 1;
 }
 
-/// Removes the entries of a list that end in the file name; true when nothing is left. The list only
-/// gets shorter, so it is rewritten where it stands: a shell may have functions of its own behind
-/// setenv and getenv, and none of them is ready this early.
+/// Removes the entries of a list whose file name is `name`; returns true when no entry is left. Edits the
+/// list in place, which is possible because it only gets shorter. setenv() cannot be used: a shell may
+/// replace it with its own function, which does not work this early.
 bool remove_from_list(char *list, const char *name) {
   const std::size_t length = std::strlen(name);
   char *to = list;

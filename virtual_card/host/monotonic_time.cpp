@@ -1,4 +1,4 @@
-// Reads the monotonic clock past libc.
+// Reads the kernel's monotonic clock with a system call.
 #include "monotonic_time.h"
 
 #include <sys/syscall.h>

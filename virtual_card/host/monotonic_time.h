@@ -1,6 +1,6 @@
 /**
  * @file monotonic_time.h
- * The kernel's monotonic clock, by which the card keeps time.
+ * The kernel's monotonic clock, which the card uses for its own time.
  */
 #ifndef VIRTUAL_CARD_MONOTONIC_TIME_H
 #define VIRTUAL_CARD_MONOTONIC_TIME_H
@@ -11,8 +11,8 @@ namespace virtual_card {
 
 using MonotonicTime = std::chrono::steady_clock::time_point;
 
-/// Asks the kernel directly: a library that fakes the time for the host would otherwise make the card's
-/// waits, which the kernel times, end at the wrong moment.
+/// Returns the time from the kernel, not from libc: another preloaded library may fake libc's clock, but the
+/// card's waits end by the kernel's clock.
 MonotonicTime monotonic_now();
 
 }  // namespace virtual_card

@@ -1,3 +1,4 @@
+// Looks up and calls libc's own definitions of the names that this library replaces.
 #include "real_calls.h"
 
 #include <dlfcn.h>
@@ -16,7 +17,7 @@ constexpr std::array<const char *, kNames> kSymbols = {
     "close",  "close_range", "closefrom", "ioctl",    "read",     "__read_chk", "mmap",       "mmap64",
     "munmap", "dup",         "dup2",      "dup3",     "fcntl",    "fcntl64"};
 
-constinit std::array<std::atomic<void *>, kNames> addresses{};  // of the next definition of each name
+constinit std::array<std::atomic<void *>, kNames> addresses{};  // libc's definition of each name
 
 template <typename Function>
 Function *next(Name name) {

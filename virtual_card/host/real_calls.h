@@ -1,10 +1,10 @@
 /**
  * @file real_calls.h
- * The libc calls behind the ones this library puts itself in front of. The card's own code uses
- * these and never the plain names, which would lead back into the library.
+ * libc's own definitions of the functions that this library replaces. The card's code calls these and never
+ * the plain names, which would lead back into the library.
  *
- * Nothing here allocates, locks or needs a constructor to have run: the calls are used by the
- * loader's own start-up code and by sanitizer runtimes.
+ * Nothing here allocates, locks, or relies on a constructor: the loader's start-up code and sanitizer
+ * runtimes make these calls very early.
  */
 #ifndef VIRTUAL_CARD_REAL_CALLS_H
 #define VIRTUAL_CARD_REAL_CALLS_H
@@ -16,7 +16,7 @@
 
 namespace virtual_card::real {
 
-/// Each spelling of a call is passed on to the same spelling.
+/// The spellings of the replaced calls. A call goes to libc's definition of the same spelling.
 enum class Name : std::uint8_t {
   open,
   open64,

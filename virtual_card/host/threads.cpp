@@ -1,4 +1,4 @@
-// Starts threads with the host's signals blocked.
+// Starts threads that block signals and use normal scheduling.
 #include "threads.h"
 
 #include <pthread.h>
@@ -8,7 +8,8 @@
 namespace virtual_card {
 namespace {
 
-/// While an object of this class exists, new threads start with the signals blocked.
+/// While an object of this class exists, threads that its creator starts have all signals blocked except
+/// those of their own faults.
 class SignalsBlocked {
  public:
   SignalsBlocked() {

@@ -1,3 +1,4 @@
+// Copies between the card and the host's addresses with process_vm_readv and process_vm_writev.
 #include "user_memory.h"
 
 #include <sys/syscall.h>
@@ -10,14 +11,13 @@
 namespace virtual_card {
 namespace {
 
-/// The plain system call: libc's wrapper may be a sanitizer's, which would look at the host's address
-/// itself.
+/// Makes the system call directly: libc's wrapper may be a sanitizer's, which would check the host's address.
 long transfer(long call, void *here, std::uintptr_t there, std::size_t size) {
   iovec local{here, size};
   iovec remote{reinterpret_cast<void *>(there), size};  // NOLINT(performance-no-int-to-ptr)
   const long done = ::syscall(call, ::getpid(), &local, 1ul, &remote, 1ul, 0ul);
   if (done == static_cast<long>(size)) return 0;
-  // A sandbox may forbid the call even on the own process. Then only null can be told apart.
+  // A sandbox may forbid the call even on this process. Then only a null address gives EFAULT.
   const bool forbidden = done < 0 && (errno == ENOSYS || errno == EPERM);
   if (!forbidden || there == 0) return -EFAULT;
   if (call == SYS_process_vm_readv)

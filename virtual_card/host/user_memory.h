@@ -1,7 +1,7 @@
 /**
  * @file user_memory.h
- * Copies between the card and addresses the host has given, which may be wrong: the kernel does the
- * copying and answers for the address. Results are 0 or a negated error number.
+ * Copies between the card and addresses from the host, which may be wrong: the kernel does the copy and
+ * reports a bad address. Results are 0 or a negated error number.
  */
 #ifndef VIRTUAL_CARD_USER_MEMORY_H
 #define VIRTUAL_CARD_USER_MEMORY_H

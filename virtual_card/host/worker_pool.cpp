@@ -1,3 +1,4 @@
+// A pool of threads that do numbered jobs.
 #include "worker_pool.h"
 
 #include <utility>
@@ -11,7 +12,7 @@ void WorkerPool::grow() {
     threads_.reserve(max_threads_);
     while (threads_.size() + 1 < max_threads_) threads_.push_back(start_thread([this] { serve(); }));
   } catch (const std::exception &) {
-    // The next run() tries again.
+    // Go on with the threads there are; the next run() tries again.
   }
 }
 

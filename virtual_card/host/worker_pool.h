@@ -1,6 +1,6 @@
 /**
  * @file worker_pool.h
- * Threads that share out numbered jobs.
+ * A pool of threads that do numbered jobs.
  */
 #ifndef VIRTUAL_CARD_WORKER_POOL_H
 #define VIRTUAL_CARD_WORKER_POOL_H
@@ -18,26 +18,26 @@ namespace virtual_card {
 
 class WorkerPool {
  public:
-  /// `threads` at most work on a job list, the caller of run() included. The others begin with the first
-  /// list; where they cannot, those there are do it all.
+  /// At most `threads` threads work on a job list, the caller of run() included. The other threads start with
+  /// the first run(); if some cannot be started, the rest do the work.
   explicit WorkerPool(unsigned threads) : max_threads_(threads) {}
   ~WorkerPool() { stop(); }
   WorkerPool(const WorkerPool &) = delete;
   WorkerPool &operator=(const WorkerPool &) = delete;
 
-  /// Does job(0) to job(count - 1), in any order, and returns when all are done. What a job throws is
-  /// thrown then.
+  /// Does job(0) to job(count - 1), in any order, and returns when all are done. If a job throws, rethrows
+  /// that exception at the end; of several, the last.
   void run(std::size_t count, const std::function<void(std::size_t)> &job);
-  /// Ends and joins the threads, until the next run(). Calling it twice is harmless.
+  /// Ends and joins the threads; the next run() starts them again. May be called twice.
   void stop();
 
  private:
   void grow();
   void serve();
-  /// Takes jobs until none is left; the lock is held on entry and on return.
+  /// Does jobs until none is left. The lock is held on entry and on return.
   void work(std::unique_lock<std::mutex> &lock);
 
-  std::mutex mutex_;  ///< guards everything but the threads
+  std::mutex mutex_;  ///< guards all members except max_threads_ and threads_
   std::condition_variable wanted_;
   std::condition_variable finished_;
   const std::function<void(std::size_t)> *job_ = nullptr;
@@ -45,7 +45,7 @@ class WorkerPool {
   std::size_t count_ = 0;
   std::size_t busy_ = 0;
   bool ending_ = false;
-  std::exception_ptr failure_;  ///< what a job of this run() threw
+  std::exception_ptr failure_;  ///< exception of a job of the current run()
   unsigned max_threads_;
   std::vector<std::thread> threads_;
 };

@@ -1,3 +1,4 @@
+// The state that the device nodes share: settings, preview buffers, power-up and last close.
 #include "board.h"
 
 #include <cerrno>

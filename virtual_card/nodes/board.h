@@ -1,6 +1,6 @@
 /**
  * @file board.h
- * What the device nodes of the card share: the settings, the chips, the streams and the picture side.
+ * The state that the card's device nodes share: settings, chips, streams and the engine.
  */
 #ifndef VIRTUAL_CARD_BOARD_H
 #define VIRTUAL_CARD_BOARD_H
@@ -21,11 +21,11 @@
 
 namespace virtual_card {
 
-/// What commands set and ask, as it is at power-up.
+/// The settings that commands write and read. The constructor sets the power-up state.
 struct BoardSettings {
   CardState state;
-  Layout batch;           ///< the layout between DISP_IOC_BEGIN_UPDATE and END_UPDATE
-  bool batching = false;  ///< between the two
+  Layout batch;           ///< the layout that is being changed while `batching`
+  bool batching = false;  ///< between DISP_IOC_BEGIN_UPDATE and DISP_IOC_END_UPDATE
   RegisterFile codec = codec_at_power_up();
   RegisterFile video_input = video_input_at_power_up();
   DecoderChips decoders;
@@ -33,57 +33,57 @@ struct BoardSettings {
   std::array<u16, kChannels> motion_level{};
   std::optional<u32> scripted_motion;
   u32 selected_buffer = 0;
-  u32 session = 0;                                     ///< counts starts and stops of encoding
+  u32 session = 0;                                     ///< number of starts and stops of encoding so far
   nanoseconds encoding_since{0};                       ///< card time of ENC_IOC_START
-  nanoseconds supplied_since{0};                       ///< card time at which a supply was set
+  nanoseconds supplied_since{0};                       ///< card time of the last set_supply()
   std::deque<std::pair<u32, long>> scripted_previews;  ///< index and result of the next preview reads
   BoardSettings();
 };
 
-/// The four preview pictures and which of them is where.
+/// The use of the four preview buffers.
 struct PreviewBuffers {
-  std::optional<u32> newest;  ///< holds the last picture composed
-  long size = 0;              ///< its bytes
-  std::optional<u32> handed;  ///< last handed to the host, which may still be looking at it
+  std::optional<u32> newest;  ///< buffer of the last picture composed
+  long size = 0;              ///< bytes of that picture
+  std::optional<u32> handed;  ///< buffer that the host read last and may still be using
   std::uint64_t composed = 0;
 
-  /// Where the next picture goes: the next in turn, past the one the host has.
+  /// Returns the buffer for the next picture: the next in turn that is not `handed`.
   u32 next() const;
 };
 
 struct Board {
   Board();
 
-  /// Everything as built. Only while nothing is open.
+  /// Restores the power-up state. Call it only while no node is open.
   void reset();
-  /// What the three devices do with a standard. Needs `mutex`.
+  /// Sets the common standard of encoder, display and video input. The caller holds `mutex`.
   long set_standard(u32 standard);
-  /// A write to a register of the codec chip, with what hangs on it. Needs `mutex`.
+  /// Write a register of a chip and update the settings that depend on it. The caller holds `mutex`.
   void write_codec(u32 address, u32 value);
   void write_video_input(u32 address, u32 value);
   void write_decoder(unsigned chip, unsigned address, u8 value);
-  /// What ENC_IOC_STOP does. Needs `mutex`.
+  /// Stops encoding and drops the queued frames. The caller holds `mutex`.
   void stop_encoding();
-  /// Drops what was encoded in another session than this one: a stop can come while a field is being
-  /// encoded, and its frames must not open the next recording.
+  /// Drops the queued frames if `session` is no longer the current session: encoding may be stopped while a
+  /// field is being encoded, and the frames of that field must not start the next recording.
   void drop_frames_of_other_session(u32 session);
-  /// What a driver does when its last node is closed: nothing is left running.
+  /// Stops encoding and preview when the last descriptor of a node is closed, as a driver does.
   void last_close();
-  /// Back to the card's own encoders.
+  /// Ends the supply of ready-made frames: the card's encoders deliver again.
   void clear_supply();
-  /// How long a read may wait for its stream.
+  /// Returns how long a read may wait for a frame.
   microseconds read_wait() const;
-  /// The card has been pulled out for now.
+  /// Returns whether the card is pulled out now, by the option `vanish`.
   bool vanished() const;
 
   std::mutex mutex;  ///< guards `settings` and `preview`
   BoardSettings settings;
   PreviewBuffers preview;
-  std::atomic<bool> encoding{false};  ///< settings.state.encoding, for the reads
-  std::atomic<bool> supplied{false};  ///< ready-made frames take the encoders' place
+  std::atomic<bool> encoding{false};  ///< copy of settings.state.encoding, for reads without the mutex
+  std::atomic<bool> supplied{false};  ///< ready-made frames replace the encoders
   std::atomic<bool> nowait{false};    ///< reads of an empty stream return at once
 
-  Options options;  ///< constant after power-up, but for reset()
+  Options options;  ///< only power-up and reset() change it
   Clock clock;
   Injector injector;
   CallLog log;

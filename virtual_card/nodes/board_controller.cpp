@@ -1,3 +1,4 @@
+// The board controller: version and watchdog.
 #include "board_controller.h"
 
 #include <algorithm>

@@ -1,3 +1,7 @@
+/**
+ * @file board_controller.h
+ * The board controller: version and watchdog.
+ */
 #ifndef VIRTUAL_CARD_BOARD_CONTROLLER_H
 #define VIRTUAL_CARD_BOARD_CONTROLLER_H
 
@@ -8,21 +12,21 @@
 
 namespace virtual_card {
 
-/// The board's small controller: version, and a watchdog that would reset the machine when it is not
-/// fed in time.
+/// The board controller: reports the board version and has a watchdog, which on a real board resets the
+/// machine when it is not fed in time.
 class BoardController {
  public:
   /// Card time from the last feed to the reset of the machine: twice the SDK's feeding interval.
   static constexpr nanoseconds kResetDelay = std::chrono::seconds{60};
 
-  /// Carries a command out and answers it; commands it does not know answer 0.
+  /// Carries out a command and returns the reply; an unknown command gets 0.
   u32 command(u32 command, nanoseconds now);
   void set_version(u32 reply) { version_ = reply; }
-  /// The next commands with this code are answered from the list, and carried out only when the reply
-  /// is the one that confirms them.
+  /// Sets the replies to the next commands with this code. If a reply is not the confirming one, the command
+  /// is not carried out.
   void script(u32 command, const std::vector<u32> &replies);
 
-  /// True once, when the watchdog has run out.
+  /// Returns true once when the time of the watchdog has run out, and stops the watchdog.
   bool expired(nanoseconds now);
   bool watchdog_running() const { return running_; }
   std::uint64_t kicks() const { return kicks_; }

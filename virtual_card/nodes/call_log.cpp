@@ -1,3 +1,4 @@
+// The log of calls on device nodes.
 #include "call_log.h"
 
 #include <iomanip>

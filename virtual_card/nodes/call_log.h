@@ -1,3 +1,7 @@
+/**
+ * @file call_log.h
+ * The log of calls on device nodes.
+ */
 #ifndef VIRTUAL_CARD_CALL_LOG_H
 #define VIRTUAL_CARD_CALL_LOG_H
 
@@ -9,22 +13,22 @@
 
 namespace virtual_card {
 
-/// What was done to the device nodes, in order of completion: kept for tests, written to a file for
-/// people.
+/// The calls on device nodes in the order of their completion: in memory for tests, in a file for people.
 class CallLog {
  public:
   void record(bool on);
   std::vector<Call> calls() const;
-  /// Every command from now on also becomes a line of this file. False when it cannot be written.
+  /// Also writes a line to this file for each call from now on. Returns false when the file cannot be
+  /// written.
   bool write_to(const std::string &path);
-  /// Whether add() does anything.
+  /// Returns whether add() records calls.
   bool on() const { return on_.load(std::memory_order_relaxed); }
-  /// `name` is that of the ioctl code, or null.
+  /// Adds a call. `name` is the name of the ioctl code, or null.
   void add(Call call, const char *name = nullptr);
 
  private:
-  std::atomic<bool> on_{false};  // recording_ or a file: keeps the lock off the frame path
-  mutable std::mutex mutex_;     // guards everything below
+  std::atomic<bool> on_{false};  // recording_ or file_ is open; read without the lock on the frame path
+  mutable std::mutex mutex_;     // guards all members below
   bool recording_ = false;
   std::vector<Call> calls_;
   std::ofstream file_;

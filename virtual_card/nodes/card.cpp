@@ -1,3 +1,4 @@
+// Creates the card, passes calls to its nodes, and counts descriptors and mappings.
 #include "card.h"
 
 #include <fcntl.h>
@@ -19,11 +20,12 @@ namespace virtual_card {
 namespace {
 
 constinit std::atomic<Card *> current{nullptr};
-constinit std::mutex creation_mutex;         // guards the making of the card
-Card *left_to_parent = nullptr;              // after a fork; kept so that leak checkers find it
-constinit thread_local bool making = false;  // this thread is making the card
+constinit std::mutex creation_mutex;  // guards the creation of the card
+Card *left_to_parent = nullptr;  // the parent's card in a forked child; kept so that leak checkers find it
+constinit thread_local bool making = false;  // this thread is creating the card
 
-/// A film among the options is opened with the host's calls, which may lead back here.
+/// Sets `making` while it exists. Opening a film of the options calls libc's functions, which may lead back
+/// to instance().
 class Making {
  public:
   Making() { making = true; }
@@ -32,7 +34,7 @@ class Making {
   Making &operator=(const Making &) = delete;
 };
 
-/// Ends the card's threads before the host's libraries are torn down.
+/// Ends the card's threads at exit, before the host's libraries are unloaded.
 struct AtExit {
   ~AtExit() {
     if (Card *card = current.load()) card->power_off();

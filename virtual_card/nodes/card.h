@@ -1,7 +1,7 @@
 /**
  * @file card.h
- * The card of this process: its four device nodes and what powers them. It knows calls on device
- * nodes, not how they get here. Results below zero are negated error numbers.
+ * The card of this process: its four device nodes and the thread that runs it. It handles calls on device
+ * nodes and knows nothing of libc. Results below zero are negated error numbers.
  */
 #ifndef VIRTUAL_CARD_CARD_H
 #define VIRTUAL_CARD_CARD_H
@@ -13,7 +13,7 @@
 
 namespace virtual_card {
 
-/// The device behind a path, Device::none for a node the card does not have.
+/// Returns the device of a path, or Device::none for a node that the card does not have.
 Device device_of(const char *path);
 
 struct MapRequest {
@@ -26,35 +26,38 @@ struct MapRequest {
 
 class Card {
  public:
-  /// Made at the first use, and never destroyed: the host's threads may outlive its destructors.
-  /// Throws std::system_error, EBUSY, where making it leads back here.
+  /// Returns the card; creates it at the first use. It is never destroyed: the host's threads may run longer
+  /// than its destructors. Throws std::system_error with EBUSY when called while the card is being created on
+  /// this thread.
   static Card &instance();
-  /// A forked child has none of the card's threads: it begins with a card of its own.
+  /// Call these around fork(). A forked child has none of the card's threads, so it creates a card of its
+  /// own.
   static void before_fork();
   static void after_fork(bool child);
 
-  /// A new descriptor. `sibling` is one of the same node that is open, or -1.
+  /// Returns a new descriptor of a node. `sibling` is an open descriptor of the same node, or -1.
   long open(Device device, int flags, int sibling);
-  /// Whether closing reports a failure. The descriptor goes in any case; closed() says that it has.
+  /// Returns the result of closing a descriptor. The caller closes it in any case and then calls closed().
   long close(Device device);
   long ioctl(Device device, u32 code, std::uintptr_t argument);
   long read(Device device, std::uintptr_t buffer, std::size_t count);
-  /// Maps the device's region through its descriptor.
+  /// Maps the device's region through the descriptor `fd`.
   long mmap(Device device, int fd, const MapRequest &request, void *&mapped);
-  /// Whether unmapping reports a failure, and then does not happen; unmapped() says that it has.
+  /// Returns the result of unmapping. On 0 the caller unmaps the region and then calls unmapped().
   long munmap(Device device, std::size_t length);
 
-  /// Count the descriptors and mappings in use. With the last descriptor the card stops.
+  /// Count the descriptors and mappings in use. When the last descriptor is closed, the card stops.
   void duplicated();
   void closed();
   void unmapped(int count);
   int open_descriptors();
   int open_mappings();
 
-  /// As built. False, and nothing done, while a node is open.
+  /// reset() restores the power-up state, set_clock() the clock. While a node is open, both do nothing and
+  /// return false.
   bool reset();
   bool set_clock(ClockMode mode, double speed);
-  /// Ends the threads for good, as the process does.
+  /// Ends the threads at the end of the process; they cannot be started again.
   void power_off();
 
   Board &board() { return board_; }
@@ -70,7 +73,7 @@ class Card {
   Board board_;
   std::array<std::unique_ptr<DeviceNode>, 4> nodes_;
   Runner runner_{board_};
-  std::mutex power_mutex_;  // guards what follows and the runner's start and stop
+  std::mutex power_mutex_;  // guards the members below, and start and stop of runner_
   int open_ = 0;
   int mapped_ = 0;
   bool off_ = false;

@@ -1,3 +1,4 @@
+// Card time and the due times of fields.
 #include "clock.h"
 
 #include <ctime>
@@ -5,8 +6,8 @@
 namespace virtual_card {
 namespace {
 
-/// Where the manual clock's wall time starts, in the local time zone: the same in every run, and
-/// readable in a burnt-in clock.
+/// Returns the wall time at which the manual clock starts, in the local time zone. It is the same in every
+/// run, so that pictures do not differ.
 microseconds manual_wall_start() {
   std::tm date{};
   date.tm_year = 2009 - 1900;

@@ -1,6 +1,6 @@
 /**
  * @file clock.h
- * Card time, and when fields are due in it.
+ * Card time and the due times of fields.
  */
 #ifndef VIRTUAL_CARD_CLOCK_H
 #define VIRTUAL_CARD_CLOCK_H
@@ -15,7 +15,7 @@ namespace virtual_card {
 
 using std::chrono::microseconds;
 using std::chrono::nanoseconds;
-/// Time since power-up.
+/// The card's clock. Card time is the time since power-up.
 class Clock {
  public:
   Clock() { power_up(ClockMode::real_time, 1.0); }
@@ -23,17 +23,17 @@ class Clock {
   void power_up(ClockMode mode, double speed);
   ClockMode mode() const;
   nanoseconds now() const;
-  /// When the host's monotonic clock will show this card time; not with the manual clock.
+  /// Returns the monotonic time at a card time; not for the manual clock.
   MonotonicTime when(nanoseconds card_time) const;
-  /// How much card time passes in a second of the host's.
+  /// Returns how much card time passes in a second of the host.
   nanoseconds second() const;
-  /// Manual clock: moves on, never back.
+  /// Manual clock: sets the card time; it never goes back.
   void move_to(nanoseconds card_time);
-  /// The wall clock, in microseconds since the epoch, at a card time.
+  /// Returns the wall time at a card time, in microseconds since the epoch.
   microseconds wall(nanoseconds card_time) const;
 
  private:
-  mutable std::mutex mutex_;  // guards everything below
+  mutable std::mutex mutex_;  // guards all members below
   ClockMode mode_;
   double speed_;
   MonotonicTime start_;
@@ -41,14 +41,15 @@ class Clock {
   nanoseconds manual_;
 };
 
-/// The due times of fields. Each is computed from the first field of its standard, so that no error adds up.
+/// The due times of fields. Each is computed from the first field of its standard, so rounding errors do not
+/// add up.
 class FieldSchedule {
  public:
   nanoseconds due(std::int64_t field) const;
-  /// The first field that is due at this time or later.
+  /// Returns the first field that is due at `time` or later.
   std::int64_t first_at(nanoseconds time) const;
   u32 standard() const { return standard_; }
-  /// Fields from `field` on follow another standard; `field` itself keeps its due time.
+  /// Changes the standard of `field` and all later fields. The due time of `field` does not change.
   void change_standard(u32 standard, std::int64_t field);
 
  private:
@@ -57,7 +58,7 @@ class FieldSchedule {
   nanoseconds anchor_{0};
 };
 
-/// Start of an audio block, 128 samples at 8 kHz each.
+/// Duration of an audio block: 128 samples at 8 kHz.
 inline constexpr nanoseconds kAudioBlock = std::chrono::milliseconds{16};
 
 }  // namespace virtual_card

@@ -1,4 +1,4 @@
-// The control interface: a hand at the machine.
+// The functions of virtual_card.h.
 
 #include <cstdio>
 #include <stdexcept>
@@ -12,7 +12,7 @@ Board &board() {
   return Card::instance().board();
 }
 
-/// Calls `use` with the settings, while nothing else changes them.
+/// Calls `use` with the settings while holding the board's mutex.
 template <typename Use>
 auto with_settings(Use use) {
   Board &card = board();

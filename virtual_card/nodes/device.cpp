@@ -1,3 +1,4 @@
+// Runs commands: copies the record in, calls the handler, copies the reply out.
 #include "device.h"
 
 #include <algorithm>
@@ -40,7 +41,7 @@ long DeviceNode::run(u32 code, const CommandRow *row, std::uintptr_t argument, C
     std::copy_n(record.begin(), sizeof channel, reinterpret_cast<u8 *>(&channel));
     if (channel >= kChannels) return -EINVAL;
   }
-  // Whether the answer can be delivered is found out before the command does anything.
+  // Test whether the reply can be written back before the command changes anything.
   if (row->answers)
     if (const long error = copy_to_user(argument, record.data(), row->size)) return error;
   {

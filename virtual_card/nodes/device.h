@@ -1,7 +1,7 @@
 /**
  * @file device.h
- * A device node of the card, as a kernel would call its driver: results below zero are negated error
- * numbers.
+ * A device node of the card. Its functions correspond to those of a kernel driver: results below zero are
+ * negated error numbers.
  */
 #ifndef VIRTUAL_CARD_DEVICE_H
 #define VIRTUAL_CARD_DEVICE_H
@@ -12,8 +12,8 @@ namespace virtual_card {
 
 class DeviceNode;
 
-/// A command a node understands: its record is copied in, the first word checked if it is a channel,
-/// the handler called with the board locked, and the record copied back if the command answers.
+/// A command that a node has. The node copies the record in, checks the first word if it is a channel, calls
+/// the handler with the board locked, and copies the record back if the command answers.
 struct CommandRow {
   const char *name;
   u32 code;
@@ -32,14 +32,14 @@ class DeviceNode {
 
   long ioctl(u32 code, std::uintptr_t argument);
   virtual long read(std::uintptr_t buffer, std::size_t count);
-  /// Where in the region a mapping of the node lies.
+  /// Returns the offset in the region at which a mapping of the node starts.
   virtual long place_mapping(std::size_t length, int protection, off_t offset);
 
   Region &region() { return region_; }
 
  protected:
   virtual std::span<const CommandRow> commands() const { return {}; }
-  /// Adds to the log what a record points to.
+  /// Appends to the log the data that a record points to.
   virtual void log_pointed_to(u32, const void *, std::vector<u8> &) const {}
 
   Board &board_;
@@ -51,7 +51,7 @@ class DeviceNode {
   Region &region_;
 };
 
-/// The size of the largest record of any command.
+/// Upper limit of the size of a command's record.
 inline constexpr std::size_t kMaxRecord = 64;
 
 namespace detail {
@@ -94,7 +94,7 @@ constexpr CommandRow command(const char *name, u32 code, First first = First::wo
   return {name, code, size, first == First::channel, answer == Answer::yes, &detail::call<Method>};
 }
 
-/// The row of a command of the device boundary; further arguments are those of command().
+/// The row of a command of zv_driver.h. Further arguments are those of command().
 #define VIRTUAL_CARD_COMMAND(method, code, ...) \
   command<&method>(#code, driver::code __VA_OPT__(, ) __VA_ARGS__)
 

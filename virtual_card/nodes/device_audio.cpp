@@ -1,3 +1,4 @@
+// Audio reads.
 #include "device_audio.h"
 
 #include <algorithm>

@@ -1,3 +1,7 @@
+/**
+ * @file device_audio.h
+ * The audio node.
+ */
 #ifndef VIRTUAL_CARD_DEVICE_AUDIO_H
 #define VIRTUAL_CARD_DEVICE_AUDIO_H
 
@@ -5,7 +9,7 @@
 
 namespace virtual_card {
 
-/// /dev/zarvo_g723_0: audio blocks. It takes no commands.
+/// /dev/zarvo_g723_0: reads of audio blocks. It has no commands.
 class AudioDevice : public DeviceNode {
  public:
   explicit AudioDevice(Board &board) : DeviceNode(board, Device::audio, board.audio_region) {}

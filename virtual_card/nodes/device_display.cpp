@@ -1,3 +1,4 @@
+// Commands of the display node, and preview reads.
 #include "device_display.h"
 
 #include <sys/mman.h>
@@ -94,7 +95,8 @@ long DisplayDevice::set_zoom(driver::Zoom &zoom) {
   return 0;
 }
 
-/// The words tune the scaler's sampling of a three-column layout; the drawn pictures need none.
+/// Checks the word and ignores it. On a real card it adjusts the scaler for a three-column layout; the drawn
+/// pictures do not need that.
 long DisplayDevice::set_source(u32 &word) {
   return word >> driver::kSourceGroupShift < driver::kSourceGroups ? 0 : -EINVAL;
 }
@@ -151,7 +153,7 @@ long DisplayDevice::preview_on() {
 
 long DisplayDevice::preview_off() {
   board_.settings.state.display.on = false;
-  board_.preview.newest.reset();  // the next preview does not begin with an old picture
+  board_.preview.newest.reset();  // the next preview must not start with an old picture
   return 0;
 }
 

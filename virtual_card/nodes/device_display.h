@@ -1,3 +1,7 @@
+/**
+ * @file device_display.h
+ * The display node.
+ */
 #ifndef VIRTUAL_CARD_DEVICE_DISPLAY_H
 #define VIRTUAL_CARD_DEVICE_DISPLAY_H
 
@@ -5,7 +9,7 @@
 
 namespace virtual_card {
 
-/// /dev/zarvo_disp0: layout, codec registers, motion bits, and the preview pictures.
+/// /dev/zarvo_disp0: layout, codec registers, motion bits and preview pictures.
 class DisplayDevice : public DeviceNode {
  public:
   explicit DisplayDevice(Board &board) : DeviceNode(board, Device::display, board.preview_region) {}
@@ -36,7 +40,8 @@ class DisplayDevice : public DeviceNode {
   std::span<const CommandRow> commands() const override;
 
  private:
-  /// What layout commands change: the batch while one is open, else what is shown.
+  /// Returns the layout that layout commands change: the batch between begin and end of an update, else the
+  /// layout that is shown.
   Layout &layout();
 };
 

@@ -1,3 +1,4 @@
+// Commands of the encoder node, and reads of MPEG-4 and Motion-JPEG frames.
 #include "device_encoder.h"
 
 #include <cerrno>

@@ -1,3 +1,7 @@
+/**
+ * @file device_encoder.h
+ * The encoder node.
+ */
 #ifndef VIRTUAL_CARD_DEVICE_ENCODER_H
 #define VIRTUAL_CARD_DEVICE_ENCODER_H
 

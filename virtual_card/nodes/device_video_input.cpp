@@ -1,3 +1,4 @@
+// Commands of the video-input node.
 #include "device_video_input.h"
 
 #include <algorithm>
@@ -30,7 +31,7 @@ bool fits(const driver::MotionMap &map) {
   return inside(map.column, map.columns) && inside(map.row, map.rows);
 }
 
-/// Copies a map's thresholds in; 0 or a negated error number.
+/// Copies the thresholds of a map from the host. Returns 0 or a negated error number.
 long fetch_thresholds(const driver::MotionMap &map, std::vector<u16> &thresholds) {
   if (!fits(map)) return -EINVAL;
   thresholds.resize(std::size_t{map.columns} * map.rows);
@@ -44,7 +45,8 @@ std::span<const CommandRow> VideoInputDevice::commands() const {
   return kCommands;
 }
 
-/// The chip's units are 8 pixels and lines: a mask grows to them rather than show what it should hide.
+/// Rounds the mask to the chip's units of 8 pixels and lines: outward, so that nothing it should hide is
+/// visible.
 long VideoInputDevice::set_mask(driver::Mask &mask) {
   if (mask.x_end < mask.x_start || mask.y_end < mask.y_start) return -EINVAL;
   if (mask.x_end > kMaxWidth || mask.y_end > kMaxLines) return -EINVAL;

@@ -1,3 +1,7 @@
+/**
+ * @file device_video_input.h
+ * The video-input node.
+ */
 #ifndef VIRTUAL_CARD_DEVICE_VIDEO_INPUT_H
 #define VIRTUAL_CARD_DEVICE_VIDEO_INPUT_H
 

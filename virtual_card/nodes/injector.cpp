@@ -1,3 +1,4 @@
+// Makes operations on the device nodes fail.
 #include "injector.h"
 
 namespace virtual_card {

@@ -1,3 +1,7 @@
+/**
+ * @file injector.h
+ * Makes operations on the device nodes fail, for tests.
+ */
 #ifndef VIRTUAL_CARD_INJECTOR_H
 #define VIRTUAL_CARD_INJECTOR_H
 
@@ -8,18 +12,18 @@
 
 namespace virtual_card {
 
-/// Makes operations on the device nodes fail, once or for good, after a countdown.
+/// Makes operations on the device nodes fail after a countdown, once or from then on.
 class Injector {
  public:
   void set(const Fault &fault);
   void clear();
   int hits() const;
   void reset();
-  /// The error number this operation fails with, or 0.
+  /// Counts an operation. Returns the error number with which it must fail, or 0.
   int strike(Operation operation, Device device, std::uint32_t code = 0);
 
  private:
-  std::atomic<bool> armed_{false};  // whether fault_ can still strike: keeps the lock off the frame path
+  std::atomic<bool> armed_{false};  // fault_ can still strike; read without the lock on the frame path
   mutable std::mutex mutex_;        // guards fault_ and hits_
   Fault fault_{};
   int hits_ = 0;

@@ -1,3 +1,4 @@
+// Reads the options of the environment variable ZARVO_VIRTUAL_CARD.
 #include "options.h"
 
 #include <algorithm>
@@ -6,12 +7,12 @@
 namespace virtual_card {
 namespace {
 
-/// Sets an option; false when the value is not a possible one.
+/// Sets an option. Returns false when the value is not possible.
 using Setter = bool (*)(Options &options, std::string_view value);
 
 struct OptionRow {
   std::string_view name;
-  const char *values;  ///< what is possible, for the error text
+  const char *values;  ///< the possible values, for the error text
   Setter set;
 };
 
@@ -21,14 +22,15 @@ bool to_number(std::string_view text, Number &number) {
   return error == std::errc{} && end == text.data() + text.size();
 }
 
-/// Splits at the first separator; the rest is empty when there is none.
+/// Splits at the first separator. Without a separator the second part is empty.
 std::pair<std::string_view, std::string_view> split(std::string_view text, char separator) {
   const auto place = text.find(separator);
   if (place == std::string_view::npos) return {text, {}};
   return {text.substr(0, place), text.substr(place + 1)};
 }
 
-/// "3", "1-4" or "1-4,7" with numbers from 1 to `count`, as bits from 0.
+/// Converts a list such as "3", "1-4" or "1-4,7" to a mask: numbers from 1 to `count`, bits from 0. Returns
+/// false when the list is wrong.
 bool to_mask(std::string_view text, unsigned count, u32 &mask) {
   for (bool more = true; more;) {
     more = text.find(',') != std::string_view::npos;
@@ -105,8 +107,7 @@ constexpr OptionRow kOptions[] = {
 };
 
 constexpr std::string_view kCamera = "camera";
-constexpr const char *kCameraValues =
-    "a video file, with the camera's number 1-16, e.g. camera3=/path/clip.mp4";
+constexpr const char *kCameraValues = "camera number 1-16 and a video file, e.g. camera3=/path/clip.mp4";
 
 std::string quoted(std::string_view text) {
   return "\"" + std::string(text) + "\"";
@@ -118,13 +119,13 @@ std::string possible_names() {
   return names;
 }
 
-/// Empty, or what is wrong with the item.
+/// Applies one item. Returns an empty text, or a text that says what is wrong with it.
 std::string apply(Options &options, std::string_view item) {
   const auto [name, value] = split(item, '=');
   if (name.substr(0, kCamera.size()) == kCamera) {
     unsigned number = 0;
     if (!to_number(name.substr(kCamera.size()), number) || number < 1 || number > kChannels || value.empty())
-      return "option " + quoted(item) + ": possible is " + kCameraValues;
+      return "option " + quoted(item) + " is wrong; expected: " + kCameraValues;
     options.films[number - 1] = value;
     return {};
   }
@@ -132,7 +133,7 @@ std::string apply(Options &options, std::string_view item) {
                                        [name = name](const OptionRow &entry) { return entry.name == name; });
   if (row == std::end(kOptions)) return "option " + quoted(name) + " is unknown; " + possible_names();
   if (row->set(options, value)) return {};
-  return "option " + quoted(name) + ": value " + quoted(value) + " is wrong; possible is " + row->values;
+  return "option " + quoted(name) + ": value " + quoted(value) + " is wrong; expected: " + row->values;
 }
 
 }  // namespace

@@ -1,4 +1,4 @@
-// Makes, maps and releases the memory behind a node's descriptors.
+// Creates, maps and releases the memory that a node shares with the host.
 #include "region.h"
 
 #include <fcntl.h>
@@ -20,7 +20,8 @@ int fcntl(int fd, int command, std::intptr_t argument) {
   return real::fcntl(real::Name::fcntl, fd, command, std::bit_cast<void *>(argument));
 }
 
-/// Seals the size: a mapping whose file shrinks would kill its reader with SIGBUS.
+/// Creates a file in memory and seals its size: if the host shrank the file, the card's next access would
+/// raise SIGBUS.
 int make_file(const char *name, std::size_t size, bool close_on_exec) {
   const unsigned flags = MFD_ALLOW_SEALING | (close_on_exec ? MFD_CLOEXEC : 0u);
   constexpr std::intptr_t kSeals = F_SEAL_SHRINK | F_SEAL_GROW | F_SEAL_SEAL;

@@ -1,6 +1,6 @@
 /**
  * @file region.h
- * Memory that a device node shares with the host.
+ * The memory that a device node shares with the host.
  */
 #ifndef VIRTUAL_CARD_REGION_H
 #define VIRTUAL_CARD_REGION_H
@@ -12,8 +12,8 @@
 
 namespace virtual_card {
 
-/// The memory is a file in memory. The host's descriptors of the node are descriptors of that file; the card
-/// keeps a mapping of it and no descriptor.
+/// The memory of one node, as a file in memory. The host's descriptors of the node are descriptors of that
+/// file; the card keeps a mapping of the file and no descriptor.
 class Region {
  public:
   Region(const char *name, std::size_t size) : name_(name), size_(size) {}
@@ -21,16 +21,16 @@ class Region {
   Region(const Region &) = delete;
   Region &operator=(const Region &) = delete;
 
-  /// A new descriptor for the host, or a negated error number. `sibling` is a descriptor of the node that is
-  /// open, or -1; without one the memory is made anew, all zeros.
+  /// Returns a new descriptor for the host, or a negated error number. `sibling` is an open descriptor of the
+  /// node, or -1: then the memory is new and all zeros.
   long open(int sibling, bool close_on_exec);
-  /// Gives up the card's mapping. Mappings of the host stay valid.
+  /// Removes the card's mapping. The host's mappings stay valid.
   void release();
   std::size_t size() const { return size_; }
 
   /// Copies bytes to an offset, as many as fit before `end`.
   void write(std::size_t offset, std::span<const u8> bytes, std::size_t end);
-  /// Calls `use` with the memory if the card has it.
+  /// Calls `use` with the memory if the card has it mapped.
   template <typename Use>
   void with_bytes(Use use) {
     const std::lock_guard lock(mutex_);
@@ -40,7 +40,7 @@ class Region {
  private:
   const char *name_;
   std::size_t size_;
-  std::mutex mutex_;  // guards memory_: the last close must not unmap it under a read
+  std::mutex mutex_;  // guards memory_: the last close must not unmap it during a read
   u8 *memory_ = nullptr;
 };
 

@@ -1,3 +1,4 @@
+// Registers of the chips and their power-up values.
 #include "register_file.h"
 
 namespace virtual_card {
@@ -10,8 +11,8 @@ RegisterFile codec_at_power_up() {
 }
 
 RegisterFile video_input_at_power_up() {
-  constexpr u32 kWindowSetup =
-      0x00000100;  // the low bits carry a setup of their own, which a write must keep
+  // Bits 0-27 hold other settings, which a write of the channel must keep.
+  constexpr u32 kWindowSetup = 0x00000100;
   RegisterFile block;
   for (u32 window = 0; window < kChannels; ++window)
     block.write(driver::kRegRouting + 4 * window, window << driver::kRoutingShift | kWindowSetup);
@@ -28,7 +29,7 @@ DecoderChips::DecoderChips() {
 
 u8 DecoderChips::read(unsigned chip, unsigned address, const CardState &state) const {
   if (address != driver::kDecoderStatus || status_written_.at(chip)) return bytes_.at(chip).at(address);
-  u32 status = chip == 0 ? state.sound_present << 4 : 0;  // the audio inputs are wired to the first chip
+  u32 status = chip == 0 ? state.sound_present << 4 : 0;  // chip 0 also reports the audio inputs
   for (unsigned n = 0; n < driver::kChannelsPerChip; ++n)
     if (!state.channel[chip * driver::kChannelsPerChip + n].lost) status |= 1u << n;
   return static_cast<u8>(status);

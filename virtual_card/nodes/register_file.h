@@ -1,6 +1,6 @@
 /**
  * @file register_file.h
- * Registers of the chips on the card: words at any address, and the decoders' banks of bytes.
+ * Registers of the chips on the card: 32-bit words at any address, and the decoders' 8-bit registers.
  */
 #ifndef VIRTUAL_CARD_REGISTER_FILE_H
 #define VIRTUAL_CARD_REGISTER_FILE_H
@@ -11,7 +11,7 @@
 
 namespace virtual_card {
 
-/// Words of 32 bits; one that was never written holds 0.
+/// Registers of 32 bits. A register that was never written holds 0.
 class RegisterFile {
  public:
   u32 read(u32 address) const {
@@ -24,19 +24,20 @@ class RegisterFile {
   std::map<u32, u32> words_;
 };
 
-/// The codec chip after power-up: the display runs.
+/// Returns the codec chip after power-up: the display is running.
 RegisterFile codec_at_power_up();
-/// The video-input block after power-up: window n shows channel n.
+/// Returns the video-input block after power-up: window n shows channel n.
 RegisterFile video_input_at_power_up();
 
 /// The four TW2815 decoders, 256 registers each.
 class DecoderChips {
  public:
   DecoderChips();
-  /// The status register follows the cameras and audio inputs until something writes it.
+  /// Reads a register. The status register reports the cameras and audio inputs until it is written; then it
+  /// keeps the value written.
   u8 read(unsigned chip, unsigned address, const CardState &state) const;
   void write(unsigned chip, unsigned address, u8 value);
-  /// The picture properties of a channel as its decoder has them.
+  /// Returns the picture properties in the registers of a channel.
   PictureSettings picture(unsigned channel) const;
 
  private:

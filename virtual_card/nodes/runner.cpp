@@ -1,3 +1,4 @@
+// Runs fields, audio blocks, preview pictures and supplies when they are due.
 #include "runner.h"
 
 #include <algorithm>
@@ -19,7 +20,7 @@ std::int64_t audio_block_at(nanoseconds time) {
   return (time + kAudioBlock - nanoseconds{1}) / kAudioBlock;
 }
 
-/// Pictures a channel would have encoded in a range of fields.
+/// Returns how many pictures a channel would have encoded in a range of fields.
 std::uint64_t pictures_between(const EncoderSettings &encoder, std::int64_t first, std::int64_t end) {
   std::uint64_t pictures = 0;
   if (encoder.scale_code == 0) return pictures;
@@ -52,7 +53,8 @@ long Runner::start() {
 void Runner::stop() {
   ending_ = true;
   {
-    // The thread releases the mutex only to wait or to end: after this, the signal cannot come too early.
+    // The thread releases the mutex only when it waits or ends. Taking it once makes sure that the signal
+    // below does not come before the wait.
     const std::lock_guard lock(run_mutex_);
   }
   signal_.notify_all();
@@ -65,6 +67,7 @@ void Runner::power_up() {
   schedule_ = FieldSchedule{};
   field_ = 0;
   audio_block_ = 0;
+  for (Pace *pace : {&video_pace_, &audio_pace_}) pace->count = 0;
 }
 
 void Runner::loop() {
@@ -90,7 +93,7 @@ void Runner::advance(nanoseconds time) {
 void Runner::advance_frames(int frames) {
   if (board_.clock.mode() != ClockMode::manual) return;
   const std::lock_guard lock(run_mutex_);
-  next();  // takes up a change of the standard
+  next();  // applies a change of the standard
   run_until(schedule_.due(field_ + 2 * std::int64_t{frames}));
 }
 
@@ -138,7 +141,7 @@ void Runner::run(const Next &next) {
   try {
     run_event(next.event);
   } catch (const std::bad_alloc &) {
-    // The event's counter has advanced, so the next event follows.
+    // The event's counter has already advanced, so the next event follows.
   }
 }
 

@@ -1,7 +1,7 @@
 /**
  * @file runner.h
- * Makes the card run: calls the picture side for each field and audio block when it is due, composes
- * the preview, hands out paced supplies and watches the watchdog.
+ * Runs the card: calls the engine for each field and audio block when it is due, composes the preview,
+ * queues the frames of supplies with a rate, and checks the watchdog.
  */
 #ifndef VIRTUAL_CARD_RUNNER_H
 #define VIRTUAL_CARD_RUNNER_H
@@ -21,23 +21,23 @@ class Runner {
   Runner(const Runner &) = delete;
   Runner &operator=(const Runner &) = delete;
 
-  /// Starts the card's thread, unless it runs or the clock is manual. What was due before is left out.
-  /// A negated error number when no thread can be created.
+  /// Starts the card's thread, unless it runs or the clock is manual. Skips everything that was due before
+  /// now. Returns 0, or a negated error number when no thread can be created.
   long start();
-  /// Ends and joins the card's thread and those of the engine. Calling it twice is harmless.
+  /// Ends and joins the card's thread and the engine's threads. May be called twice.
   void stop();
-  /// After a power-up of the clock, while stopped: everything is due from card time 0 again.
+  /// Starts again at card time 0. Call it after Clock::power_up(), while the thread is stopped.
   void power_up();
 
-  /// Manual clock only: runs everything that is due in the time, on the caller's thread.
+  /// Manual clock only: runs everything that becomes due in the time, on the caller's thread.
   void advance(nanoseconds time);
   void advance_frames(int frames);
 
  private:
   struct Pace {
     Stream *streams[2];
-    std::int64_t count;  ///< frames that came due since `since`
-    nanoseconds since;   ///< when encoding began
+    std::int64_t count;  ///< frames that became due since `since`
+    nanoseconds since;   ///< start of encoding or of the supply, the later one
   };
   enum class Event { field, audio, video_supply, audio_supply };
   struct Next {
@@ -46,9 +46,9 @@ class Runner {
   };
 
   void loop();
-  /// What is due first.
+  /// Returns the event that is due first.
   Next next();
-  /// Runs one event. On bad_alloc the event is skipped.
+  /// Runs one event. On bad_alloc the rest of the event is skipped.
   void run(const Next &next);
   void run_event(Event event);
   void run_until(nanoseconds time);
@@ -56,20 +56,20 @@ class Runner {
   void run_audio_block();
   void compose(const CardState &state);
   void watch(nanoseconds now);
-  /// The settings now, and the encoding session they belong to.
+  /// Returns a copy of the settings; `session` receives the encoding session they belong to.
   CardState snapshot(u32 *session = nullptr);
   nanoseconds pace_due(Pace &pace, const CardState &state);
-  /// Skips what is long overdue, and counts the frames lost.
+  /// Skips everything that was due before `now` and counts the lost frames.
   void skip_to(nanoseconds now);
 
   Board &board_;
   std::thread thread_;
-  std::mutex run_mutex_;  // guards what follows: the thread and a manual advance() may not mix
+  std::mutex run_mutex_;  // guards the members below; the thread releases it only while it waits
   std::condition_variable signal_;
   std::atomic<bool> ending_{false};  // set without the mutex, which the thread may hold for many fields
   FieldSchedule schedule_;
-  std::int64_t field_ = 0;        // next one
-  std::int64_t audio_block_ = 0;  // next one
+  std::int64_t field_ = 0;        // number of the next field
+  std::int64_t audio_block_ = 0;  // number of the next audio block
   Pace video_pace_{{&board_.mpeg4, &board_.mjpeg}, 0, {}};
   Pace audio_pace_{{&board_.audio, nullptr}, 0, {}};
 };

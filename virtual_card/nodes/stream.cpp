@@ -1,3 +1,4 @@
+// The supply of ready-made frames of a stream.
 #include "stream.h"
 
 namespace virtual_card {

@@ -1,3 +1,7 @@
+/**
+ * @file stream.h
+ * A stream of the card: its queue and its supply of ready-made frames.
+ */
 #ifndef VIRTUAL_CARD_STREAM_H
 #define VIRTUAL_CARD_STREAM_H
 
@@ -7,22 +11,22 @@
 
 namespace virtual_card {
 
-/// One of the card's three streams: the queue behind it, and the supply of ready-made frames that can
-/// take the encoders' place.
+/// One of the card's three streams: its queue, and the supply of ready-made frames that can replace the
+/// encoders.
 class Stream {
  public:
   explicit Stream(std::size_t capacity) : queue(capacity) {}
 
-  /// `rate` frames a second of card time; 0: as fast as they are read.
+  /// Sets the supply: `rate` frames a second of card time; 0: one frame for each read.
   void supply(std::vector<ReadyFrame> frames, double rate, std::uint64_t limit);
   void clear_supply();
-  /// Frames a second of a paced supply, 0 without one.
+  /// Returns frames a second of a supply with a rate, or 0 without such a supply.
   double pace() const;
-  /// A paced supply's next frame has come due.
+  /// Queues the next frame of the supply.
   void supply_due();
 
-  /// Hands the next frame over; its read result, or 0 when none came in the time. A supply
-  /// answers only while `encoding`.
+  /// Calls `place` with the data of the next frame and returns the frame's read result, or returns 0 when
+  /// none came within `wait`. A supply without a rate delivers only while `encoding`.
   template <typename Place>
   long read(bool encoding, std::chrono::microseconds wait, Place place);
 
@@ -31,8 +35,8 @@ class Stream {
  private:
   const ReadyFrame *next_supplied();
 
-  std::atomic<bool> unpaced_{false};  // an unpaced supply answers reads: keeps its lock off other reads
-  mutable std::mutex mutex_;          // guards everything below
+  std::atomic<bool> unpaced_{false};  // there is a supply without a rate; read without the lock
+  mutable std::mutex mutex_;          // guards all members below
   std::vector<ReadyFrame> frames_;
   double rate_ = 0;
   std::size_t next_ = 0;

@@ -1,3 +1,4 @@
+// The test sound of an audio input and its G.726 encoder.
 #include "audio_encoder.h"
 
 #include <algorithm>
@@ -18,7 +19,7 @@ constexpr std::array<unsigned, kAudioInputs> kTones{300, 500, 800, 1200};
 constexpr unsigned kBitRate = 24000;
 constexpr double kLoudness = 9000;
 constexpr unsigned kBeepSamples = kSampleRate * 7 / 10;
-/// A beep swells and fades over this long, so that it does not click.
+/// A beep fades in over this many samples, and out again, so that it does not click.
 constexpr double kFadeSamples = kSampleRate / 50.0;
 
 std::vector<std::int16_t> beep(unsigned frequency) {
@@ -44,7 +45,7 @@ AVCodecContext *open_encoder() {
     avcodec_free_context(&encoder);
     return nullptr;
   }
-  // The codec takes any number of samples; the size it proposes is for files, not for a live card.
+  // The codec accepts any number of samples; its own frame size is meant for files.
   encoder->frame_size = kBlockSamples;
   return encoder;
 }
@@ -55,7 +56,7 @@ unsigned tone_frequency(unsigned input) {
   return kTones[input % kTones.size()];
 }
 
-/// Created on first use: many programs record no audio.
+/// Creates the sound and the encoder on first use: many programs record no audio.
 bool AudioEncoder::start() {
   if (second_.empty()) second_ = beep(tone_frequency(input_));
   if (!encoder_) encoder_.reset(open_encoder());

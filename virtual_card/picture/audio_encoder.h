@@ -1,6 +1,6 @@
 /**
  * @file audio_encoder.h
- * The sound at an audio input and its encoder: 8 kHz mono, G.726 at 24 kbit/s.
+ * The test sound of an audio input and its encoder: 8 kHz mono, G.726 at 24 kbit/s.
  */
 #ifndef VIRTUAL_CARD_AUDIO_ENCODER_H
 #define VIRTUAL_CARD_AUDIO_ENCODER_H
@@ -17,21 +17,21 @@ namespace virtual_card {
 inline constexpr unsigned kSampleRate = 8000;
 inline constexpr unsigned kBlockSamples = 128;
 
-/// The tone of an input, in Hz.
+/// Returns the frequency of an input's test sound, in Hz.
 unsigned tone_frequency(unsigned input);
 
 class AudioEncoder {
  public:
   explicit AudioEncoder(unsigned input) : input_(input) {}
 
-  /// Encodes block number `block` of the input's test sound, a beep a second, or of silence.
+  /// Encodes block number `block`: of the input's test sound, one beep a second, or of silence.
   std::array<u8, driver::kAudioBlockSize> encode(std::int64_t block, bool sound);
 
  private:
   bool start();
 
   unsigned input_;
-  std::vector<std::int16_t> second_;  ///< the sound repeats every second
+  std::vector<std::int16_t> second_;  ///< one second of the test sound, which repeats
   AvPtr<AVCodecContext> encoder_;
   AvPtr<AVFrame> frame_;
   AvPtr<AVPacket> packet_;

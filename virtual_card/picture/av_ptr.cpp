@@ -1,4 +1,4 @@
-// How libav's objects are freed.
+// Frees the objects of libav.
 #include "av_ptr.h"
 
 extern "C" {

@@ -1,6 +1,6 @@
 /**
  * @file av_ptr.h
- * Owning pointers to the objects of libav.
+ * Owning pointers to objects of libav.
  */
 #ifndef VIRTUAL_CARD_AV_PTR_H
 #define VIRTUAL_CARD_AV_PTR_H

@@ -1,3 +1,4 @@
+// Draws the picture of a camera.
 #include "camera.h"
 
 #include <cmath>
@@ -11,7 +12,7 @@ namespace {
 
 constexpr u32 kClockHeight = 40;
 constexpr u32 kClockX = 48;
-constexpr u32 kClockFromBottom = 88;  ///< lines from the clock's top to the picture's end
+constexpr u32 kClockFromBottom = 88;  ///< lines from the top of the clock to the bottom of the picture
 constexpr u32 kBarLines = 64;
 constexpr u32 kPatternSize = 64;
 constexpr u32 kBallSize = 72;
@@ -23,7 +24,7 @@ constexpr Colour kClockBox{40, 128, 128};
 constexpr u8 kMarkBlack = 24;
 constexpr u8 kMarkWhite = 216;
 
-/// 75 % bars: white, yellow, cyan, green, magenta, red, blue, black.
+/// 75 % colour bars: white, yellow, cyan, green, magenta, red, blue, black.
 constexpr std::array<Colour, 8> kBars{{{180, 128, 128},
                                        {162, 44, 142},
                                        {131, 156, 44},
@@ -33,7 +34,7 @@ constexpr std::array<Colour, 8> kBars{{{180, 128, 128},
                                        {35, 212, 114},
                                        {16, 128, 128}}};
 
-/// Neighbouring channels get hues far apart: 7 of 16 steps of the circle.
+/// Returns the hue of a channel. Neighbouring channels differ by 7 of 16 steps of the colour circle.
 double base_hue(unsigned channel) {
   return (channel * 7 % kChannels) * 360.0 / kChannels;
 }
@@ -51,7 +52,8 @@ bool pattern(unsigned channel, u32 x, u32 y) {
   }
 }
 
-/// All cameras share these, made when the first of them draws. The card may draw until the process ends.
+/// Shared by all cameras; created at the first use and never freed, since the card may draw until the process
+/// ends.
 const Font &clock_font() {
   static const Font *const font = new Font(kClockHeight);
   return *font;
@@ -66,7 +68,8 @@ Area clock_area(u32 lines) {
   return {kClockX, y, kClockX + clock_font().text_width("00:00:00.00"), y + kClockHeight};
 }
 
-/// The ball's corner: a slow figure over the whole picture below the bars, each camera at its own pace.
+/// Returns the place of the ball: a slow curve over the whole picture below the bars, at a speed that differs
+/// from camera to camera.
 Area ball_area(unsigned channel, double seconds, u32 width, u32 lines) {
   const double turn = 2.0 * std::numbers::pi * (seconds / (3.5 + 0.1 * channel) + channel / 16.0);
   const double across = (1.0 + std::sin(turn)) / 2.0 * (width - 48 - kBallSize);

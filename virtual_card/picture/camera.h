@@ -1,7 +1,7 @@
 /**
  * @file camera.h
- * What the decoder of one channel delivers: the drawn camera, a film in front of it, or the blue
- * picture of a lost one, with picture properties and privacy mask applied.
+ * The picture that the decoder of one channel delivers: the drawn camera, a film, or blue for lost video,
+ * with picture properties and privacy mask applied.
  */
 #ifndef VIRTUAL_CARD_CAMERA_H
 #define VIRTUAL_CARD_CAMERA_H
@@ -23,10 +23,10 @@ class Camera {
  public:
   explicit Camera(unsigned channel) : channel_(channel) {}
 
-  /// Takes over the settings of the channel. True when they change the picture.
+  /// Takes the settings of the channel. Returns true when they change the picture.
   bool adjust(const CardState &state);
   void show_film(std::shared_ptr<Film> film);
-  /// Draws one field, unless that has been done. The picture is a function of the settings and the field.
+  /// Draws a field, unless it is already drawn. The picture depends only on the settings and the field.
   void draw(const Field &field);
 
   const Picture &picture() const { return picture_; }
@@ -34,7 +34,7 @@ class Camera {
  private:
   static constexpr std::int64_t kNever = INT64_MIN;
 
-  /// Everything the picture depends on besides the time and the film.
+  /// The settings that the picture depends on, without time and film.
   struct Look {
     u32 width = 0;
     u32 lines = 0;
@@ -56,10 +56,10 @@ class Camera {
   PictureControls controls_;
   Colour ball_colour_{};
   bool backdrop_drawn_ = false;
-  Picture backdrop_;  ///< all that stands still, properties and mask applied
+  Picture backdrop_;  ///< everything that does not move, with properties and mask applied
   Picture picture_;
-  std::array<std::int64_t, 2> drawn_{kNever, kNever};  ///< number of the field in the lines of each parity
-  std::array<Area, 2> ball_area_{};                    ///< where the ball was left in each field
+  std::array<std::int64_t, 2> drawn_{kNever, kNever};  ///< by parity: number of the field drawn last
+  std::array<Area, 2> ball_area_{};                    ///< by parity: place of the ball in that field
   std::shared_ptr<Film> film_;
   std::int64_t film_frame_ = -1;
 };

@@ -1,3 +1,4 @@
+// Draws, detects and encodes the fields of a channel.
 #include "channel.h"
 
 #include <algorithm>
@@ -7,7 +8,7 @@ namespace virtual_card {
 
 namespace {
 
-constexpr u32 kOverlayHeight = 20;  ///< lines of a figure in pictures of one field
+constexpr u32 kOverlayHeight = 20;  ///< lines of a digit in pictures of one field
 constexpr std::size_t kMaxMpeg4 =
     std::min<std::size_t>(driver::kMpeg4LengthMask, driver::kMpeg4AreaSize - driver::kMpeg4DescriptorSize);
 constexpr std::size_t kMaxJpeg = driver::kMjpegReadSize - driver::kMjpegDescriptorSize;
@@ -32,7 +33,7 @@ Channel::Work Channel::work(const CardState &state, std::int64_t field) {
 }
 
 void Channel::adjust(const CardState &state) {
-  // A change of the picture's settings is not motion in front of the camera.
+  // A change of the settings changes the picture but is not motion.
   if (camera_.adjust(state)) motion_.forget();
 }
 
@@ -53,7 +54,7 @@ void Channel::process(const CardState &state, const Field &field, const Work &wo
   }
 }
 
-/// The next frame must not reference a dropped one: the encoder starts afresh.
+/// Drops the output and the encoder: the next frame must not reference a dropped frame.
 void Channel::lose_output() {
   mpeg4_.reset();
   output_.mpeg4.bitstream.clear();
@@ -76,7 +77,7 @@ void Channel::encode(const CardState &state, u32 parity, EncodedSize size) {
   output_.mpeg4 = mpeg4_->encode(picture_);
   if (output_.mpeg4.bitstream.empty() || output_.mpeg4.bitstream.size() > kMaxMpeg4) {
     output_.mpeg4.bitstream.clear();
-    mpeg4_.reset();  // the next frame must not reference a dropped one
+    mpeg4_.reset();  // the next frame must not reference a dropped frame
   }
   if (!jpeg_) jpeg_.emplace();
   output_.jpeg = jpeg_->encode(picture_, fine_quality(state.mjpeg_quality));

@@ -1,6 +1,6 @@
 /**
  * @file channel.h
- * One channel from its camera to its encoders.
+ * One channel: camera, motion detector and encoders.
  */
 #ifndef VIRTUAL_CARD_CHANNEL_H
 #define VIRTUAL_CARD_CHANNEL_H
@@ -20,17 +20,18 @@ class Channel {
  public:
   explicit Channel(unsigned number) : number_(number), camera_(number) {}
 
-  /// What a field asks of the channel.
+  /// The work that a field needs on this channel.
   struct Work {
-    std::optional<EncodedSize> size;  ///< a picture of this size is due
-    bool look = false;                ///< for motion
+    std::optional<EncodedSize> size;  ///< size of the picture to encode, if one is due
+    bool look = false;                ///< detect motion
 
     bool any() const { return size.has_value() || look; }
   };
-  /// Also notices what has been switched on or off since the field before.
+  /// Returns the work for a field. Also resets the encoder or the motion detector when encoding or detection
+  /// has been switched off or on since the field before.
   Work work(const CardState &state, std::int64_t field);
   void process(const CardState &state, const Field &field, const Work &work);
-  /// Brings the camera's picture up to date without anything behind it.
+  /// Only draws the field, without detection and encoding.
   void draw(const CardState &state, const Field &field);
 
   struct Output {
@@ -38,7 +39,7 @@ class Channel {
     EncodedSize size{};
     std::vector<u8> jpeg;
   };
-  /// What the last process() has encoded; empty where it could not.
+  /// Returns the output of the last process(); a stream that could not be encoded is empty.
   const Output &output() const { return output_; }
 
   Camera &camera() { return camera_; }

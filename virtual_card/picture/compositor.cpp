@@ -1,3 +1,4 @@
+// Composes the preview picture.
 #include "compositor.h"
 
 #include <algorithm>
@@ -8,14 +9,14 @@ namespace virtual_card {
 
 namespace {
 
-constexpr unsigned kOne = 256;  ///< a whole sample in the weights of blends
+constexpr unsigned kOne = 256;  ///< 1.0 in the fixed-point weights of blends
 
 std::uint64_t size_of(const ZV_DISPLAY_WINDOW &window) {
   return std::uint64_t{window.x_end - window.x_start} * (window.y_end - window.y_start);
 }
 
-/// The order of drawing: marked windows lie on top of the others, small ones on large ones. (A small picture
-/// may have lost its mark and stay on the screen.)
+/// Returns whether window `a` is drawn before window `b`: windows without ZV_WINDOW_PIP first, then large
+/// before small, so that a picture-in-picture window whose flag was cleared stays visible.
 bool below(const ZV_DISPLAY_WINDOW *a, const ZV_DISPLAY_WINDOW *b) {
   const auto mark = [](const ZV_DISPLAY_WINDOW *window) { return window->flags & ZV_WINDOW_PIP; };
   return mark(a) != mark(b) ? mark(a) < mark(b) : size_of(*a) > size_of(*b);
@@ -35,7 +36,7 @@ std::vector<View> views(const CardState &state) {
     const Area area =
         clip({window->x_start, window->y_start, window->x_end, window->y_end}, state.width, state.lines());
     if (area.empty()) continue;
-    // A window that is switched off is black, also where it covers another.
+    // A disabled window is black, also where it covers another window.
     const bool on = (window->flags & ZV_WINDOW_ENABLED) != 0;
     const auto number = static_cast<std::size_t>(window - display.layout.window.data());
     result.push_back({on ? display.routing[number] % kChannels : kChannels, area,
@@ -85,7 +86,7 @@ const u8 *Compositor::PlaneScaler::row(const u8 *first, const u8 *second, unsign
 void Compositor::paint(const View &view, const Picture &picture) {
   const u32 width = view.area.x_end - view.area.x_start;
   const u32 lines = view.area.y_end - view.area.y_start;
-  // The first pass above a size of one field takes the top field alone.
+  // A window with both fields uses all lines, any other only the lines of the top field.
   const u32 step = view.both_fields ? 1 : 2;
   const u32 source_lines = picture.lines / step;
   luma_.prepare(picture.width, width);
@@ -95,7 +96,7 @@ void Compositor::paint(const View &view, const Picture &picture) {
     const u32 at = line * source_lines * kOne / lines;
     const u32 first = at / kOne * step;
     const u32 second = std::min(at / kOne + 1, source_lines - 1) * step;
-    // Where two source lines or more share an output line, both count alike.
+    // When scaling down to half or less, mix two lines in equal parts.
     const unsigned weight = source_lines >= 2 * lines ? kOne / 2 : at % kOne;
     const u8 *const y = luma_.row(picture.y_line(first), picture.y_line(second), weight);
     const u8 *const cb = cb_.row(picture.cb_line(first), picture.cb_line(second), weight);

@@ -16,20 +16,20 @@
 
 namespace virtual_card {
 
-/// A window that shows a channel.
+/// A window of the preview: its channel (kChannels: black) and its area.
 struct View {
   unsigned channel;
   Area area;
-  bool both_fields;  ///< so large that one field has too few lines for it
+  bool both_fields;  ///< the window has more lines than one field
 };
 
-/// The windows that show something, in the order they are painted.
+/// Returns the visible windows in the order of painting.
 std::vector<View> views(const CardState &state);
 
-/// What a view is painted from.
+/// The data of a channel that its views are painted from.
 struct ViewSource {
   const Picture *picture = nullptr;
-  const MovedBlocks *marks = nullptr;  ///< null: no motion marks
+  const MovedBlocks *marks = nullptr;  ///< blocks to outline; null: no motion marks
 };
 
 class Compositor {
@@ -42,7 +42,7 @@ class Compositor {
   class PlaneScaler {
    public:
     void prepare(u32 in_width, u32 out_width);
-    /// One output row out of two input rows.
+    /// Returns one output row, mixed from two input rows. `weight` is that of `second`, in 256ths.
     const u8 *row(const u8 *first, const u8 *second, unsigned weight);
 
    private:

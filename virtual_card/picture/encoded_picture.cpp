@@ -1,3 +1,4 @@
+// Chooses the fields to encode and scales them to the encoded size.
 #include "encoded_picture.h"
 
 #include <array>
@@ -20,14 +21,14 @@ u32 period(u32 code) {
   return (code & driver::kIntervalSkipMask) + 1;
 }
 
-/// Fields from one kept field to the next. Code 0 keeps both fields; a host that wants one field of every nth
-/// frame sends code n, so that all rates but the first are whole frames apart and of one parity.
+/// Returns the distance in fields between two encoded fields in keep mode. Code 0 encodes every field, code n
+/// one field of every n-th frame.
 std::int64_t kept_field(u32 code) {
   const std::int64_t skipped = code & driver::kIntervalSkipMask;
   return skipped == 0 ? 1 : 2 * skipped;
 }
 
-/// A row at the encoded width. The narrow pictures are half of the middle 704 pixels, whatever the input.
+/// Scales a row to the encoded width. A CIF row is made from the middle 704 pixels of both input widths.
 void fit_row(const u8 *in, u32 in_width, u8 *out, u32 out_width) {
   if (in_width == out_width) {
     std::memcpy(out, in, out_width);
@@ -78,7 +79,7 @@ void scale_picture(const Picture &from, u32 parity, EncodedSize size, EncodedPic
     const u32 source = size.interlaced ? line : 2 * line + parity;
     fit_row(from.y_line(source), from.width, to.y.data() + std::size_t{line} * size.width, size.width);
   }
-  // A chroma line of the 4:2:0 picture is the mean of two lines of one field.
+  // A chroma line of the 4:2:0 picture is the mean of two lines of the same field.
   std::array<u8, kCifWidth * 2> mean;
   for (u32 line = 0; line < size.height / 2; ++line) {
     const u32 field = size.interlaced ? line % 2 : parity;

@@ -1,6 +1,6 @@
 /**
  * @file encoded_picture.h
- * The encoder's side of a picture: which fields it takes, at what size, in 4:2:0.
+ * The picture that goes into the encoders: its fields, its size, and its samples in 4:2:0.
  */
 #ifndef VIRTUAL_CARD_ENCODED_PICTURE_H
 #define VIRTUAL_CARD_ENCODED_PICTURE_H
@@ -23,16 +23,18 @@ struct EncodedSize {
   bool operator==(const EncodedSize &) const = default;
 };
 
-/// Size of a channel's encoded picture; none when its scale code stands for no encoding.
+/// Returns the size of a channel's encoded picture; none when its scale code means no encoding.
 std::optional<EncodedSize> encoded_size(u32 scale_code, u32 input_width, u32 input_lines);
 
-/// Whether a picture is encoded when this field has come. Pictures of one field skip fields in keep
-/// mode and frames in drop mode; interlaced pictures skip frames, and are whole with the bottom field.
+/// Returns whether a picture is encoded after this field; picture_rate() lists the rates. A one-field picture
+/// in drop mode is a top field. An interlaced picture is encoded after its bottom field.
 bool picture_due(u32 interval_code, bool interlaced, std::int64_t field);
-/// Pictures a second of an interval code.
+/// Returns pictures a second of an interval code. Keep mode, one-field pictures: code 0 encodes every field,
+/// code n one field of every n-th frame. Keep mode, interlaced: one picture every code + 1 frames. Drop mode:
+/// all frames but one of every skip + 1.
 double picture_rate(u32 interval_code, bool interlaced, u32 standard);
 
-/// A 4:2:0 picture without padding.
+/// A 4:2:0 picture without padding between rows.
 struct EncodedPicture {
   EncodedSize size{};
   std::vector<u8> y;
@@ -40,9 +42,9 @@ struct EncodedPicture {
   std::vector<u8> cr;
 };
 
-/// Scales the field of this parity, or both when the size is interlaced.
+/// Scales the field of this parity, or both fields when the size is interlaced.
 void scale_picture(const Picture &from, u32 parity, EncodedSize size, EncodedPicture &to);
-/// Burns the channel's number into the top left corner.
+/// Draws the channel number into the top left corner.
 void burn_number(EncodedPicture &picture, unsigned channel, const Font &font);
 
 }  // namespace virtual_card

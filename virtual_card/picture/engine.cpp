@@ -1,3 +1,4 @@
+// Runs the channels, the audio inputs and the compositor for each field.
 #include "engine.h"
 
 #include <algorithm>
@@ -48,7 +49,7 @@ struct Engine::Parts {
   Field last;
   std::atomic<u32> motion{0};  ///< channel bits, written by field()
 
-  std::mutex films_mutex;  ///< guards the films on their way to their cameras
+  std::mutex films_mutex;  ///< guards new_films
   std::array<std::optional<std::shared_ptr<Film>>, kChannels> new_films;
 };
 
@@ -97,7 +98,7 @@ void Engine::field(const CardState &state, const Field &field) {
       parts.channels[busy[job]]->process(state, field, work[busy[job]]);
     });
   }
-  // Always in the order of the channels, whichever was ready first.
+  // Queue in the order of the channels, in whatever order they became ready.
   for (const unsigned channel : busy) {
     if (work[channel].size) parts.queue_output(channel, field.wall_time);
   }
@@ -131,7 +132,7 @@ void Engine::compose(const CardState &state, std::span<u8> uyvy) {
     if (view.both_fields) both_fields |= 1u << view.channel;
   }
 
-  // Small windows show the newest top field, large ones the newest whole frame.
+  // Small windows show the newest top field, large ones the newest complete frame.
   const Field &last = parts.last;
   const bool whole = last.parity() != 0;
   const Field top = whole ? last.before() : last;

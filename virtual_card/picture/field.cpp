@@ -1,4 +1,4 @@
-// A field's neighbour and its time of day.
+// The field before a field, and the clock text of a field.
 #include "field.h"
 
 #include <ctime>
@@ -18,7 +18,7 @@ Field Field::before() const {
 }
 
 ClockText::ClockText(const Field &field) {
-  // A bottom field shows the time of its frame, so that a whole frame shows whole figures.
+  // A bottom field shows the time of its top field, so that both fields of a frame have the same digits.
   const auto time = field.parity() != 0 ? field.before().wall_time : field.wall_time;
   const auto second = std::chrono::floor<std::chrono::seconds>(time);
   const auto frame = (time - second).count() * video_standard(field.standard).nominal_frames / 1'000'000;

@@ -1,3 +1,4 @@
+// Reads a video file and loops it.
 #include "film.h"
 
 #include <algorithm>
@@ -16,10 +17,11 @@ namespace virtual_card {
 namespace {
 
 constexpr double kDefaultFrameTime = 1.0 / 25.0;
-/// A film further behind than this jumps to a key frame instead of decoding all in between.
+/// If a film is further behind than this, it jumps to a key frame instead of decoding all frames between.
 constexpr double kJumpSeconds = 2.0;
 
-/// Formats that only say by their name that they use the full range, and those the scaler wants instead.
+/// Pixel formats whose name alone says that they use the full range, and the formats that the scaler takes in
+/// their place.
 constexpr std::array<std::pair<AVPixelFormat, AVPixelFormat>, 4> kFullRange{
     {{AV_PIX_FMT_YUVJ420P, AV_PIX_FMT_YUV420P},
      {AV_PIX_FMT_YUVJ422P, AV_PIX_FMT_YUV422P},
@@ -86,7 +88,7 @@ bool Film::decode_next() {
       avcodec_send_packet(decoder_.get(), nullptr);
       continue;
     }
-    // A damaged packet costs its picture, not the film.
+    // Ignore errors: a damaged packet loses its picture, and the film goes on.
     if (packet_->stream_index == stream_) avcodec_send_packet(decoder_.get(), packet_.get());
     av_packet_unref(packet_.get());
   }
@@ -119,7 +121,7 @@ bool Film::advance() {
     if (next_time_ <= shown_time_) next_time_ = shown_time_ + frame_time_;
     return true;
   }
-  // The end: the first frame comes after the last one has been seen for its time.
+  // The end of the file: the first frame follows when the last frame has had its time.
   const double end = shown_time_ + frame_time_;
   round_length_ = end - loop_start_;
   loop_start_ = end;
@@ -128,7 +130,7 @@ bool Film::advance() {
   return true;
 }
 
-/// Jumps as near as key frames allow; what is left is decoded frame by frame.
+/// Jumps to the key frame at or before a time. The frames from there are decoded one by one.
 void Film::skip_to(double film_seconds) {
   if (round_length_ > 0)
     loop_start_ += std::floor((film_seconds - loop_start_) / round_length_) * round_length_;
@@ -145,7 +147,7 @@ std::int64_t Film::seek(double card_seconds) {
     started_ = true;
     origin_ = card_seconds;
   }
-  // Half a microsecond makes up for the rounding of times that ought to be equal.
+  // Add half a microsecond, since times that should be equal may differ by rounding.
   const double film_seconds = card_seconds - origin_ + 5e-7;
   if (film_seconds - next_time_ > kJumpSeconds && !broken_) skip_to(film_seconds);
   while (!broken_ && next_time_ <= film_seconds) broken_ = !advance();

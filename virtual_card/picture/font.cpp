@@ -1,3 +1,4 @@
+// Draws digits from bitmaps.
 #include "font.h"
 
 #include <algorithm>
@@ -13,7 +14,7 @@ constexpr u32 kColumns = 7;
 constexpr u32 kRows = 10;
 constexpr std::string_view kCharacters = "0123456789:.";
 
-/// A row a number, the leftmost pixel in bit 6.
+/// By character: one number for each row, with the leftmost pixel in bit 6.
 constexpr std::array<std::array<u8, kRows>, kCharacters.size()> kBitmaps{{
     {0x1C, 0x3E, 0x63, 0x63, 0x63, 0x63, 0x63, 0x63, 0x3E, 0x1C},
     {0x0C, 0x1C, 0x3C, 0x6C, 0x0C, 0x0C, 0x0C, 0x0C, 0x3F, 0x3F},
@@ -39,7 +40,7 @@ double bit_at(std::size_t index, int column, int row) {
   return (kBitmaps[index][static_cast<u32>(row)] >> (kColumns - 1 - static_cast<u32>(column))) & 1;
 }
 
-/// The bitmap between its pixels, so that its steps become curves when it is drawn large.
+/// Returns the bitmap at a point, interpolated between its pixels: large characters get round corners.
 double sample(std::size_t index, double x, double y) {
   const double column = std::floor(x - 0.5), row = std::floor(y - 0.5);
   const double fx = x - 0.5 - column, fy = y - 0.5 - row;

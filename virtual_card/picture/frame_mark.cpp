@@ -1,3 +1,4 @@
+// Draws and reads the frame mark.
 #include "frame_mark.h"
 
 #include <array>
@@ -9,9 +10,10 @@ namespace virtual_card {
 
 namespace {
 
-// Blocks from the left: two of the backdrop, white black white black, channel (4), frame number (24),
-// check (7), bottom field, two of the backdrop. The field stands outside the check, so that the two
-// fields of a frame differ in one block only and a full-height picture can be read as one.
+// Blocks from the left: a margin of 2, the sync pattern white black white black, channel (4 bits), frame
+// number (24 bits), check (7 bits), bottom field (1 bit), a margin of 2. The check does not cover the
+// bottom-field bit, so the two fields of a frame differ in one block only and a full-height picture has one
+// readable mark.
 constexpr u32 kBlockWidth = 16;
 constexpr u32 kMargin = 2;
 constexpr u32 kSync = 4;
@@ -19,11 +21,11 @@ constexpr u32 kChannelBits = 4;
 constexpr u32 kFrameBits = 24;
 constexpr u32 kCheckBits = 7;
 constexpr u32 kBlocks = kSync + kChannelBits + kFrameBits + kCheckBits + 1;
-constexpr u32 kHeight = 16;      ///< lines of the full picture
-constexpr u32 kFromBottom = 32;  ///< lines from the mark's top to the picture's end
+constexpr u32 kHeight = 16;      ///< lines of the mark in a full-height picture
+constexpr u32 kFromBottom = 32;  ///< lines from the top of the mark to the bottom of the picture
 constexpr std::uint64_t kSyncPattern = 0b1010;
 constexpr std::uint32_t kFrameMask = (1u << kFrameBits) - 1;
-/// Below this step between the sync blocks there is no mark, or none that can be trusted.
+/// With less contrast between the sync blocks, there is no mark or it cannot be trusted.
 constexpr int kMinContrast = 24;
 
 u32 check(std::uint64_t payload) {
@@ -63,14 +65,14 @@ void draw_frame_mark(Picture &picture, const FrameMark &mark, u8 black, u8 white
 std::optional<FrameMark> read_frame_mark(const u8 *luma, std::size_t stride, u32 width, u32 height) {
   const bool both_fields = height > 288;
   const u32 vertical = both_fields ? 1 : 2;
-  // The wide inputs carry a few pixels more on each side than the scaled pictures.
+  // Pictures 720 pixels wide have 8 pixels on each side that the scaled pictures do not have.
   const u32 margin = width == kMaxWidth ? (kMaxWidth - kNarrowWidth) / 2 : 0;
   const u32 block_width = (width - 2 * margin) * kBlockWidth / kNarrowWidth;
   if (block_width < 4 || height < kFromBottom) return std::nullopt;
 
   const u32 top = height - kFromBottom / vertical;
   const auto level = [&](u32 block) {
-    // The middle of the block: half its width, and a few lines of the top field.
+    // Sum the middle of the block: half of its width, and a few lines of the top field.
     const u32 x = margin + (kMargin + block) * block_width + block_width / 4;
     int sum = 0;
     for (u32 line = (top + kHeight / vertical / 4) & ~1u; line < top + kHeight / vertical * 3 / 4;

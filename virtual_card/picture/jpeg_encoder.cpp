@@ -1,3 +1,4 @@
+// Encodes Motion-JPEG pictures with libjpeg.
 #include "jpeg_encoder.h"
 
 #include <algorithm>
@@ -11,9 +12,9 @@ namespace virtual_card {
 
 namespace {
 
-/// The tables of the host's header are those of this quality.
+/// The quality whose tables are those of the host's header.
 constexpr int kQuality = 25;
-/// Sum of horizontal and vertical frequency from which a coarse picture has nothing.
+/// A coarse picture has only coefficients whose sum of horizontal and vertical frequency is below this.
 constexpr int kCoarseFrequencies = 4;
 constexpr u32 kStripLines = 2 * DCTSIZE;
 
@@ -24,7 +25,7 @@ struct Failure {};
 }
 void say_nothing(j_common_ptr) {}
 
-/// Where the library puts its bytes.
+/// The destination of the library's output.
 struct Sink : jpeg_destination_mgr {
   std::vector<u8> bytes;
   std::size_t used = 0;
@@ -46,7 +47,7 @@ struct Sink : jpeg_destination_mgr {
   }
 };
 
-/// Where the scan data begin: behind the SOS segment.
+/// Returns the offset of the scan data, behind the SOS segment.
 std::size_t scan_start(const std::vector<u8> &bytes, std::size_t size) {
   std::size_t at = 2;
   while (at + 4 <= size && bytes[at] == 0xFF) {
@@ -57,7 +58,7 @@ std::size_t scan_start(const std::vector<u8> &bytes, std::size_t size) {
   return size;
 }
 
-/// Takes the fine detail out of an 8 x 8 block of coefficients.
+/// Removes the fine detail from an 8 x 8 block of coefficients.
 void coarsen(JCOEF *block) {
   for (int v = 0; v < DCTSIZE; ++v) {
     for (int u = std::max(0, kCoarseFrequencies - v); u < DCTSIZE; ++u) block[v * DCTSIZE + u] = 0;
@@ -106,7 +107,7 @@ struct JpegEncoder::Compressor {
     jpeg_finish_compress(&jpeg);
   }
 
-  /// Writes the picture just made once more, with fewer coefficients and the same tables.
+  /// Encodes the last picture again, with fewer coefficients and the same tables.
   void coarsen_result() {
     fine_bytes.swap(sink.bytes);
     jpeg_mem_src(&fine_jpeg, fine_bytes.data(), sink.used);
@@ -132,7 +133,7 @@ struct JpegEncoder::Compressor {
     std::array<JSAMPROW, DCTSIZE> cb, cr;
     const std::size_t width = picture.size.width;
     const std::size_t first = jpeg.next_scanline;
-    // The library only reads the rows.
+    // The library does not write into the rows, although its type is not const.
     for (std::size_t i = 0; i < y.size(); ++i)
       y[i] = const_cast<u8 *>(picture.y.data()) + (first + i) * width;
     for (std::size_t i = 0; i < cb.size(); ++i) {

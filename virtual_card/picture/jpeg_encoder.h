@@ -1,7 +1,6 @@
 /**
  * @file jpeg_encoder.h
- * Baseline JPEG without its headers, which the host puts in front: quality 25, 4:2:0, default
- * Huffman tables.
+ * Encodes baseline JPEG without the headers, which the host adds: quality 25, 4:2:0, default Huffman tables.
  */
 #ifndef VIRTUAL_CARD_JPEG_ENCODER_H
 #define VIRTUAL_CARD_JPEG_ENCODER_H
@@ -18,8 +17,8 @@ class JpegEncoder {
   JpegEncoder();
   ~JpegEncoder();
 
-  /// The entropy-coded scan and its EOI; empty when encoding failed. The tables being fixed, `fine`
-  /// false saves bytes by leaving fine detail out.
+  /// Returns the scan data with their EOI marker; empty when encoding fails. The tables are fixed, so `fine`
+  /// false saves bytes by leaving out fine detail.
   std::vector<u8> encode(const EncodedPicture &picture, bool fine);
 
  private:
@@ -27,7 +26,7 @@ class JpegEncoder {
   std::unique_ptr<Compressor> compressor_;
 };
 
-/// Whether the quality register asks for all detail.
+/// Returns whether the quality register asks for all detail.
 bool fine_quality(u32 quality_word);
 
 }  // namespace virtual_card

@@ -1,3 +1,4 @@
+// Compares top fields block by block.
 #include "motion_detector.h"
 
 #include <algorithm>
@@ -10,7 +11,7 @@ namespace virtual_card {
 namespace {
 
 constexpr std::int64_t kFramesPerLook = 3;
-/// 300 ms of NTSC fields: an object that moves steadily is reported without gaps.
+/// 300 ms of NTSC fields, so that steady motion is reported without gaps.
 constexpr std::int64_t kHoldFields = 18;
 constexpr u32 kBlockLines = driver::kMotionBlock / 2;  ///< lines of a block in one field
 constexpr u32 kBlockSamples = driver::kMotionBlock * kBlockLines;

@@ -1,3 +1,4 @@
+// Encodes MPEG-4 frames with libavcodec.
 #include "mpeg4_encoder.h"
 
 #include <algorithm>
@@ -20,7 +21,7 @@ constexpr u32 kMaxGop = 600;
 constexpr u32 kMinBitRate = 16000;
 constexpr u32 kMaxBitRate = 50000000;
 
-/// The host's header promises this clock, for PAL too; timestamps count encoded pictures.
+/// The time base in the host's header, also for PAL. Timestamps count encoded pictures.
 constexpr AVRational kTimeBase{1001, 30000};
 
 struct Option {
@@ -28,9 +29,9 @@ struct Option {
   std::int64_t value;
 };
 constexpr std::array<Option, 3> kOptions{{
-    {"mpeg_quant", 1},             // the host's header says so
-    {"motion_est", 1},             // no search: the scenes hardly move, sixteen encoders share the machine
-    {"sc_threshold", 1000000000},  // intra frames where the GOP says, at no cut
+    {"mpeg_quant", 1},             // as in the host's header
+    {"motion_est", 1},             // no motion search: it costs too much time for sixteen encoders
+    {"sc_threshold", 1000000000},  // intra frames only by GOP, not at scene cuts
 }};
 
 AVCodecContext *open_encoder(const Mpeg4Settings &settings) {
@@ -52,7 +53,7 @@ AVCodecContext *open_encoder(const Mpeg4Settings &settings) {
     encoder->flags |= AV_CODEC_FLAG_QSCALE;
     encoder->global_quality = static_cast<int>(settings.quantiser) * FF_QP2LAMBDA;
   } else {
-    // The encoder reckons with 30000/1001 pictures a second.
+    // The encoder calculates with 30000/1001 pictures a second.
     const double bits = settings.bit_rate / (settings.rate * av_q2d(kTimeBase));
     encoder->bit_rate = std::llround(bits);
     encoder->bit_rate_tolerance = static_cast<int>(bits);
@@ -69,11 +70,11 @@ std::int64_t whole_seconds(std::int64_t picture) {
 }
 
 constexpr std::array<u8, 4> kPictureStart{0, 0, 1, 0xB6};
-/// The bit behind start code and type of a picture, where a set bit stands for each second begun.
+/// Offset in bits of modulo_time_base, behind start code and picture type: one 1 bit for each second begun.
 constexpr std::size_t kSecondsBit = 34;
 
-/// Says in the header of a picture that a second has begun. The bits behind it move on by one, and
-/// so does the stuffing at the end: a zero and ones to the next whole byte.
+/// Inserts a 1 bit into modulo_time_base in the header of a picture: a second has begun. The bits behind it
+/// move on by one, and the stuffing at the end is written again: a 0 bit, then 1 bits to the end of the byte.
 void begin_second(std::vector<u8> &bits) {
   const std::size_t stuffing = static_cast<std::size_t>(std::countr_one(bits.back())) + 1;
   const std::size_t used = bits.size() * 8 - stuffing;
@@ -85,7 +86,7 @@ void begin_second(std::vector<u8> &bits) {
   u8 &byte = bits[kSecondsBit / 8];
   byte = static_cast<u8>((byte & ~behind) | (byte & behind) >> 1 | (behind + 1) >> 1);
   bits.resize((used + 1) / 8 + 1);
-  const unsigned last = (used + 1) % 8;  // bits of the last byte that belong to the picture
+  const unsigned last = (used + 1) % 8;  // bits of the picture in the last byte
   bits.back() = static_cast<u8>((bits.back() & ~(0xFF >> last)) | 0x7F >> last);
 }
 
@@ -125,7 +126,7 @@ Mpeg4Frame Mpeg4Encoder::encode(const EncodedPicture &picture) {
   frame.quality = encoder_->global_quality;
   const std::array<const u8 *, 3> planes{picture.y.data(), picture.cb.data(), picture.cr.data()};
   for (std::size_t i = 0; i < planes.size(); ++i) {
-    frame.data[i] = const_cast<u8 *>(planes[i]);  // read only: the encoder copies it
+    frame.data[i] = const_cast<u8 *>(planes[i]);  // the encoder only reads it
     frame.linesize[i] = i == 0 ? frame.width : frame.width / 2;
   }
   if (avcodec_send_frame(encoder_.get(), &frame) < 0) return result;
@@ -135,7 +136,8 @@ Mpeg4Frame Mpeg4Encoder::encode(const EncodedPicture &picture) {
   const u8 *const begin = packet_->data;
   result.bitstream.assign(std::search(begin, end, kPictureStart.begin(), kPictureStart.end()), end);
   av_packet_unref(packet_.get());
-  // The encoder puts the time of an intra frame into a header in front of it, which has just gone.
+  // The encoder puts the time of an intra frame into a header in front of the picture, which was removed
+  // above.
   const bool second_begun = count_ > 0 && whole_seconds(count_) != whole_seconds(count_ - 1);
   if (result.intra && second_begun && !result.bitstream.empty()) begin_second(result.bitstream);
   ++count_;

@@ -1,7 +1,7 @@
 /**
  * @file mpeg4_encoder.h
- * One channel's MPEG-4 encoder. Its frames decode behind the header the host keeps, so they carry
- * none of their own.
+ * The MPEG-4 encoder of one channel. Its frames have no header of their own: they decode behind the host's
+ * header.
  */
 #ifndef VIRTUAL_CARD_MPEG4_ENCODER_H
 #define VIRTUAL_CARD_MPEG4_ENCODER_H
@@ -17,8 +17,8 @@ namespace virtual_card {
 struct Mpeg4Settings {
   EncodedSize size{};
   u32 gop = 1;        ///< frames from one intra frame to the next
-  u32 quantiser = 1;  ///< 1 to 31; used when there is no bit rate
-  u32 bit_rate = 0;   ///< bits a second, 0: fixed quantiser
+  u32 quantiser = 1;  ///< 1 to 31; used when bit_rate is 0
+  u32 bit_rate = 0;   ///< bits a second; 0: fixed quantiser
   u32 min_quantiser = 1;
   u32 max_quantiser = 31;
   double rate = 30;  ///< pictures a second
@@ -26,12 +26,12 @@ struct Mpeg4Settings {
   bool operator==(const Mpeg4Settings &) const = default;
 };
 
-/// What the registers of a channel ask for, with numbers the encoder cannot take brought into range.
+/// Converts the settings of a channel; clamps values that the encoder cannot take.
 Mpeg4Settings mpeg4_settings(const EncoderSettings &encoder, EncodedSize size, double rate);
 
 struct Mpeg4Frame {
   bool intra = false;
-  std::vector<u8> bitstream;  ///< begins with the start code of the picture; empty: encoding failed
+  std::vector<u8> bitstream;  ///< begins with the start code of the picture; empty when encoding failed
 };
 
 class Mpeg4Encoder {
@@ -39,7 +39,7 @@ class Mpeg4Encoder {
   explicit Mpeg4Encoder(const Mpeg4Settings &settings);
 
   const Mpeg4Settings &settings() const { return settings_; }
-  /// The first frame is an intra frame.
+  /// Encodes a picture. The first frame is an intra frame.
   Mpeg4Frame encode(const EncodedPicture &picture);
 
  private:

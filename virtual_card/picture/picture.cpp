@@ -1,3 +1,4 @@
+// Planar pictures and the drawing functions.
 #include "picture.h"
 
 #include <algorithm>

@@ -1,7 +1,6 @@
 /**
  * @file picture.h
- * A planar 4:2:2 picture of a camera, its fields interleaved line by line, and the few ways the card
- * paints into it.
+ * A planar 4:2:2 picture with its fields interleaved line by line, and functions that draw into it.
  */
 #ifndef VIRTUAL_CARD_PICTURE_H
 #define VIRTUAL_CARD_PICTURE_H
@@ -24,10 +23,10 @@ inline constexpr Colour kWhite{235, 128, 128};
 inline constexpr Colour kMaskGrey{80, 128, 128};
 inline constexpr Colour kLostBlue{41, 240, 110};
 
-/// A colour from hue in degrees, saturation and value from 0 to 1.
+/// Converts a colour: hue in degrees, saturation and value from 0 to 1.
 Colour colour_from_hsv(double hue, double saturation, double value);
 
-/// Pixels and lines of a picture; the end edges are exclusive.
+/// An area of a picture in pixels and lines; the end edges are exclusive.
 struct Area {
   u32 x_start = 0;
   u32 y_start = 0;
@@ -38,7 +37,7 @@ struct Area {
   bool operator==(const Area &) const = default;
 };
 
-/// The lines of a picture that are painted: all, or those of one field.
+/// The lines to paint: all lines, or the lines of one field.
 struct Lines {
   u32 first;
   u32 step;
@@ -46,7 +45,7 @@ struct Lines {
   u32 at_or_after(u32 line) const { return step == 1 || line % 2 == first ? line : line + 1; }
 };
 inline constexpr Lines kAllLines{0, 1};
-/// Lines of the field with this parity, 0 the top field.
+/// Returns the lines of the field with this parity; 0 is the top field.
 constexpr Lines field_lines(u32 parity) {
   return {parity, 2};
 }
@@ -67,21 +66,22 @@ struct Picture {
   const u8 *cr_line(u32 line) const { return cr.data() + std::size_t{line} * (width / 2); }
 };
 
-/// The part of an area that lies inside a picture of this size, x edges moved out to whole chroma pixels.
+/// Returns the part of an area inside a picture of this size, with the x edges moved out to whole chroma
+/// pixels.
 Area clip(Area area, u32 width, u32 lines);
 
 void fill(Picture &picture, Area area, Colour colour, Lines lines = kAllLines);
 /// Copies an area from a picture of the same size.
 void copy_area(Picture &to, const Picture &from, Area area, Lines lines = kAllLines);
 
-/// Shapes as coverage, 0 to 255 a pixel.
+/// A shape as coverage of each pixel, 0 to 255.
 struct Coverage {
   u32 width = 0;
   u32 lines = 0;
   std::vector<u8> alpha;
 };
 Coverage disc(u32 diameter);
-/// Paints a shape in one colour with its top left corner at an even x; what lies outside is left out.
+/// Paints a shape in one colour with its top left corner at (x, y); x must be even. Clips it to the picture.
 void blend(Picture &picture, const Coverage &shape, u32 x, u32 y, Colour colour, Lines lines = kAllLines);
 
 }  // namespace virtual_card

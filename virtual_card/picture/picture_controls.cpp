@@ -1,3 +1,4 @@
+// Applies picture properties to colours and pictures.
 #include "picture_controls.h"
 
 #include <algorithm>
@@ -12,7 +13,7 @@ namespace {
 
 constexpr double kNeutral = 128.0;
 constexpr double kMidLuma = 126.0;
-/// Luma steps of a full brightness setting: a quarter of the range from black to white.
+/// Change of luma at full brightness: a quarter of the range from black to white.
 constexpr double kBrightnessSpan = 0.25 * (235 - 16);
 
 }  // namespace

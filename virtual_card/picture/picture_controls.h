@@ -1,6 +1,6 @@
 /**
  * @file picture_controls.h
- * Hue, saturation, contrast and brightness of a decoder, as its registers ask for them.
+ * Hue, saturation, contrast and brightness of a decoder, from its registers.
  */
 #ifndef VIRTUAL_CARD_PICTURE_CONTROLS_H
 #define VIRTUAL_CARD_PICTURE_CONTROLS_H

@@ -1,3 +1,4 @@
+// The inner loops over rows of samples.
 #include "pixel_ops.h"
 
 #include <algorithm>

@@ -1,3 +1,4 @@
+// Draws lines and boxes on the preview picture.
 #include "screen.h"
 
 #include <algorithm>
@@ -45,7 +46,7 @@ void draw_motion_marks(const Screen &screen, Area area, const MovedBlocks &block
   for (u32 row = 0; row < blocks.rows; ++row) {
     for (u32 column = 0; column < blocks.columns; ++column) {
       if (!blocks.at(column, row)) continue;
-      // Neighbours share one outline: an edge is drawn only where the motion ends.
+      // Draw an edge only towards a block without motion: neighbouring blocks share one outline.
       const u32 left = x_of(column), right = x_of(column + 1), top = y_of(row), bottom = y_of(row + 1);
       if (column == 0 || !blocks.at(column - 1, row)) screen.fill({left, top, left + 2, bottom}, kMarkColour);
       if (!blocks.at(column + 1, row)) screen.fill({right - 2, top, right, bottom}, kMarkColour);
@@ -56,8 +57,8 @@ void draw_motion_marks(const Screen &screen, Area area, const MovedBlocks &block
 }
 
 void draw_grid(const Screen &screen, const driver::Grid &grid) {
-  // A border is shared by the cells on both sides, so each cell draws its own left and top one, and
-  // the far one belongs to whatever lies there.
+  // Neighbouring cells share a border: the right and bottom borders of a cell start on its end edges, where
+  // the next cells have their left and top borders.
   for (u32 row = 0; row < kGridSide; ++row) {
     for (u32 column = 0; column < kGridSide; ++column) {
       if (((grid.cells >> (row * kGridSide + column)) & 1) == 0) continue;
@@ -74,7 +75,8 @@ void draw_grid(const Screen &screen, const driver::Grid &grid) {
 
 void draw_frame(const Screen &screen, const driver::FrameRect &frame) {
   if (frame.enable == 0) return;
-  // The screen's own rectangle names its last border lines; a window's one its exclusive edges.
+  // The end edges of the screen frame are the start of its last border, those of a window frame are
+  // exclusive.
   const u32 beyond = frame.number == driver::kScreenFrame ? kThick : 0;
   const u32 right = std::min(frame.x_end, screen.width), bottom = std::min(frame.y_end, screen.lines);
   screen.outline({frame.x_start, frame.y_start, right + beyond, bottom + beyond}, kFrameColour);

@@ -1,6 +1,6 @@
 /**
  * @file screen.h
- * What is painted over the preview picture: lines and boxes on packed 4:2:2.
+ * Draws over the preview picture: motion marks, grid, frames and zoom, on packed UYVY.
  */
 #ifndef VIRTUAL_CARD_SCREEN_H
 #define VIRTUAL_CARD_SCREEN_H
@@ -13,7 +13,7 @@
 
 namespace virtual_card {
 
-/// A UYVY picture somebody else owns.
+/// A UYVY picture. Does not own the memory.
 struct Screen {
   u8 *uyvy;
   u32 width;
@@ -21,17 +21,17 @@ struct Screen {
 
   u8 *line(u32 number) const { return uyvy + std::size_t{number} * width * 2; }
   void fill(Area area, Colour colour) const;
-  /// The four edges of an area, inside it, two pixels and two lines thick.
+  /// Draws the four edges of an area, inside the area, two pixels and two lines thick.
   void outline(Area area, Colour colour) const;
 };
 
-/// Outlines the blocks with motion in the area that shows a picture of this size.
+/// Outlines the blocks with motion in an area that shows a picture of `width` x `lines`.
 void draw_motion_marks(const Screen &screen, Area area, const MovedBlocks &blocks, u32 width, u32 lines);
-/// Lines between the ordinary windows of a layout.
+/// Draws the borders of the ordinary windows of a layout.
 void draw_grid(const Screen &screen, const driver::Grid &grid);
 void draw_frame(const Screen &screen, const driver::FrameRect &frame);
-/// Magnifies the part of half width and height at the zoom's origin to the whole screen. `copy` is
-/// the memory it works in.
+/// Magnifies a part of half the width and height, at the origin of `zoom`, to the whole screen. `copy` is
+/// scratch memory.
 void magnify(const Screen &screen, const driver::Zoom &zoom, std::vector<u8> &copy);
 
 }  // namespace virtual_card
