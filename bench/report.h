@@ -16,7 +16,9 @@ struct Costs {
 };
 
 /// Runs `ours` and `theirs` in turn, `rounds` times, and reports the ratio of their results pair by pair.
-/// Both return a cost, e.g. processor nanoseconds a frame. The first pair only warms up.
+/// Both return a cost, e.g. processor nanoseconds a frame. The first pair only warms up. A busy machine makes
+/// the ratios spread: beyond a factor of 1.5 all rounds are measured again, up to three times in all, and the
+/// measurement that spreads least counts.
 Costs compare(const std::string &name, int rounds, double limit, const std::function<double()> &ours,
               const std::function<double()> &theirs);
 
