@@ -26,10 +26,14 @@ extern "C" {
 #endif
 
 /**
- * Opens the card and switches its motion detection off. The SDK starts with NTSC, 720 pixels, the
- * 1-picture layout and no channel enabled; zv_SetVideoStandard() and zv_SetResolution() send standard
- * and width to the card. Picture properties, privacy masks and motion thresholds stay as the card has
- * them.
+ * Opens the card. Writes registers 0x72, 0x73 and 0x74 of decoder chip 0, clears bits 16-31 of codec
+ * register 0x260 (no motion detection on any channel) and sets codec register 0x268 to 0xFFFF. The card
+ * keeps everything else that an earlier program has set, until it loses power: standard and width, encoder
+ * settings, layout, focus channel, picture properties, privacy masks, motion thresholds.
+ *
+ * The SDK reads only the motion thresholds. It assumes NTSC, 720 pixels, the 1-picture layout, channel n in
+ * display position n and no channel enabled, whatever the card has. Call zv_SetVideoStandard() and
+ * zv_SetResolution() right after opening: else stream headers and pictures can differ in size.
  *
  * @param handle  receives the handle; written only on success
  * @return ZV_OK; ZV_ERR_PARAM for a null @p handle; ZV_ERR_OPEN when a device node is missing or
