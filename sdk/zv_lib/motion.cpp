@@ -8,7 +8,7 @@
 #include "internal.h"
 #include "zv_bits.h"
 #include "zv_card.h"
-#include "zv_lib.h"
+#include "zv_picture.h"
 
 namespace zarvo {
 

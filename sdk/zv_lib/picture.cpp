@@ -7,7 +7,7 @@
 #include "command.h"
 #include "internal.h"
 #include "zv_card.h"
-#include "zv_lib.h"
+#include "zv_picture.h"
 
 namespace zarvo {
 

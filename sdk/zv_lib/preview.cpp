@@ -12,7 +12,7 @@
 #include "zv_bits.h"
 #include "zv_card.h"
 #include "zv_display.h"
-#include "zv_lib.h"
+#include "zv_picture.h"
 
 namespace zarvo {
 
