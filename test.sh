@@ -44,7 +44,7 @@ build_and_test() { # PRESET CTEST-OPTION...
 # What a newcomer runs first; the folder has a blank on purpose.
 smoke_demo() {
   say "Recording with demo.sh"
-  ./demo.sh record --seconds 3 --output "build/smoke test"
+  ./demo.sh record --force --seconds 3 --output "build/smoke test"
 }
 
 run_tidy() {

@@ -2,8 +2,6 @@
  * @file motion_and_zoom.cpp
  * Counts the frames that the callback gets with the motion flag, and saves preview pictures with
  * picture-in-picture and zoom as PPM files.
- *
- * Usage: zarvo_motion [DIR]     saves the pictures in DIR, by default the working directory
  */
 #include <algorithm>
 #include <array>
@@ -15,9 +13,16 @@
 #include <thread>
 
 #include "card.h"
+#include "command_line.h"
 #include "zv_display.h"
 
 namespace {
+
+constexpr char kHelp[] =
+    "Usage: zarvo_motion [DIR]\n"
+    "Counts frames with motion, and saves preview pictures in DIR or the working directory.\n\n"
+    "  -h, --help   this text\n"
+    "  --version    the version\n";
 
 constexpr u32 kWidth = 720;
 constexpr u32 kHeight = 480;
@@ -129,11 +134,19 @@ void show_windows(HANDLE card, const std::filesystem::path &folder) {
   check(zv_EnablePreviewChannels(card, 0), "zv_EnablePreviewChannels");
 }
 
+/// Returns the folder for the pictures.
+std::filesystem::path parse_folder(int argc, char **argv) {
+  static const option kOptions[] = {COMMON_OPTIONS};
+  next_option(argc, argv, kOptions, kHelp);
+  if (argc - optind > 1) throw UsageError("more than one folder");
+  return optind < argc ? argv[optind] : ".";
+}
+
 }  // namespace
 
 int main(int argc, char **argv) {
   try {
-    const std::filesystem::path folder = argc > 1 ? argv[1] : ".";
+    const std::filesystem::path folder = parse_folder(argc, argv);
     std::filesystem::create_directories(folder);
     Card card;
     check(zv_SetVideoStandard(card.handle, VIDEO_STANDARD_ZV_NTSC), "zv_SetVideoStandard");
@@ -141,6 +154,9 @@ int main(int argc, char **argv) {
     count_motion(card.handle);
     show_windows(card.handle, folder);
     return 0;
+  } catch (const UsageError &error) {
+    std::fprintf(stderr, "zarvo_motion: %s\n", error.what());
+    return 2;
   } catch (const std::exception &error) {
     std::fprintf(stderr, "zarvo_motion: %s\n", error.what());
     return 1;

@@ -1,95 +1,106 @@
 /**
  * @file record.cpp
  * Records channels of the card without a window. It shows the shortest complete use of the SDK: open the
- * card, configure channels, register a callback for each kind of stream, start, wait, stop, close.
+ * card, set standard and width, configure channels, register a callback for each kind of stream, start, wait,
+ * stop, close.
  */
+#include <fcntl.h>
 #include <signal.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <array>
 #include <atomic>
 #include <cerrno>
-#include <chrono>
 #include <cstdio>
 #include <cstring>
+#include <filesystem>
+#include <span>
 #include <thread>
-#include <utility>
 
 #include "card.h"
+#include "command_line.h"
 #include "record_options.h"
+#include "record_stream.h"
+#include "record_watch.h"
 
 namespace {
 
-using Clock = std::chrono::steady_clock;
-
-/// A file and its counters. One SDK thread delivers the stream and writes them; the main thread reads them
-/// after zv_Stop().
-struct Stream {
-  std::string path;
-  FILE *file = nullptr;
-  unsigned long long blocks = 0, bytes = 0, motion = 0, loss = 0;
-};
-std::array<Stream, ZV_CHANNELS> video;
-std::array<Stream, ZV_AUDIO_CHANNELS> audio;
-std::atomic<int> write_error{0};  // errno of a write that failed on an SDK thread
-std::atomic<bool> interrupted{false};
+std::array<Stream, ZV_CHANNELS + ZV_AUDIO_CHANNELS> streams;  // the audio inputs follow the video channels
+std::atomic<int> write_error{0};                              // errno of a write that failed on an SDK thread
+std::atomic<bool> stopping{false};                            // a signal has come, or the time is over
 
 // --- Callbacks: the SDK calls them on its own threads
 
-void append(Stream &stream, const u8 *data, i32 length) {
-  if (!stream.file) return;
-  const auto size = static_cast<std::size_t>(length);
-  if (std::fwrite(data, 1, size, stream.file) != size) write_error = errno;
-  ++stream.blocks;
-  stream.bytes += size;
+void append(Stream &stream, const u8 *data, i32 length, i32 flags) {
+  if (!stream.is_chosen()) return;
+  if (const int error = stream.append(data, length, flags, stopping)) write_error = error;
 }
 
 void on_video(u32 channel, u8 *data, i32 length, i32 flags) {
-  Stream &stream = video[channel];
-  append(stream, data, length);
-  if (flags & ZV_FLAG_MOTION) ++stream.motion;
-  if (flags & ZV_FLAG_VIDEO_LOSS) ++stream.loss;
+  append(streams[channel], data, length, flags);
 }
 
-void on_audio(u32 input, u8 *data, i32 length, i32) {
-  append(audio[input], data, length);
+void on_audio(u32 input, u8 *data, i32 length, i32 flags) {
+  append(streams[ZV_CHANNELS + input], data, length, flags);
 }
 
 // --- Files
 
-template <std::size_t count>
-void open_files(std::array<Stream, count> &streams, u32 mask, const RecordOptions &options,
-                const char *format) {
-  for (unsigned n = 0; n < count; ++n) {
-    if (!(mask >> n & 1u)) continue;
+/// Moves standard output away for the stream. What is printed, also by the SDK, goes to standard error.
+int take_standard_output() {
+  const int stream = fcntl(STDOUT_FILENO, F_DUPFD_CLOEXEC, STDERR_FILENO + 1);
+  if (stream < 0 || dup2(STDERR_FILENO, STDOUT_FILENO) < 0)
+    throw std::runtime_error(std::string("standard output: ") + std::strerror(errno));
+  return stream;
+}
+
+/// Chooses the streams of a mask and names their files.
+void choose(std::span<Stream> channels, u32 mask, const StreamKind &kind, const char *format,
+            const RecordOptions &options) {
+  for (unsigned n = 0; n < channels.size(); ++n) {
     char name[32];
     std::snprintf(name, sizeof name, format, n + 1);
-    streams[n].path = options.output / name;
-    streams[n].file = std::fopen(streams[n].path.c_str(), "wb");
-    if (!streams[n].file)
-      throw std::runtime_error("cannot create " + streams[n].path + ": " + std::strerror(errno));
+    if (mask >> n & 1u) channels[n].choose(options.to_stdout ? name : options.output / name, kind);
   }
 }
 
-/// Closes the files and prints a line for each. fclose() writes the rest of the buffer, so it can fail too.
-template <std::size_t count>
-void close_files(std::array<Stream, count> &streams, double seconds) {
-  constexpr bool is_video = count == ZV_CHANNELS;
+/// Creates all files, or none if one is there and must not be overwritten. A symbolic link never is: the file
+/// that it leads to may be anything.
+void create_files(const RecordOptions &options) {
+  std::filesystem::create_directories(options.output);
+  for (const Stream &stream : streams) {
+    const auto place = std::filesystem::symlink_status(stream.name());
+    if (is_symlink(place)) throw std::runtime_error(stream.name() + " is a symbolic link");
+    if (exists(place) && !options.force)
+      throw std::runtime_error(stream.name() + " exists; --force overwrites it");
+  }
   for (Stream &stream : streams) {
-    if (!stream.file) continue;
-    if (std::fclose(std::exchange(stream.file, nullptr)) != 0) write_error = errno;
-    std::printf("%s: %llu %s, %llu bytes, %.1f kbit/s", stream.path.c_str(), stream.blocks,
-                is_video ? "frames" : "blocks", stream.bytes,
-                seconds > 0 ? static_cast<double>(stream.bytes) * 8 / 1000 / seconds : 0.0);
-    if (is_video) std::printf(", motion in %llu, loss in %llu", stream.motion, stream.loss);
-    std::printf("\n");
+    if (stream.is_chosen()) stream.create(options.force);
+  }
+}
+
+void open_streams(const RecordOptions &options, int standard_output) {
+  const bool ntsc = options.standard == VIDEO_STANDARD_ZV_NTSC;
+  const StreamKind video{"frames", ntsc ? 30000.0 / 1001 : 25, true};
+  const StreamKind audio{"blocks", 8000.0 / 128, false};  // a block has 128 samples
+  const char *const video_name = options.codec == VIDEO_CODEC_ZV_MPEG4 ? "ch%02u.m4v" : "ch%02u.mjpeg";
+  const std::span<Stream> all = streams;
+  choose(all.first(ZV_CHANNELS), options.channels, video, video_name, options);
+  choose(all.last(ZV_AUDIO_CHANNELS), options.audio, audio, "audio%u.g726", options);
+  if (options.to_stdout) {
+    std::ranges::find_if(streams, &Stream::is_chosen)->take(standard_output);
+  } else {
+    create_files(options);
   }
 }
 
 // --- The recording
 
+/// The card keeps what an earlier program has set: set everything that the recording depends on.
 void configure(HANDLE card, const RecordOptions &options) {
   check(zv_SetVideoStandard(card, options.standard), "zv_SetVideoStandard");
+  check(zv_SetResolution(card, RESOLUTION_ZV_720), "zv_SetResolution");
   ZV_VIDEO_CONFIG config{};
   config.mjpeg = options.codec;
   config.scale = options.scale;
@@ -107,65 +118,86 @@ void configure(HANDLE card, const RecordOptions &options) {
 }
 
 void on_signal(int) {
-  interrupted = true;
+  stopping = true;
 }
 
-/// After this call a SIGINT or SIGTERM ends the recording; the same signal again ends the program, in case
-/// the card hangs. Before this call, while the card is being opened, the first signal ends the program.
+/// After this call a SIGHUP, SIGINT or SIGTERM ends the recording; the same signal again ends the program, in
+/// case the card hangs. Before this call, while the card is being opened, the first signal ends the program.
+/// A signal that the caller ignores, as nohup does, stays ignored.
 void catch_signals() {
   struct sigaction action {};
   action.sa_handler = on_signal;
   action.sa_flags = SA_RESTART | static_cast<int>(SA_RESETHAND);
-  sigaction(SIGINT, &action, nullptr);
-  sigaction(SIGTERM, &action, nullptr);
-}
-
-/// Waits until the time is over, a signal has come or a write has failed. Returns the seconds that have
-/// passed.
-double wait_for_end(unsigned seconds) {
-  const auto start = Clock::now();
-  const auto end = start + std::chrono::seconds(seconds);
-  while (Clock::now() < end && !write_error && !interrupted) {
-    std::this_thread::sleep_for(std::chrono::milliseconds(2));
+  for (const int number : {SIGHUP, SIGINT, SIGTERM}) {
+    struct sigaction before {};
+    sigaction(number, nullptr, &before);
+    if (before.sa_handler != SIG_IGN) sigaction(number, &action, nullptr);
   }
-  return std::chrono::duration<double>(Clock::now() - start).count();
 }
 
-void record(const RecordOptions &options) {
+/// Waits until the time is over, a signal has come or a write has failed.
+void wait_for_end(Clock::time_point start, unsigned seconds) {
+  Watch watch(streams, start);
+  const auto end = seconds > 0 ? start + std::chrono::seconds(seconds) : Clock::time_point::max();
+  while (!stopping && !write_error && Clock::now() < end) {
+    std::this_thread::sleep_for(std::chrono::milliseconds(2));
+    watch.look();
+  }
+  stopping = true;
+}
+
+/// Prints the tallies. Returns the exit status.
+int report(double seconds, const RecordOptions &options) {
+  for (const Stream &stream : streams) {
+    if (stream.is_chosen()) stream.report(seconds);
+  }
+  if (write_error == EPIPE && options.to_stdout) return 0;  // the reader has what it wanted
+  if (write_error)
+    throw std::runtime_error("cannot write to " + options.output.string() + ": " +
+                             std::strerror(write_error));
+  int status = 0;
+  for (const Stream &stream : streams) {
+    if (!stream.incomplete(seconds)) continue;
+    std::fprintf(stderr, "zarvo_record: %s: %ju of %ju are missing\n", stream.name().c_str(),
+                 stream.missing(seconds), stream.expected(seconds));
+    status = 3;
+  }
+  return status;
+}
+
+int record(const RecordOptions &options) {
+  // Before the card is opened: the SDK prints too.
+  const int standard_output = options.to_stdout ? take_standard_output() : -1;
   Card card;
   configure(card.handle, options);
-
-  const bool mpeg4 = options.codec == VIDEO_CODEC_ZV_MPEG4;
-  std::filesystem::create_directories(options.output);
-  open_files(video, options.channels, options, mpeg4 ? "ch%02u.m4v" : "ch%02u.mjpeg");
-  open_files(audio, options.audio, options, "audio%u.g726");
+  open_streams(options, standard_output);
 
   // The card encodes each channel with both codecs; a null callback discards the other codec's frames.
+  const bool mpeg4 = options.codec == VIDEO_CODEC_ZV_MPEG4;
   check(zv_RegisterCallBack(card.handle, mpeg4 ? on_video : nullptr, mpeg4 ? nullptr : on_video, on_audio),
         "zv_RegisterCallBack");
   catch_signals();
+  const auto start = Clock::now();
+  for (Stream &stream : streams) stream.begin(start);
   check(zv_Start(card.handle), "zv_Start");
-  const double seconds = wait_for_end(options.seconds);
+  wait_for_end(start, options.seconds);
+  const auto end = Clock::now();
   check(zv_Stop(card.handle), "zv_Stop");  // from here on no callback runs
-
-  close_files(video, seconds);
-  close_files(audio, seconds);
-  if (write_error) {
-    throw std::runtime_error("cannot write to " + options.output.string() + ": " +
-                             std::strerror(write_error));
+  for (Stream &stream : streams) {
+    const int error = stream.is_chosen() ? stream.end(end) : 0;
+    if (error) write_error = error;
   }
-  if (seconds >= options.seconds &&
-      std::ranges::all_of(video, [](const Stream &s) { return s.blocks == 0; })) {
-    throw std::runtime_error("no frame came from the card");
-  }
+  return report(std::chrono::duration<double>(end - start).count(), options);
 }
 
 }  // namespace
 
 int main(int argc, char **argv) {
+  // A full file or a reader that has gone is a write error, not the end of the program.
+  signal(SIGXFSZ, SIG_IGN);
+  signal(SIGPIPE, SIG_IGN);
   try {
-    record(parse_options(argc, argv));
-    return 0;
+    return record(parse_options(argc, argv));
   } catch (const UsageError &error) {
     std::fprintf(stderr, "zarvo_record: %s\n", error.what());
     return 2;

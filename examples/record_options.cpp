@@ -1,20 +1,22 @@
 // Parses the command line of zarvo_record.
 #include "record_options.h"
 
-#include <getopt.h>
+#include <unistd.h>
 
+#include <bit>
 #include <charconv>
-#include <cstdio>
-#include <cstdlib>
 #include <map>
+#include <optional>
 #include <string>
+
+#include "command_line.h"
 
 namespace {
 
 constexpr char kHelp[] =
     "Usage: zarvo_record [options]\n"
     "Records channels of the capture card, one elementary stream a file.\n\n"
-    "  --seconds N         how long, 1 to 86400 (5)\n"
+    "  --seconds N         how long, 1 to 86400; 0: until SIGINT, SIGTERM or SIGHUP (5)\n"
     "  --channels LIST     video channels, e.g. 1-16 or 1,3,5-8\n"
     "                      (as many as the card encodes at the full rate: 16 cif, 8 half-d1 or 4 d1)\n"
     "  --codec NAME        mpeg4 or mjpeg (mpeg4)\n"
@@ -22,7 +24,12 @@ constexpr char kHelp[] =
     "  --standard NAME     ntsc or pal (ntsc)\n"
     "  --audio LIST        audio inputs, e.g. 1-4, or none (1-4)\n"
     "  --output DIR        where the files go; made when missing (recordings)\n"
-    "  --help              this text\n";
+    "  --output -          write the stream of one video channel to standard output, all else to\n"
+    "                      standard error\n"
+    "  --force             overwrite files\n"
+    "  -h, --help          this text\n"
+    "  --version           the version\n\n"
+    "Status: 0 all frames came; 1 failed; 2 wrong option; 3 done, but more than 1 % of a stream is missing\n";
 
 const std::map<std::string, ZV_SCALE_VALUE> kScales = {
     {"cif", SCALE_ZV_CIF}, {"half-d1", SCALE_ZV_HALF_D1}, {"d1", SCALE_ZV_D1}};
@@ -34,12 +41,13 @@ const std::map<std::string, ZV_VIDEO_STANDARD> kStandards = {{"ntsc", VIDEO_STAN
 const std::map<ZV_SCALE_VALUE, u32> kBudget = {
     {SCALE_ZV_CIF, 0xFFFF}, {SCALE_ZV_HALF_D1, 0xFF}, {SCALE_ZV_D1, 0xF}};
 
-unsigned parse_number(const std::string &option, const std::string &text, unsigned highest) {
+unsigned parse_number(const std::string &option, const std::string &text, unsigned lowest, unsigned highest) {
   unsigned number = 0;
   const char *const text_end = text.data() + text.size();
   const auto [end, error] = std::from_chars(text.data(), text_end, number);
-  if (error != std::errc{} || end != text_end || number < 1 || number > highest) {
-    throw UsageError(option + ": '" + text + "' is not a number from 1 to " + std::to_string(highest));
+  if (error != std::errc{} || end != text_end || number < lowest || number > highest) {
+    throw UsageError(option + ": '" + text + "' is not a number from " + std::to_string(lowest) + " to " +
+                     std::to_string(highest));
   }
   return number;
 }
@@ -51,9 +59,9 @@ u32 parse_list(const std::string &option, const std::string &text, unsigned high
     comma = text.find(',', at);
     const std::string item = text.substr(at, comma == std::string::npos ? comma : comma - at);
     const std::size_t dash = item.find('-');
-    const unsigned first = parse_number(option, item.substr(0, dash), highest);
+    const unsigned first = parse_number(option, item.substr(0, dash), 1, highest);
     const unsigned last =
-        dash == std::string::npos ? first : parse_number(option, item.substr(dash + 1), highest);
+        dash == std::string::npos ? first : parse_number(option, item.substr(dash + 1), 1, highest);
     if (last < first) {
       throw UsageError(std::string(option).append(": the range '").append(item).append("' runs backwards"));
     }
@@ -71,24 +79,33 @@ Value parse_name(const std::string &option, const std::string &text,
   throw UsageError(option + ": '" + text + "' is unknown; possible are " + possible);
 }
 
+const option kOptions[] = {{"seconds", required_argument, nullptr, 's'},
+                           {"channels", required_argument, nullptr, 'c'},
+                           {"codec", required_argument, nullptr, 'v'},
+                           {"scale", required_argument, nullptr, 'z'},
+                           {"standard", required_argument, nullptr, 't'},
+                           {"audio", required_argument, nullptr, 'a'},
+                           {"output", required_argument, nullptr, 'o'},
+                           {"force", no_argument, nullptr, 'f'},
+                           COMMON_OPTIONS};
+
+/// Checks that the options select one stream for standard output.
+void check_single_stream(const RecordOptions &options) {
+  if (!std::has_single_bit(options.channels)) throw UsageError("--output -: choose one channel");
+  if (options.audio != 0) throw UsageError("--output -: audio needs a folder");
+  if (isatty(STDOUT_FILENO)) throw UsageError("--output -: standard output is a terminal");
+}
+
 }  // namespace
 
 RecordOptions parse_options(int argc, char **argv) {
-  static const option kLong[] = {{"seconds", required_argument, nullptr, 's'},
-                                 {"channels", required_argument, nullptr, 'c'},
-                                 {"codec", required_argument, nullptr, 'v'},
-                                 {"scale", required_argument, nullptr, 'z'},
-                                 {"standard", required_argument, nullptr, 't'},
-                                 {"audio", required_argument, nullptr, 'a'},
-                                 {"output", required_argument, nullptr, 'o'},
-                                 {"help", no_argument, nullptr, 'h'},
-                                 {nullptr, 0, nullptr, 0}};
   RecordOptions options;
-  for (int letter; (letter = getopt_long(argc, argv, "", kLong, nullptr)) != -1;) {
+  std::optional<u32> audio;
+  for (int letter; (letter = next_option(argc, argv, kOptions, kHelp)) != -1;) {
     const std::string text = optarg ? optarg : "";
     switch (letter) {
       case 's':
-        options.seconds = parse_number("--seconds", text, 86400);
+        options.seconds = parse_number("--seconds", text, 0, 86400);
         break;
       case 'c':
         options.channels = parse_list("--channels", text, ZV_CHANNELS);
@@ -103,20 +120,21 @@ RecordOptions parse_options(int argc, char **argv) {
         options.standard = parse_name("--standard", text, kStandards);
         break;
       case 'a':
-        options.audio = text == "none" ? 0 : parse_list("--audio", text, ZV_AUDIO_CHANNELS);
+        audio = text == "none" ? 0 : parse_list("--audio", text, ZV_AUDIO_CHANNELS);
         break;
       case 'o':
         options.output = text;
         break;
-      case 'h':
-        std::fputs(kHelp, stdout);
-        std::exit(0);
       default:
-        throw UsageError("see --help for the options");  // getopt_long has printed the wrong option
+        options.force = true;
+        break;
     }
   }
-  if (optind < argc) throw UsageError(std::string("'") + argv[optind] + "' is not an option; see --help");
+  if (optind < argc) refuse_option(argv[optind], kOptions);
   if (options.output.empty()) throw UsageError("--output: the name of the folder is empty");
+  options.to_stdout = options.output == "-";
+  options.audio = audio.value_or(options.to_stdout ? 0 : (1u << ZV_AUDIO_CHANNELS) - 1);
   if (options.channels == 0) options.channels = kBudget.at(options.scale);
+  if (options.to_stdout) check_single_stream(options);
   return options;
 }

@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# Wrong arguments of zarvo_record, wrong options of the virtual card, no card, a full disk: the message
+# Wrong arguments of zarvo_record, wrong options of the virtual card, no card, files that are there: the message
 # says what is wrong (and what is possible), and the exit status says that it failed.
 . "$(dirname "$0")/common.sh"
 
@@ -13,10 +13,9 @@ refused() {
   expect "'$*' recorded something" test ! -e "$FOLDER/recordings"
 }
 
-refused 2 'number from 1 to 86400' --seconds 0
 refused 2 "'5x' is not a number" --seconds 5x
 refused 2 "'-1' is not a number" --seconds -1
-refused 2 'number from 1 to 86400' --seconds 99999999999
+refused 2 'number from 0 to 86400' --seconds 99999999999
 refused 2 'number from 1 to 16' --channels 0
 refused 2 'number from 1 to 16' --channels 1-17
 refused 2 'runs backwards' --channels 5-3
@@ -26,16 +25,24 @@ refused 2 'mjpeg, mpeg4' --codec h264
 refused 2 'cif, d1, half-d1' --scale vga
 refused 2 'ntsc, pal' --standard secam
 refused 2 'is empty' --output ''
-refused 2 "'stray' is not an option" stray
-refused 2 'frames' --frames
+refused 2 "'stray' is not an option; possible are --seconds, " stray
+refused 2 "'--frames' is not an option; possible are --seconds, " --frames
+refused 2 "'-s' is not an option" -s 5
+refused 2 'choose one channel' --output -
+refused 2 'audio needs a folder' --output - --channels 1 --audio 1
 refused 2 'requires an argument' --scale
 refused 1 'frame-rate budget' --scale d1 --channels 1-5
 refused 1 '/dev/null/x' --output /dev/null/x
 
-# Catches: a write error that does not end the recording, or ends it as success. /dev/full fails every write.
-mkdir "$FOLDER/full"
-ln -s /dev/full "$FOLDER/full/ch01.m4v"
-refused 1 'No space left' --seconds 60 --channels 1 --output full
+# A file that is there stays as it is, and so does what a link in the place of a file leads to.
+mkdir "$FOLDER/kept"
+echo precious | tee "$FOLDER/precious" >"$FOLDER/kept/audio1.g726"
+refused 1 'exists; --force overwrites it' --output kept
+rm "$FOLDER/kept/audio1.g726"
+ln -s ../precious "$FOLDER/kept/audio1.g726"
+refused 1 'is a symbolic link' --output kept --force
+expect_equal "files beside the link" audio1.g726 "$(ls "$FOLDER/kept")"
+expect_equal "the file behind the link" precious "$(cat "$FOLDER/precious")"
 
 # The card reports options that it does not understand, on standard error only.
 for option in speed=fast lost=17 nonsense=1 camera3=/nowhere.mp4; do
