@@ -11,6 +11,10 @@
 #include <string>
 #include <thread>
 
+namespace virtual_card {}
+/// The one short name of the virtual card in the tests.
+namespace card = virtual_card;
+
 /// Waits for a condition, half a minute at most: a time that only a fault can use up.
 template <typename Condition>
 bool eventually(Condition condition) {

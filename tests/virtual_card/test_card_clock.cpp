@@ -1,15 +1,13 @@
 // Card time: the three clocks, and the watchdog.
 
-#include "card_fixture.h"
+#include "node_test.h"
 
 namespace {
 
-using ManualClock = CardTest;
-
 // Advancing in pieces must give the same frames as advancing at once, whatever the pieces.
-TEST_F(ManualClock, FramesAndBlocksComeAtTheirTimes) {
+TEST_F(NodeTest, FramesAndBlocksComeAtTheirTimes) {
   encode_channel(3);
-  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+  start();
   EXPECT_EQ(read_mpeg4(), 0);
   card::advance(1001ms);
   EXPECT_EQ(card::counters().mpeg4.made, 30u);
@@ -26,7 +24,7 @@ TEST_F(ManualClock, FramesAndBlocksComeAtTheirTimes) {
   EXPECT_EQ(card::counters().mpeg4.lost, 0u);
 }
 
-TEST_F(ManualClock, TheWatchdogCountsDownUnlessFed) {
+TEST_F(NodeTest, TheWatchdogCountsDownUnlessFed) {
   EXPECT_EQ(board_command(driver::kBoardWatchdogOn), driver::kBoardWatchdogOnReply);
   for (int feed = 0; feed < 3; ++feed) {
     card::advance(59s);
@@ -35,9 +33,9 @@ TEST_F(ManualClock, TheWatchdogCountsDownUnlessFed) {
   EXPECT_TRUE(card::counters().watchdog_running);
   EXPECT_EQ(card::counters().watchdog_resets, 0u);
 
-  ::testing::internal::CaptureStderr();
+  testing::internal::CaptureStderr();
   for (int minute = 0; minute < 2; ++minute) card::advance(60s);
-  EXPECT_EQ(::testing::internal::GetCapturedStderr(),
+  EXPECT_EQ(testing::internal::GetCapturedStderr(),
             "virtual card: the watchdog would have reset the machine\n");
   EXPECT_EQ(card::counters().watchdog_resets, 1u);
   EXPECT_FALSE(card::counters().watchdog_running);
@@ -48,22 +46,12 @@ TEST_F(ManualClock, TheWatchdogCountsDownUnlessFed) {
   EXPECT_EQ(card::counters().watchdog_resets, 1u);
 }
 
-/// A card whose time runs by itself, and that encodes all channels.
-class RunningClock : public CardTest {
- protected:
-  void run(card::ClockMode mode, double speed) {
-    close_nodes();
-    card::set_clock(mode, speed);
-    open_nodes();
-    for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) encode_channel(channel);
-  }
-};
-
-TEST_F(RunningClock, FramesComeByThemselvesAndEndWithTheLastClose) {
+TEST_F(NodeTest, FramesComeByThemselvesAndEndWithTheLastClose) {
   for (const auto mode : {card::ClockMode::real_time, card::ClockMode::fast}) {
-    run(mode, 4.0);
+    run_with(mode, 4);
+    encode_channel(0);
     const auto made = card::counters().mpeg4.made;
-    EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+    start();
     EXPECT_TRUE(eventually([&] { return card::counters().mpeg4.made >= made + 10; }));
     close_nodes();
     const auto at_close = card::counters().mpeg4.made;
@@ -75,13 +63,14 @@ TEST_F(RunningClock, FramesComeByThemselvesAndEndWithTheLastClose) {
 
 // A frame that was being encoded when the stop came would open the next recording, with no intra frame
 // before it.
-TEST_F(RunningClock, AStopInTheMiddleOfAFieldLeavesNoFrameBehind) {
-  run(card::ClockMode::fast, 4.0);
+TEST_F(NodeTest, AStopInTheMiddleOfAFieldLeavesNoFrameBehind) {
+  run_with(card::ClockMode::fast, 4);
+  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) encode_channel(channel);
   for (int round = 0; round < 10; ++round) {
     const auto made = card::counters().mpeg4.made;
-    EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+    start();
     EXPECT_TRUE(eventually([&] { return card::counters().mpeg4.made > made; }));
-    EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0);
+    stop();
     close_nodes();  // returns when the field is finished
     open_nodes();
     EXPECT_EQ(read_mpeg4(), 0);
@@ -90,9 +79,10 @@ TEST_F(RunningClock, AStopInTheMiddleOfAFieldLeavesNoFrameBehind) {
 }
 
 // A card that cannot keep up must lose frames and count them, not fall further and further behind.
-TEST_F(RunningClock, WhatComesTooLateIsLostAndCounted) {
-  run(card::ClockMode::fast, 1000);
-  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+TEST_F(NodeTest, WhatComesTooLateIsLostAndCounted) {
+  run_with(card::ClockMode::fast, 1000);
+  for (u32 channel = 0; channel < ZV_CHANNELS; ++channel) encode_channel(channel);
+  start();
   EXPECT_TRUE(eventually([&] {
     read_mpeg4();
     read_mjpeg();

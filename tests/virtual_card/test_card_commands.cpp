@@ -1,31 +1,15 @@
 // The commands of the four nodes: what they refuse, what they keep, what they answer.
 
-#include <cstring>
-
-#include "card_fixture.h"
+#include "node_test.h"
 
 namespace {
 
 using namespace zarvo::driver;
 
-class Commands : public CardTest {
- protected:
-  void SetUp() override {
-    CardTest::SetUp();
-    no_access = static_cast<u8 *>(mmap(nullptr, 4096, PROT_NONE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0));
-    read_only = static_cast<u8 *>(mmap(nullptr, 4096, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0));
-  }
-  void TearDown() override {
-    munmap(no_access, 4096);
-    munmap(read_only, 4096);
-    CardTest::TearDown();
-  }
+/// An address where no program has memory.
+void *const kNowhere = reinterpret_cast<void *>(64);  // NOLINT(performance-no-int-to-ptr)
 
-  u8 *no_access = nullptr;
-  u8 *read_only = nullptr;
-};
-
-TEST_F(Commands, EachNodeTakesItsOwnAndRefusesBadOnes) {
+TEST_F(NodeTest, EachNodeTakesItsOwnAndRefusesBadOnes) {
   const struct {
     int fd;
     std::vector<u32> none, word, channel;  // by what the argument begins with
@@ -53,17 +37,17 @@ TEST_F(Commands, EachNodeTakesItsOwnAndRefusesBadOnes) {
       for (const u32 code : codes)
         for (const int other : {encoder, display, audio, video_input})
           EXPECT_TRUE(other == node.fd || answer(ioctl(other, code, record)) == -ENOTTY) << code;
-    for (const u32 code : node.none) EXPECT_EQ(answer(ioctl(node.fd, code, no_access)), 0) << code;
+    for (const u32 code : node.none) EXPECT_EQ(answer(ioctl(node.fd, code, kNowhere)), 0) << code;
     for (const auto &codes : {node.word, node.channel})
       for (const u32 code : codes)
-        for (u8 *const bad : {static_cast<u8 *>(nullptr), no_access})
+        for (void *const bad : {static_cast<void *>(nullptr), kNowhere})
           EXPECT_EQ(answer(ioctl(node.fd, code, bad)), -EFAULT) << code;
     for (const u32 code : node.channel) EXPECT_EQ(answer(ioctl(node.fd, code, record)), -EINVAL) << code;
     EXPECT_EQ(answer(ioctl(node.fd, 0x12345678, record)), -ENOTTY);
   }
 }
 
-TEST_F(Commands, ValuesOutOfRangeChangeNothing) {
+TEST_F(NodeTest, ValuesOutOfRangeChangeNothing) {
   const auto word_record = [](auto... words) { return std::array<u32, sizeof...(words)>{u32(words)...}; };
   EXPECT_EQ(send(encoder, ENC_IOC_SET_SCALE, ChannelValue{2, 9}), 0);
   EXPECT_EQ(send(encoder, ENC_IOC_SET_SCALE, ChannelValue{2, 3}), -EINVAL);
@@ -88,16 +72,14 @@ TEST_F(Commands, ValuesOutOfRangeChangeNothing) {
 }
 
 // An answer that cannot be delivered must be known before the board acts: here the watchdog would run.
-TEST_F(Commands, ACommandWhoseAnswerCannotBeDeliveredIsNotCarriedOut) {
-  ASSERT_EQ(mprotect(read_only, 4096, PROT_READ | PROT_WRITE), 0);
-  std::memcpy(read_only, &kBoardWatchdogOn, sizeof(u32));
-  ASSERT_EQ(mprotect(read_only, 4096, PROT_READ), 0);
-  EXPECT_EQ(answer(ioctl(video_input, VIN_IOC_BOARD_CMD, read_only)), -EFAULT);
+TEST_F(NodeTest, ACommandWhoseAnswerCannotBeDeliveredIsNotCarriedOut) {
+  static constexpr BoardCommand kReadOnly{kBoardWatchdogOn, VIDEO_STANDARD_ZV_PAL};
+  EXPECT_EQ(answer(ioctl(video_input, VIN_IOC_BOARD_CMD, &kReadOnly)), -EFAULT);
   EXPECT_FALSE(card::counters().watchdog_running);
-  EXPECT_EQ(answer(ioctl(video_input, VIN_IOC_SET_STANDARD, read_only + 64)), 0);
+  EXPECT_EQ(answer(ioctl(video_input, VIN_IOC_SET_STANDARD, &kReadOnly.reply)), 0);
 }
 
-TEST_F(Commands, RegistersPowerUpAndKeepWhatIsWritten) {
+TEST_F(NodeTest, RegistersPowerUpAndKeepWhatIsWritten) {
   EXPECT_EQ(codec_register(kRegDisplayState) >> 31, 1u);
   EXPECT_EQ(codec_register(0xFFFFFFFC), 0u);
   EXPECT_EQ(send(display, DISP_IOC_WRITE_REG, Register{0xFFFFFFFC, 5}), 0);
@@ -116,7 +98,7 @@ TEST_F(Commands, RegistersPowerUpAndKeepWhatIsWritten) {
   EXPECT_EQ(video_input_register(kRegRouting) >> kRoutingShift, 0u);
 }
 
-TEST_F(Commands, MasksAreKeptInUnitsThatCoverThem) {
+TEST_F(NodeTest, MasksAreKeptInUnitsThatCoverThem) {
   const struct {
     Mask mask;
     u32 packed;
@@ -132,7 +114,7 @@ TEST_F(Commands, MasksAreKeptInUnitsThatCoverThem) {
   EXPECT_EQ(video_input_register(kRegPrivacyMask + 4 * 4), 0u);
 }
 
-TEST_F(Commands, DecodersTellOfCamerasAndInputs) {
+TEST_F(NodeTest, DecodersTellOfCamerasAndInputs) {
   const auto status = [&](u8 chip) {
     DecoderRegister record{chip, kDecoderStatus, 0};
     EXPECT_EQ(send(video_input, VIN_IOC_READ_TW2815, record), 0);
@@ -156,7 +138,7 @@ TEST_F(Commands, DecodersTellOfCamerasAndInputs) {
   EXPECT_EQ(card::decoder_register(2, 0x3A), 128);
 }
 
-TEST_F(Commands, MotionMapsAndLevels) {
+TEST_F(NodeTest, MotionMapsAndLevels) {
   const std::vector<u16> values(64 * 64, 0x1234);
   const auto level = [&](u32 channel) {
     MotionLevels levels{};
@@ -170,7 +152,7 @@ TEST_F(Commands, MotionMapsAndLevels) {
     long result;
   } cases[] = {{60, 0, 5, 1, values.data(), -EINVAL},  {0, 64, 1, 1, values.data(), -EINVAL},
                {1, 0, ~0u, 1, values.data(), -EINVAL}, {0, 0, 0, 1, values.data(), -EINVAL},
-               {0, 0, 64, 64, nullptr, -EFAULT},       {0, 0, 64, 64, no_access, -EFAULT},
+               {0, 0, 64, 64, nullptr, -EFAULT},       {0, 0, 64, 64, kNowhere, -EFAULT},
                {2, 3, 4, 5, values.data(), 0},         {0, 0, 64, 64, values.data(), 0}};
   for (const auto &[column, row, columns, rows, thresholds, result] : cases) {
     EXPECT_EQ(level(7), power_up) << "before the whole map";

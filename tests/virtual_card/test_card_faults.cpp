@@ -1,15 +1,13 @@
 // The injector and the log.
 
-#include "card_fixture.h"
+#include "node_test.h"
 
 namespace {
 
 using card::Device;
 using card::Operation;
 
-using Faults = CardTest;
-
-TEST_F(Faults, AFaultMatchesItsNodeAndCommandOnly) {
+TEST_F(NodeTest, AFaultMatchesItsNodeAndCommandOnly) {
   u32 word = 0;
   card::inject({Operation::ioctl, 1, true, EIO, Device::none, driver::DISP_IOC_GET_HEIGHT});
   EXPECT_EQ(send(display, driver::DISP_IOC_GET_WIDTH, word), 0);
@@ -20,7 +18,7 @@ TEST_F(Faults, AFaultMatchesItsNodeAndCommandOnly) {
   EXPECT_EQ(card::fault_hits(), 0);
 }
 
-TEST_F(Faults, TheLogTellsEveryCallWithItsRecord) {
+TEST_F(NodeTest, TheLogTellsEveryCallWithItsRecord) {
   card::record_log(true);
   const int fd = open(driver::kVideoInputNode, O_RDWR);
   const u16 thresholds[] = {0x0102, 0x0304};
@@ -73,19 +71,19 @@ TEST_F(Faults, TheLogTellsEveryCallWithItsRecord) {
   ASSERT_EQ(log[1].argument.size(), sizeof map + sizeof thresholds);
   EXPECT_EQ(log[1].argument[4], 2);
   EXPECT_THAT(std::vector<u8>(log[1].argument.end() - 4, log[1].argument.end()),
-              ::testing::ElementsAre(2, 1, 4, 3));
-  EXPECT_THAT(log[2].argument, ::testing::ElementsAre(0x3A, 0, 0, 0, 0xFF, 0, 0, 0)) << "as it came in";
+              testing::ElementsAre(2, 1, 4, 3));
+  EXPECT_THAT(log[2].argument, testing::ElementsAre(0x3A, 0, 0, 0, 0xFF, 0, 0, 0)) << "as it came in";
 }
 
 // Tests that find the card half reset measure the test before them.
-TEST_F(Faults, ResetIsRefusedWhileANodeIsOpenAndForgetsEverythingElse) {
+TEST_F(NodeTest, ResetIsRefusedWhileANodeIsOpenAndForgetsEverythingElse) {
   card::record_log(true);
   card::inject({Operation::ioctl, 1, true});
   card::queue_mpeg4({{1}, 1});
-  ::testing::internal::CaptureStderr();
+  testing::internal::CaptureStderr();
   card::reset();
   card::set_clock(card::ClockMode::real_time);
-  EXPECT_THAT(::testing::internal::GetCapturedStderr(), ::testing::HasSubstr("reset() refused"));
+  EXPECT_THAT(testing::internal::GetCapturedStderr(), testing::HasSubstr("reset() refused"));
   EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), -EIO);
   EXPECT_EQ(card::fault_hits(), 1);
   close_nodes();
@@ -93,7 +91,7 @@ TEST_F(Faults, ResetIsRefusedWhileANodeIsOpenAndForgetsEverythingElse) {
   EXPECT_EQ(card::fault_hits(), 0);
   EXPECT_EQ(card::counters().mpeg4.made, 0u);
   open_nodes();
-  EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0);
+  stop();
   EXPECT_EQ(read_mpeg4(), 0);
 }
 

@@ -5,13 +5,13 @@
 #include <set>
 #include <sstream>
 
-#include "card_fixture.h"
+#include "node_test.h"
 
 namespace {
 
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-using ::testing::SizeIs;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::SizeIs;
 
 std::string output_of(const std::string &command) {
   std::string text;
@@ -58,33 +58,36 @@ TEST(Library, TheCardCallsNoNameThatItTakes) {
   EXPECT_THAT(lines_of(listing, taken), IsEmpty());
 }
 
-/// Runs the probe with the library in front of it; its standard output, or error.
-std::string probe(const std::string &options, const std::string &arguments, bool error = false,
-                  const std::string &other_preloads = "") {
-  return output_of("ASAN_OPTIONS=verify_asan_link_order=0:detect_leaks=0 ZARVO_VIRTUAL_CARD='" + options +
-                   "' LD_PRELOAD='" + CARD_LIBRARY + other_preloads + "' " + CARD_PROBE + " " + arguments +
-                   (error ? " 2>&1 >/dev/null" : " 2>/dev/null"));
+/// What a program prints that knows nothing of the card, with the library in front of it.
+std::string preloaded(const std::string &command, const std::string &options = "",
+                      const std::string &other_libraries = "") {
+  return output_of("export LC_ALL=C ASAN_OPTIONS=verify_asan_link_order=0:detect_leaks=0; " +
+                   ("ZARVO_VIRTUAL_CARD='" + options + "' LD_PRELOAD='" CARD_LIBRARY + other_libraries) +
+                   "' " + command + " 2>&1");
+}
+std::string opened(const std::string &nodes, const std::string &options = "") {
+  return preloaded("head -qc0 " + nodes, options);
 }
 
-// The exact text: a line too many on standard output would end up in a recording's listing.
+// A line too many on standard output would end up in a recording's listing; a list that is passed on puts
+// the card in front of the players.
 TEST(Preload, TheCardIsThereForThisProgramOnlyAndSilent) {
-  EXPECT_EQ(probe("", "/dev/zarvo_enc0 /dev/zarvo_disp0 /dev/zarvo_dec0 /dev/null"),
-            "/dev/zarvo_enc0 opened\n/dev/zarvo_disp0 opened\n/dev/zarvo_dec0 absent\n/dev/null opened\n"
-            "preload \"\"\nchild \"\"\n");
-  const std::string with_others = probe("", "", false, ":libdl.so.2 libm.so.6");
-  EXPECT_THAT(with_others, HasSubstr("child \"libdl.so.2:libm.so.6\"\n"));
+  EXPECT_EQ(opened("/dev/zarvo_enc0 /dev/zarvo_disp0 /dev/null"), "");
+  EXPECT_THAT(opened("/dev/zarvo_dec0"), HasSubstr("No such file"));
+  EXPECT_EQ(preloaded("sh -c 'echo \"<$LD_PRELOAD>\"; env | grep LD_PRELOAD'"), "<>\n");
+  EXPECT_EQ(preloaded("printenv LD_PRELOAD", "", ":libdl.so.2 libm.so.6"), "libdl.so.2:libm.so.6\n");
 }
 
 TEST(Preload, OptionsComeFromTheEnvironment) {
-  EXPECT_THAT(probe("absent", "/dev/zarvo_enc0"), HasSubstr("/dev/zarvo_enc0 absent"));
-  EXPECT_THAT(probe("vanish=0-1000", "/dev/zarvo_enc0"), HasSubstr("/dev/zarvo_enc0 refused"));
-  EXPECT_THAT(probe("lots=3", "/dev/zarvo_enc0"), HasSubstr("/dev/zarvo_enc0 refused"));
-  EXPECT_THAT(probe("lots=3", "/dev/zarvo_enc0 /dev/zarvo_disp0", true),
-              ::testing::MatchesRegex("virtual card: ZARVO_VIRTUAL_CARD: option \"lots\" is unknown; "
-                                      "possible are [^\n]*\n"));
-  EXPECT_THAT(probe("camera2=/no/such.mp4", "/dev/zarvo_enc0", true), HasSubstr("option \"camera2\": "));
-  const std::string file = ::testing::TempDir() + "card_log_" + std::to_string(getpid());
-  probe("log=" + file, "/dev/zarvo_vin0");
+  EXPECT_THAT(opened("/dev/zarvo_enc0", "absent"), HasSubstr("No such file"));
+  EXPECT_THAT(opened("/dev/zarvo_enc0", "vanish=0-1000"), HasSubstr("No such device"));
+  EXPECT_THAT(
+      opened("/dev/zarvo_enc0 /dev/zarvo_disp0", "lots=3"),
+      testing::MatchesRegex("virtual card: ZARVO_VIRTUAL_CARD: option \"lots\" is unknown; possible are "
+                            "[^\n]*\n[^\n]*Invalid argument\n[^\n]*Invalid argument\n"));
+  EXPECT_THAT(opened("/dev/zarvo_enc0", "camera2=/no/such.mp4"), HasSubstr("option \"camera2\": "));
+  const std::string file = testing::TempDir() + "card_log_" + std::to_string(getpid());
+  opened("/dev/zarvo_vin0", "log=" + file);
   EXPECT_THAT(output_of("cat " + file), HasSubstr("video_input open = "));
   unlink(file.c_str());
 }

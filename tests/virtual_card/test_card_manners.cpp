@@ -8,11 +8,9 @@
 #include <set>
 #include <thread>
 
-#include "card_fixture.h"
+#include "node_test.h"
 
 namespace {
-
-using Manners = CardTest;
 
 std::set<std::filesystem::path> tasks() {
   const std::filesystem::directory_iterator all("/proc/self/task");
@@ -28,7 +26,7 @@ bool blocks(const std::filesystem::path &task, int signal) {
 
 // A handler on a card thread runs under the card's locks; one that is left over keeps its host from being
 // single-threaded again.
-TEST_F(Manners, ThreadsTakeNoSignalsAndEndAfterTheLastClose) {
+TEST_F(NodeTest, ThreadsTakeNoSignalsAndEndAfterTheLastClose) {
   close_nodes();
   card::set_clock(card::ClockMode::real_time);
   std::thread([] {}).join();  // a sanitizer brings up a thread of its own with the first
@@ -48,30 +46,28 @@ TEST_F(Manners, ThreadsTakeNoSignalsAndEndAfterTheLastClose) {
   open_and_run();  // at once
   close_nodes();
   EXPECT_TRUE(eventually([&] { return tasks() == before; }));
-  open_and_run();  // after a long rest
+  open_and_run();  // when the threads of before have ended
 }
 
 // Catches: a card that loses memory or threads to a program that closes all numbers and opens the nodes
 // again.
-TEST_F(Manners, ClosingEveryNumberClosesTheCard) {
+TEST_F(NodeTest, ClosingEveryNumberClosesTheCard) {
   for (u8 way = 0; way < 3; ++way) {
+    munmap(region, kRegion);
     if (way == 0) close_range(3, ~0u, 0);
     if (way == 1) closefrom(3);
     for (int fd = 3; fd < 2000; ++fd) close(fd);
     ASSERT_EQ(card::open_descriptors(), 0) << int{way};
     open_nodes();
     EXPECT_EQ(answer(ftruncate(encoder, 0)), -EPERM);
-    auto *area = static_cast<u8 *>(
-        mmap(nullptr, driver::kStreamRegionSize, PROT_READ | PROT_WRITE, MAP_SHARED, encoder, 0));
     card::queue_mpeg4({{way, 2, 3}, 64});
     EXPECT_EQ(read_mpeg4(), 64);
-    EXPECT_EQ(area[0], way);
-    munmap(area, driver::kStreamRegionSize);
+    EXPECT_EQ(region[0], way);
   }
 }
 
 // No fork handler runs for such a child, which has the parent's memory: a close there is not the parent's.
-TEST_F(Manners, AVforkChildDoesNotTouchTheParentsCard) {
+TEST_F(NodeTest, AVforkChildDoesNotTouchTheParentsCard) {
   const pid_t child = vfork();
   if (child == 0) {
     dup2(display, audio);  // NOLINT(clang-analyzer-unix.Vfork): a child may well do it
@@ -79,17 +75,17 @@ TEST_F(Manners, AVforkChildDoesNotTouchTheParentsCard) {
   }
   ASSERT_EQ(waitpid(child, nullptr, 0), child);
   EXPECT_EQ(card::open_descriptors(), 4);
-  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+  start();
 }
 
 // A system without a thread to spare must not end the host.
-TEST_F(Manners, ThreadsThatCannotBeHadAreAnErrorOrDoneWithout) {
+TEST_F(NodeTest, ThreadsThatCannotBeHadAreAnErrorOrDoneWithout) {
   pthread_attr_t usual, impossible;
   for (pthread_attr_t *each : {&usual, &impossible}) pthread_getattr_default_np(each);
   pthread_attr_setstacksize(&impossible, std::size_t{1} << 46);
   ASSERT_EQ(pthread_setattr_default_np(&impossible), 0);
   for (const u32 channel : {0u, 1u}) encode_channel(channel);
-  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+  start();
   card::advance_frames(1);
   EXPECT_EQ(card::counters().mpeg4.made, 2u);
   close_nodes();

@@ -1,39 +1,17 @@
 // Frames on their way to the host: order, bounds, losses, waits, supplies.
 
-#include <cstring>
-
-#include "card_fixture.h"
+#include "node_test.h"
 
 namespace {
 
 using card::ReadyFrame;
-using ::testing::Each;
-using ::testing::ElementsAre;
-
-class Streams : public CardTest {
- protected:
-  void SetUp() override {
-    CardTest::SetUp();
-    region = static_cast<u8 *>(
-        mmap(nullptr, driver::kStreamRegionSize, PROT_READ | PROT_WRITE, MAP_SHARED, encoder, 0));
-    ASSERT_NE(region, MAP_FAILED);
-  }
-  void TearDown() override {
-    munmap(region, driver::kStreamRegionSize);
-    CardTest::TearDown();
-  }
-  std::vector<u8> area(std::size_t offset, std::size_t size) {
-    return {region + offset, region + offset + size};
-  }
-  long read_audio(void *buffer) { return read_node(audio, buffer, driver::kAudioReadCount); }
-
-  u8 *region = nullptr;
-};
+using testing::Each;
+using testing::ElementsAre;
 
 constexpr std::size_t kJpegStart = driver::kMjpegAreaOffset + driver::kMjpegDescriptorOffset;
 
 // The descriptors byte by byte, written by hand: a host parses exactly these.
-TEST_F(Streams, ReadyFramesCarryRightDescriptors) {
+TEST_F(NodeTest, ReadyFramesCarryRightDescriptors) {
   card::queue_mpeg4(card::mpeg4_frame(11, 2, std::vector<u8>(0x12345, 0xAB), 3000005us));
   EXPECT_GT(read_mpeg4(), 0);
   EXPECT_THAT(area(0, 4), ElementsAre(0x45, 0x23, 0x81, 0x0B));
@@ -47,7 +25,7 @@ TEST_F(Streams, ReadyFramesCarryRightDescriptors) {
 }
 
 // A card that lies is played as it is told to, but only inside its own regions.
-TEST_F(Streams, NothingIsCheckedAndNothingOverflows) {
+TEST_F(NodeTest, ReadyFramesAreNotCheckedAndDoNotOverflow) {
   card::queue_mpeg4({std::vector<u8>(driver::kMpeg4AreaSize + 5000, 1), 3L << 20});
   card::queue_mjpeg({std::vector<u8>(driver::kMjpegAreaSize, 2), -100000});
   card::queue_mpeg4({{}, -EIO});
@@ -61,7 +39,7 @@ TEST_F(Streams, NothingIsCheckedAndNothingOverflows) {
   EXPECT_EQ(read_node(video_input, nullptr, 4), -EINVAL);
 }
 
-TEST_F(Streams, AudioGoesToTheHostsBuffer) {
+TEST_F(NodeTest, AudioGoesToTheHostsBuffer) {
   std::array<u8, 256> buffer{};
   card::queue_audio({std::vector<u8>(200, 9), 4});
   EXPECT_EQ(read_audio(buffer.data()), 4);
@@ -72,14 +50,14 @@ TEST_F(Streams, AudioGoesToTheHostsBuffer) {
 }
 
 // The host's slowness must never hold up the card, only cost frames, and each of them is counted.
-TEST_F(Streams, AHostThatDoesNotReadLosesFrames) {
+TEST_F(NodeTest, AHostThatDoesNotReadLosesFrames) {
   card::Supply supply;
   supply.mpeg4 = {card::mpeg4_frame(0, 0, std::vector<u8>(1 << 20, 1))};
   supply.audio = {{std::vector<u8>(192), 4}};
   supply.video_rate = 10;
   supply.audio_rate = 62.5;
   card::set_supply(supply);
-  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+  start();
   card::advance(4s);
   EXPECT_EQ(card::counters().mpeg4.made, 40u);
   EXPECT_EQ(card::counters().mpeg4.lost, 37u);
@@ -87,7 +65,7 @@ TEST_F(Streams, AHostThatDoesNotReadLosesFrames) {
   EXPECT_EQ(card::counters().audio.lost, 250u - 64u);
 }
 
-TEST_F(Streams, ASupplyIsDeliveredRoundAndRoundUpToItsLimit) {
+TEST_F(NodeTest, ASupplyIsDeliveredRoundAndRoundUpToItsLimit) {
   for (const double rate : {0.0, 100.0}) {
     card::Supply supply;
     supply.mpeg4 = {card::mpeg4_frame(1, 0, {1}), card::mpeg4_frame(2, 1, {2}), card::mpeg4_frame(3, 1, {3})};
@@ -95,21 +73,21 @@ TEST_F(Streams, ASupplyIsDeliveredRoundAndRoundUpToItsLimit) {
     supply.limit = 7;
     card::set_supply(supply);
     EXPECT_EQ(read_mpeg4(), 0) << "before the start";
-    EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+    start();
     card::advance(1s);
     std::vector<int> channels;
     while (read_mpeg4() > 0) channels.push_back(region[3] & 0xF);
     EXPECT_THAT(channels, ElementsAre(1, 2, 3, 1, 2, 3, 1));
-    EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0);
+    stop();
   }
   EXPECT_EQ(card::counters().mpeg4.delivered, 14u);
   EXPECT_EQ(card::counters().mjpeg.made, 0u) << "the card's own encoders rest meanwhile";
   card::clear_supply();
   encode_channel(0);
-  EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0);
+  start();
   card::advance_frames(2);
   EXPECT_EQ(card::counters().mjpeg.made, 2u);
-  EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0);
+  stop();
   EXPECT_EQ(read_mjpeg(), 0) << "a stop forgets what was encoded";
 }
 

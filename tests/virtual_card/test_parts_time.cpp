@@ -13,7 +13,7 @@ using virtual_card::ReadyFrame;
 
 namespace {
 
-TEST(FieldSchedule, StayExactOverYears) {
+TEST(FieldSchedule, StaysExactOverYears) {
   FieldSchedule schedule;
   for (const std::int64_t round : {1, 90, 24 * 3600, 300000}) {
     EXPECT_EQ(schedule.due(60000 * round), 1001s * round);

@@ -1,11 +1,12 @@
-#include <gtest/gtest.h>
+// The sound of the four inputs, decoded.
 
 #include <numbers>
 
 #include "picture/audio_encoder.h"
-#include "picture_bench.h"
+#include "picture_test.h"
 
-namespace virtual_card {
+using card::kAudioInputs, card::kSampleRate, card::tone_frequency;
+
 namespace {
 
 /// Strength of one frequency in the samples.
@@ -20,14 +21,13 @@ double strength(const std::vector<std::int16_t> &samples, unsigned frequency) {
 }
 
 // Blocks of another size or packing, inputs mixed up, an encoder that starts afresh at every block.
-TEST(Audio, EveryInputDecodesToItsOwnToneOrToSilence) {
-  PictureBench bench;
+TEST_F(PictureTest, EveryAudioInputDecodesToItsOwnToneOrToSilence) {
   constexpr unsigned kSilent = 2;
-  bench.state.sound_present = 0xF & ~(1u << kSilent);
+  state.sound_present = 0xF & ~(1u << kSilent);
   std::array<std::vector<u8>, kAudioInputs> streams;
   for (int block = 0; block < 125; ++block) {
-    bench.engine.audio_block(bench.state, block);
-    const auto ready = bench.audio.pop(std::chrono::microseconds{0});
+    engine.audio_block(state, block);
+    const auto ready = audio.pop(std::chrono::microseconds{0});
     ASSERT_TRUE(ready);
     ASSERT_EQ(ready->area.size(), kAudioInputs * driver::kAudioBlockSize);
     EXPECT_GT(ready->result, 0);
@@ -49,4 +49,3 @@ TEST(Audio, EveryInputDecodesToItsOwnToneOrToSilence) {
 }
 
 }  // namespace
-}  // namespace virtual_card

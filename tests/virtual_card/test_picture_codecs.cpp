@@ -1,50 +1,49 @@
-#include <gtest/gtest.h>
+// The two video streams, decoded: formats, intervals, times, settings.
 
 #include <algorithm>
 
 #include "picture/encoded_picture.h"
-#include "picture_bench.h"
+#include "picture_test.h"
 
-namespace virtual_card {
 namespace {
 
-constexpr u32 kHalfD1 = 1, kCif = 2, kD1 = 9, kDropMode = 0x200;
+constexpr u32 kDropMode = 0x200;
 
 struct Format {
   u32 scale_code, standard, input_width;
   u32 width, height;
+
+  bool interlaced() const { return scale_code == kD1; }
+  u32 interval() const { return interlaced() ? 0 : 1; }
 };
 
-class EveryFormat : public testing::TestWithParam<Format> {
+class EveryFormat : public PictureTest, public testing::WithParamInterface<Format> {
  protected:
   EveryFormat() {
-    bench_.state.standard = GetParam().standard;
-    bench_.state.width = GetParam().input_width;
+    state.standard = GetParam().standard;
+    state.width = GetParam().input_width;
   }
-  const bool interlaced_ = GetParam().scale_code == kD1;
-  const u32 interval_ = interlaced_ ? 0 : 1;
-  PictureBench bench_;
 };
 
 // A header that does not match the stream, a frame out of order or of another channel, a drifting
 // prediction, fields the wrong way up.
 TEST_P(EveryFormat, BothStreamsDecodeBehindTheHostsHeaders) {
   const Format &format = GetParam();
-  bench_.encode(11, format.scale_code, interval_, 7, 3);
-  bench_.fields(40);
-  const auto mpeg4 = bench_.take_mpeg4();
-  const auto jpeg = bench_.take_jpeg();
-  ASSERT_EQ(mpeg4.size(), 20u);
+  encode(11, format.scale_code, format.interval(), 7, 3);
+  fields(40);
+  const auto frames = take_mpeg4();
+  const auto jpeg = take_jpeg();
+  ASSERT_EQ(frames.size(), 20u);
   ASSERT_EQ(jpeg.size(), 20u);
-  const auto pictures = decode_mpeg4(mpeg4, format.width, format.height, interlaced_);
+  const auto pictures = decode_mpeg4(frames, format.width, format.height, format.interlaced());
   for (u32 i = 0; i < 20; ++i) {
     const Decoded still = decode_jpeg(jpeg[i]);
     for (const Decoded *picture : {&pictures[i], &still}) {
       ASSERT_EQ(std::pair(picture->width, picture->height), std::pair(format.width, format.height));
       ASSERT_EQ(picture->mark(), (FrameMark{11, i, false})) << "frame " << i;
     }
-    EXPECT_TRUE(pictures[i].intra == (i % 7 == 0) && mpeg4[i].intra == pictures[i].intra);
-    EXPECT_EQ(pictures[i].interlaced, interlaced_);
+    EXPECT_TRUE(pictures[i].intra == (i % 7 == 0) && frames[i].intra == pictures[i].intra);
+    EXPECT_EQ(pictures[i].interlaced, format.interlaced());
     EXPECT_TRUE(near(pictures[i].at(85, 60), still.at(85, 60)) &&
                 near(pictures[i].at(18, 5), still.at(18, 5)));
   }
@@ -54,17 +53,16 @@ TEST_P(EveryFormat, BothStreamsDecodeBehindTheHostsHeaders) {
 TEST_P(EveryFormat, CoarseStreamsAreSmallerAndKeepTheMark) {
   const Format &format = GetParam();
   const auto sizes = [&](u32 qp, u32 quality_word) {
-    bench_.state.mjpeg_quality = quality_word;
-    bench_.encode(2, format.scale_code, interval_, 5, qp);
-    bench_.fields(10);
-    const auto mpeg4 = bench_.take_mpeg4();
-    const auto jpeg = bench_.take_jpeg();
-    EXPECT_TRUE(mpeg4.at(0).intra);
-    const u32 frame = static_cast<u32>(bench_.next / 2 - 5);
-    EXPECT_EQ(decode_mpeg4(mpeg4, format.width, format.height, interlaced_).at(0).mark(),
-              (FrameMark{2, frame, false}));
-    EXPECT_EQ(decode_jpeg(jpeg.at(0)).mark(), (FrameMark{2, frame, false}));
-    return std::pair(mpeg4[0].bytes.size(), jpeg[0].bytes.size());
+    state.mjpeg_quality = quality_word;
+    encode(2, format.scale_code, format.interval(), 5, qp);
+    fields(10);
+    const auto frames = take_mpeg4();
+    const auto jpeg = take_jpeg();
+    EXPECT_TRUE(frames.at(0).intra);
+    const FrameMark first{2, static_cast<u32>(next / 2 - 5), false};
+    EXPECT_EQ(decode_mpeg4(frames, format.width, format.height, format.interlaced()).at(0).mark(), first);
+    EXPECT_EQ(decode_jpeg(jpeg.at(0)).mark(), first);
+    return std::pair(frames[0].bytes.size(), jpeg[0].bytes.size());
   };
   const auto fine = sizes(2, driver::kMjpegFine);
   const auto coarse = sizes(31, driver::kMjpegCoarse);
@@ -78,7 +76,7 @@ INSTANTIATE_TEST_SUITE_P(Formats, EveryFormat,
                                          Format{kCif, 0, 704, 352, 240}, Format{kD1, 1, 704, 704, 576}));
 
 // A rate that is off by one, or counts frames where it should count fields.
-TEST(Intervals, PicturesIn600Frames) {
+TEST_F(PictureTest, IntervalsPickTheirShareOf600Frames) {
   const struct {
     u32 code;
     int one_field, interlaced;
@@ -93,21 +91,20 @@ TEST(Intervals, PicturesIn600Frames) {
   for (const auto &interval : intervals) {
     int one_field = 0, interlaced = 0;
     for (std::int64_t field = 0; field < 1200; ++field) {
-      if (picture_due(interval.code, false, field)) ++one_field;
-      if (picture_due(interval.code, true, field)) ++interlaced;
+      if (card::picture_due(interval.code, false, field)) ++one_field;
+      if (card::picture_due(interval.code, true, field)) ++interlaced;
     }
     EXPECT_NEAR(one_field, interval.one_field, 1) << "code " << interval.code;
     EXPECT_EQ(interlaced, interval.interlaced) << "code " << interval.code;
-    EXPECT_NEAR(picture_rate(interval.code, false, 1), interval.one_field / 24.0, 0.1);
+    EXPECT_NEAR(card::picture_rate(interval.code, false, 1), interval.one_field / 24.0, 0.1);
   }
 }
 
 // Two-field streams that hold one field twice, and times that are not the fields' own.
-TEST(Intervals, TwoFieldStreamHoldsBothFieldsInOrder) {
-  PictureBench bench;
-  bench.encode(0, kCif, 0);
-  bench.fields(8);
-  const auto frames = bench.take_mpeg4();
+TEST_F(PictureTest, TwoFieldStreamHoldsBothFieldsInOrder) {
+  encode(0, kCif, 0);
+  fields(8);
+  const auto frames = take_mpeg4();
   const auto pictures = decode_mpeg4(frames, 352, 240, false);
   ASSERT_EQ(pictures.size(), 8u);
   for (u32 i = 0; i < 8; ++i) {
@@ -117,12 +114,12 @@ TEST(Intervals, TwoFieldStreamHoldsBothFieldsInOrder) {
 }
 
 // Picture times that run backwards where a second begins with an intra frame.
-TEST(Mpeg4, EachSecondIsCountedOnceWhereverItBegins) {
+TEST_F(PictureTest, EachSecondIsCountedOnceWhereverItBegins) {
   for (const u32 gop : {1u, 10u}) {
-    PictureBench bench;
-    bench.encode(3, kCif, 1, gop);
-    bench.fields(2 * 70);
-    const auto frames = bench.take_mpeg4();
+    power_up();
+    encode(3, kCif, 1, gop);
+    fields(2 * 70);
+    const auto frames = take_mpeg4();
     std::size_t seconds = 0;
     for (std::size_t i = 0; i < frames.size(); ++i) {
       const std::vector<u8> &bytes = frames[i].bytes;
@@ -134,54 +131,53 @@ TEST(Mpeg4, EachSecondIsCountedOnceWhereverItBegins) {
 }
 
 // Settings that take effect late, or leave the host with frames that build on another stream.
-TEST(Mpeg4, ChangedSettingsAndRestartsBeginWithAnIntraFrame) {
-  PictureBench bench;
-  bench.encode(0, kCif, 1, 100, 8);
+TEST_F(PictureTest, ChangedSettingsAndRestartsBeginWithAnIntraFrame) {
+  encode(0, kCif, 1, 100, 8);
   const auto first_intra = [&] {
-    bench.fields(4);
-    const auto frames = bench.take_mpeg4();
+    fields(4);
+    const auto frames = take_mpeg4();
     EXPECT_EQ(frames.size(), 2u);
     EXPECT_FALSE(frames.at(1).intra);
     return frames.at(0).intra;
   };
   EXPECT_TRUE(first_intra());
   EXPECT_FALSE(first_intra());
-  bench.state.channel[0].encoder.qp = 20;
+  state.channel[0].encoder.qp = 20;
   EXPECT_TRUE(first_intra());
-  bench.state.encoding = false;
-  bench.fields(2);
-  EXPECT_TRUE(bench.take_mpeg4().empty());
-  bench.state.encoding = true;
+  state.encoding = false;
+  fields(2);
+  EXPECT_TRUE(take_mpeg4().empty());
+  state.encoding = true;
   EXPECT_TRUE(first_intra());
-  bench.engine.reset();
+  engine.reset();
   EXPECT_TRUE(first_intra());
 }
 
 // A bit rate that ignores the channel's own frame rate, and a range that constant bit rate ignores.
-TEST(Mpeg4, ConstantBitRateHoldsAtAnyFrameRate) {
-  const auto bits_a_second = [](u32 interval, u32 rate, u32 least_quantiser) {
-    PictureBench bench;
-    bench.encode(0, kCif, interval, 15);
-    bench.state.channel[0].encoder.cbr = {0, rate, 1};
-    if (least_quantiser != 0) bench.state.channel[0].encoder.qp_range = {0, 29, least_quantiser, 1};
-    bench.fields(300);
+TEST_F(PictureTest, ConstantBitRateHoldsAtAnyFrameRate) {
+  const auto bits_a_second = [&](u32 interval, u32 rate, u32 least_quantiser) {
+    power_up();
+    encode(0, kCif, interval, 15);
+    state.channel[0].encoder.cbr = {0, rate, 1};
+    if (least_quantiser != 0) state.channel[0].encoder.qp_range = {0, 29, least_quantiser, 1};
+    fields(300);
     double bits = 0;
-    for (const Encoded &frame : bench.take_mpeg4()) bits += 8.0 * static_cast<double>(frame.bytes.size());
-    return bits / (300 * video_standard(bench.state.standard).field_seconds());
+    for (const Encoded &frame : take_mpeg4()) bits += 8.0 * static_cast<double>(frame.bytes.size());
+    return bits / (300 * card::video_standard(state.standard).field_seconds());
   };
   EXPECT_NEAR(bits_a_second(1, 262144, 0), 262144, 262144 * 0.25);
   EXPECT_NEAR(bits_a_second(3, 262144, 0), 262144, 262144 * 0.25);
   EXPECT_LT(bits_a_second(1, 1048576, 20), 524288 / 2);
 }
 
-// Results that depend on which worker was first.
-TEST(Streams, TwoEnginesMakeTheSameBytes) {
-  const auto run = [] {
-    PictureBench bench;
-    for (unsigned i = 0; i < kChannels; ++i) bench.encode(i, i % 4 == 0 ? kD1 : kCif, i % 3, 4);
-    bench.fields(12);
+// Results that depend on which worker was first, and a power-up that keeps something.
+TEST_F(PictureTest, EveryPowerUpMakesTheSameBytes) {
+  const auto run = [&] {
+    power_up();
+    for (unsigned i = 0; i < card::kChannels; ++i) encode(i, i % 4 == 0 ? kD1 : kCif, i % 3, 4);
+    fields(12);
     std::vector<std::vector<u8>> bytes;
-    for (const auto &stream : {bench.take_mpeg4(), bench.take_jpeg()}) {
+    for (const auto &stream : {take_mpeg4(), take_jpeg()}) {
       for (const Encoded &frame : stream) bytes.push_back(frame.bytes);
     }
     return bytes;
@@ -192,16 +188,14 @@ TEST(Streams, TwoEnginesMakeTheSameBytes) {
 }
 
 // A burnt-in number that shows up in the preview or at a neighbour.
-TEST(Streams, NumberOverlayIsInTheEncodedPicturesOnly) {
-  PictureBench bench;
-  for (const unsigned channel : {4u, 5u}) bench.encode(channel, kHalfD1, 1);
-  bench.state.channel[4].encoder.number_overlay = true;
-  bench.window(4, {0, 0, 720, 480});
-  const Colour with = bench.look(4).at(2, 4), without = bench.look(5).at(2, 4);  // left of the figures
-  bench.compose();
-  EXPECT_TRUE(near(with, kBlack) && !near(without, kBlack));
-  EXPECT_TRUE(near(bench.pixel(14, 19), without));
+TEST_F(PictureTest, NumberOverlayIsInTheEncodedPicturesOnly) {
+  for (const unsigned channel : {4u, 5u}) encode(channel, kHalfD1, 1);
+  state.channel[4].encoder.number_overlay = true;
+  window(4, {0, 0, 720, 480});
+  const Colour with = look(4).at(2, 4), without = look(5).at(2, 4);  // left of the figures
+  compose();
+  EXPECT_TRUE(near(with, card::kBlack) && !near(without, card::kBlack));
+  EXPECT_TRUE(near(pixel(14, 19), without));
 }
 
 }  // namespace
-}  // namespace virtual_card

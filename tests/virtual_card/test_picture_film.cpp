@@ -1,35 +1,29 @@
-#include <gtest/gtest.h>
+// Films in front of a camera.
 
 #include <filesystem>
 #include <fstream>
 
 #include "picture/film.h"
-#include "picture_bench.h"
+#include "picture_test.h"
 
-namespace virtual_card {
 namespace {
-
-constexpr u32 kCif = 2;
 
 /// Luma of frame n of the clip.
 constexpr u8 level(int frame) {
   return static_cast<u8>(40 + 30 * frame);
 }
 
-class Films : public testing::Test {
- protected:
-  Films() : folder_(std::filesystem::temp_directory_path() / ("films" + std::to_string(getpid()))) {
-    std::filesystem::create_directories(folder_);
-  }
-  ~Films() override { std::filesystem::remove_all(folder_); }
+/// A folder of film files.
+struct Folder {
+  Folder() { std::filesystem::create_directories(path); }
+  ~Folder() { std::filesystem::remove_all(path); }
 
-  std::string file(const std::string &name, const std::string &bytes) {
-    const auto path = folder_ / name;
-    std::ofstream(path, std::ios::binary) << bytes;
-    return path.string();
+  std::string file(const std::string &name, const std::string &bytes) const {
+    std::ofstream(path / name, std::ios::binary) << bytes;
+    return path / name;
   }
   /// A clip of plain frames, each lighter than the one before.
-  std::string clip(int frames, int rate) {
+  std::string clip(int frames, int rate) const {
     std::string bytes = "YUV4MPEG2 W64 H48 F" + std::to_string(rate) + ":1 Ip A1:1 C420mpeg2\n";
     for (int i = 0; i < frames; ++i) {
       bytes += "FRAME\n" + std::string(64 * 48, static_cast<char>(level(i))) + std::string(32 * 24, '\x60') +
@@ -38,16 +32,16 @@ class Films : public testing::Test {
     return file("clip.y4m", bytes);
   }
 
-  std::filesystem::path folder_;
-  PictureBench bench_;
+  const std::filesystem::path path =
+      std::filesystem::temp_directory_path() / ("films" + std::to_string(getpid()));
 };
 
 // A film at the card's speed instead of its own, a loop with a gap or a frame twice, and a card that
 // was busy elsewhere for hours.
-TEST_F(Films, RunAtTheirOwnSpeedAndLoopWithoutASeam) {
-  const auto film = Film::open(clip(6, 10), nullptr);
+TEST_F(PictureTest, FilmsRunAtTheirOwnSpeedAndLoopWithoutASeam) {
+  const auto film = card::Film::open(Folder().clip(6, 10), nullptr);
   ASSERT_TRUE(film);
-  Picture picture;
+  card::Picture picture;
   picture.resize(720, 480);
   const auto shown = [&](double seconds) {
     film->seek(seconds);
@@ -66,51 +60,53 @@ TEST_F(Films, RunAtTheirOwnSpeedAndLoopWithoutASeam) {
 }
 
 // A film that the drawn camera shines through, that escapes mask and properties, or comes and goes late.
-TEST_F(Films, StandInFrontOfTheirCameraOnly) {
-  for (const unsigned channel : {2u, 3u}) bench_.encode(channel, kCif, 1);
-  bench_.state.channel[2].mask = {2, 0, 360, 0, 240};
-  bench_.state.channel[2].picture.saturation = 0;
+TEST_F(PictureTest, FilmsStandInFrontOfTheirCameraOnly) {
+  for (const unsigned channel : {2u, 3u}) encode(channel, kCif, 1);
+  state.channel[2].mask = {2, 0, 360, 0, 240};
+  state.channel[2].picture.saturation = 0;
+  const Folder folder;
   std::string error;
-  ASSERT_TRUE(bench_.engine.show_film(2, clip(1, 25), &error)) << error;
-  const Decoded film = bench_.look(2);
+  ASSERT_TRUE(engine.show_film(2, folder.clip(1, 25), &error)) << error;
+  const Decoded film = look(2);
   EXPECT_TRUE(near(film.at(75, 75), {level(0), 128, 128}));
   EXPECT_TRUE(near(film.at(75, 2), {level(0), 128, 128}));
-  EXPECT_TRUE(near(film.at(25, 25), kMaskGrey));
+  EXPECT_TRUE(near(film.at(25, 25), card::kMaskGrey));
   EXPECT_FALSE(film.mark());
-  EXPECT_EQ(bench_.look(3).mark()->channel, 3u);
-  bench_.state.channel[2].lost = true;
-  EXPECT_TRUE(near(bench_.look(2).at(75, 75), kLostBlue));
-  bench_.state.channel[2].lost = false;
-  EXPECT_TRUE(near(bench_.look(2).at(75, 75), {level(0), 128, 128}));
-  ASSERT_TRUE(bench_.engine.show_film(2, "", &error));
-  bench_.state.channel[2].mask = {};
-  EXPECT_EQ(bench_.look(2).mark()->channel, 2u);
+  EXPECT_EQ(look(3).mark()->channel, 3u);
+  state.channel[2].lost = true;
+  EXPECT_TRUE(near(look(2).at(75, 75), card::kLostBlue));
+  state.channel[2].lost = false;
+  EXPECT_TRUE(near(look(2).at(75, 75), {level(0), 128, 128}));
+  ASSERT_TRUE(engine.show_film(2, "", &error));
+  state.channel[2].mask = {};
+  EXPECT_EQ(look(2).mark()->channel, 2u);
 }
 
-TEST_F(Films, MovementInAFilmIsMotion) {
-  bench_.state.motion_enable = 0x30;
-  ASSERT_TRUE(bench_.engine.show_film(4, clip(6, 10), nullptr));
-  bench_.fields(18);
-  EXPECT_EQ(bench_.engine.motion() & 0x10, 0x10u);
-  ASSERT_TRUE(bench_.engine.show_film(5, clip(1, 25), nullptr));
-  bench_.fields(60);
-  EXPECT_EQ(bench_.engine.motion() & 0x20, 0u);
+TEST_F(PictureTest, MovementInAFilmIsMotion) {
+  const Folder folder;
+  state.motion_enable = 0x30;
+  ASSERT_TRUE(engine.show_film(4, folder.clip(6, 10), nullptr));
+  fields(18);
+  EXPECT_EQ(engine.motion() & 0x10, 0x10u);
+  ASSERT_TRUE(engine.show_film(5, folder.clip(1, 25), nullptr));
+  fields(60);
+  EXPECT_EQ(engine.motion() & 0x20, 0u);
 }
 
-TEST_F(Films, BadFilesAreRefusedWithAReasonAndTheCameraStays) {
-  bench_.encode(0, kCif, 1);
-  const std::string files[] = {(folder_ / "missing.mp4").string(), folder_.string(), file("empty.avi", ""),
-                               file("text.mp4", "no film, but words"),
-                               file("short.y4m", "YUV4MPEG2 W64 H48 F10:1 Ip A1:1 C420\nFRAME\nabc")};
+TEST_F(PictureTest, BadFilmsAreRefusedWithAReasonAndTheCameraStays) {
+  encode(0, kCif, 1);
+  const Folder folder;
+  const std::string files[] = {folder.path / "missing.mp4", folder.path, folder.file("empty.avi", ""),
+                               folder.file("text.mp4", "no film, but words"),
+                               folder.file("short.y4m", "YUV4MPEG2 W64 H48 F10:1 Ip A1:1 C420\nFRAME\nabc")};
   for (const std::string &path : files) {
     std::string error;
-    EXPECT_FALSE(bench_.engine.show_film(0, path, &error)) << path;
+    EXPECT_FALSE(engine.show_film(0, path, &error)) << path;
     EXPECT_EQ(error.rfind(path + ": ", 0), 0u) << error;
     EXPECT_GT(error.size(), path.size() + 4);
   }
-  EXPECT_FALSE(bench_.engine.show_film(16, clip(2, 25), nullptr));
-  EXPECT_TRUE(bench_.look(0).mark());
+  EXPECT_FALSE(engine.show_film(16, folder.clip(2, 25), nullptr));
+  EXPECT_TRUE(look(0).mark());
 }
 
 }  // namespace
-}  // namespace virtual_card

@@ -1,23 +1,16 @@
-#include <gtest/gtest.h>
+// The composed preview picture.
 
 #include "picture/compositor.h"
-#include "picture_bench.h"
+#include "picture_test.h"
 
-namespace virtual_card {
 namespace {
 
-struct Layout {
-  const char *name;
-  u32 standard, width;
-  u32 divisions;
-  bool large;  ///< the first window takes all but the last column and row
-};
-
-class Preview : public testing::Test {
+class PreviewTest : public PictureTest {
  protected:
-  /// Lays windows out as the host does: cells of whole multiples of 8, the large window first.
+  /// Lays windows out as the host does: cells of whole multiples of 8, the first window large: it takes all
+  /// but the last column and row.
   std::vector<Area> lay_out(u32 div, bool large) {
-    const u32 cell_width = bench_.state.width / div & ~7u, cell_lines = bench_.state.lines() / div & ~7u;
+    const u32 cell_width = state.width / div & ~7u, cell_lines = state.lines() / div & ~7u;
     std::vector<Area> areas;
     if (large) areas.push_back({0, 0, cell_width * (div - 1), cell_lines * (div - 1)});
     for (u32 cell = 0; cell < div * div; ++cell) {
@@ -26,7 +19,7 @@ class Preview : public testing::Test {
       const u32 x = column * cell_width, y = row * cell_lines;
       areas.push_back({x, y, x + cell_width, y + cell_lines});
     }
-    for (unsigned i = 0; i < areas.size(); ++i) bench_.window(i, areas[i]);
+    for (unsigned i = 0; i < areas.size(); ++i) window(i, areas[i]);
     return areas;
   }
   /// The mark of the camera shown in an area of the preview. The wide input's margins go first.
@@ -34,141 +27,136 @@ class Preview : public testing::Test {
     const u32 width = area.x_end - area.x_start, lines = area.y_end - area.y_start;
     // Brought to the size of a narrow picture of one field, which the reader knows.
     constexpr u32 kWidth = 704;
-    const u32 height = bench_.state.lines() / 2, margin = (bench_.state.width - kWidth) / 2;
+    const u32 height = state.lines() / 2, margin = (state.width - kWidth) / 2;
     std::vector<u8> luma(std::size_t{kWidth} * height);
     for (u32 i = 0; i < luma.size(); ++i) {
-      const u32 x = (i % kWidth + margin) * width / bench_.state.width, y = i / kWidth * lines / height;
-      luma[i] = bench_.pixel(area.x_start + x, area.y_start + y).y;
+      const u32 x = (i % kWidth + margin) * width / state.width, y = i / kWidth * lines / height;
+      luma[i] = pixel(area.x_start + x, area.y_start + y).y;
     }
-    return read_frame_mark(luma.data(), kWidth, kWidth, height);
+    return card::read_frame_mark(luma.data(), kWidth, kWidth, height);
   }
   unsigned channel_in(Area area) const {
     const auto mark = mark_in(area);
-    return mark ? mark->channel : kChannels;
+    return mark ? mark->channel : card::kChannels;
   }
-
-  PictureBench bench_;
 };
 
-class EveryLayout : public Preview, public testing::WithParamInterface<Layout> {};
-
 // Cameras in the wrong windows, cut off or shifted in them; a focus that is drawn in the old window.
-TEST_P(EveryLayout, EveryWindowShowsTheWholeOfItsRoutedCamera) {
-  bench_.state.standard = GetParam().standard;
-  bench_.state.width = GetParam().width;
-  const auto areas = lay_out(GetParam().divisions, GetParam().large);
-  std::swap(bench_.state.display.routing[0], bench_.state.display.routing[12]);
-  bench_.fields(8);
-  bench_.compose();
-  for (unsigned i = 0; i < areas.size(); ++i) {
-    EXPECT_EQ(channel_in(areas[i]), bench_.state.display.routing[i]) << "window " << i;
-    const auto [x, y, x_end, y_end] = areas[i];
-    const Colour left = bench_.pixel(x + (x_end - x) / 16, y + (y_end - y) / 16);
-    const Colour right = bench_.pixel(x_end - 2, y + (y_end - y) / 16);
-    EXPECT_TRUE(near(left, {180, 128, 128}, 3) && near(right, kBlack, 3)) << "bars of window " << i;
+TEST_F(PreviewTest, EveryWindowShowsTheWholeOfItsRoutedCamera) {
+  const struct {
+    u32 standard, width, divisions;
+    bool large;
+  } layouts[] = {{0, 720, 1, false}, {0, 720, 2, false}, {0, 720, 3, true}, {0, 720, 4, true},
+                 {0, 720, 3, false}, {0, 720, 4, false}, {1, 720, 3, true}, {1, 704, 4, false}};
+  for (const auto &layout : layouts) {
+    SCOPED_TRACE(&layout - layouts);
+    power_up();
+    state.standard = layout.standard;
+    state.width = layout.width;
+    const auto areas = lay_out(layout.divisions, layout.large);
+    std::swap(state.display.routing[0], state.display.routing[12]);
+    fields(8);
+    compose();
+    for (unsigned i = 0; i < areas.size(); ++i) {
+      EXPECT_EQ(channel_in(areas[i]), state.display.routing[i]) << "window " << i;
+      const auto [x, y, x_end, y_end] = areas[i];
+      const Colour left = pixel(x + (x_end - x) / 16, y + (y_end - y) / 16);
+      const Colour right = pixel(x_end - 2, y + (y_end - y) / 16);
+      EXPECT_TRUE(near(left, {180, 128, 128}, 3) && near(right, card::kBlack, 3)) << "window " << i;
+    }
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Layouts, EveryLayout,
-                         testing::Values(Layout{"One", 0, 720, 1, false}, Layout{"Four", 0, 720, 2, false},
-                                         Layout{"Six", 0, 720, 3, true}, Layout{"Eight", 0, 720, 4, true},
-                                         Layout{"Nine", 0, 720, 3, false},
-                                         Layout{"Sixteen", 0, 720, 4, false},
-                                         Layout{"SixPal", 1, 720, 3, true},
-                                         Layout{"SixteenPal", 1, 704, 4, false}),
-                         [](const auto &test) { return test.param.name; });
-
-TEST_F(Preview, OffLostAndUnusedPartsAreBlackAndBlue) {
-  bench_.state.channel[1].lost = true;
+TEST_F(PreviewTest, OffLostAndUnusedPartsAreBlackAndBlue) {
+  state.channel[1].lost = true;
   lay_out(4, false);
-  bench_.state.display.layout.window[0].flags = 0;
-  bench_.state.display.layout.window[5].scale = 0;
-  bench_.fields(2);
-  bench_.compose();
-  EXPECT_TRUE(near(bench_.pixel(260, 60), kLostBlue, 0));
+  state.display.layout.window[0].flags = 0;
+  state.display.layout.window[5].scale = 0;
+  fields(2);
+  compose();
+  EXPECT_TRUE(near(pixel(260, 60), card::kLostBlue, 0));
   for (const auto &[x, y] : {std::pair(80u, 40u), std::pair(260u, 180u), std::pair(712u, 40u)})
-    EXPECT_TRUE(near(bench_.pixel(x, y), kBlack, 0)) << x;
+    EXPECT_TRUE(near(pixel(x, y), card::kBlack, 0)) << x;
   EXPECT_EQ(channel_in({352, 0, 528, 120}), 2u);
 }
 
 // A large window made of two fields that belong to different frames shows two figures at once.
-TEST_F(Preview, LargeWindowShowsOneWholeFrameAfterEitherField) {
+TEST_F(PreviewTest, LargeWindowShowsOneWholeFrameAfterEitherField) {
   lay_out(1, false);
   for (int field = 0; field < 12; ++field) {
-    bench_.fields(1);
-    bench_.compose();
+    fields(1);
+    compose();
     if (field < 2) continue;
-    const auto frame = static_cast<u32>((bench_.next - 2) / 2);
+    const auto frame = static_cast<u32>((next - 2) / 2);
     for (const u32 first : {0u, 1u}) {
       std::vector<u8> luma;
       for (u32 y = first; y < 480; y += 2)
-        for (u32 x = 8; x < 712; ++x) luma.push_back(bench_.pixel(x, y).y);
-      ASSERT_EQ(read_frame_mark(luma.data(), 704, 704, 240), (FrameMark{0, frame, first == 1}));
+        for (u32 x = 8; x < 712; ++x) luma.push_back(pixel(x, y).y);
+      ASSERT_EQ(card::read_frame_mark(luma.data(), 704, 704, 240), (FrameMark{0, frame, first == 1}));
     }
   }
 }
 
-TEST_F(Preview, PictureInPictureLiesOnTopInItsFrame) {
+TEST_F(PreviewTest, PictureInPictureLiesOnTopInItsFrame) {
   lay_out(1, false);
   constexpr Area kPip{464, 304, 704, 464};
-  bench_.window(0, kPip, ZV_WINDOW_ENABLED | ZV_WINDOW_PIP);  // earlier in the list, later on the screen
-  bench_.window(7, {0, 0, 720, 480});
-  bench_.state.display.layout.frame[1] = {
+  window(0, kPip, ZV_WINDOW_ENABLED | ZV_WINDOW_PIP);  // earlier in the list, later on the screen
+  window(7, {0, 0, 720, 480});
+  state.display.layout.frame[1] = {
       driver::kPipFrame, kPip.x_start, kPip.y_start, kPip.x_end, kPip.y_end, 1, 0};
-  bench_.fields(4);
-  bench_.compose();
+  fields(4);
+  compose();
   EXPECT_EQ(channel_in(kPip), 0u);
-  const Colour edge = bench_.pixel(600, 304);
-  EXPECT_TRUE(near(edge, bench_.pixel(464, 400), 0) && near(edge, bench_.pixel(703, 463), 0));
-  EXPECT_FALSE(near(edge, bench_.pixel(600, 302), 20));
-  bench_.state.display.layout.window[0].scale = 0;
-  bench_.state.display.layout.frame[1].enable = 0;
-  bench_.compose();
+  const Colour edge = pixel(600, 304);
+  EXPECT_TRUE(near(edge, pixel(464, 400), 0) && near(edge, pixel(703, 463), 0));
+  EXPECT_FALSE(near(edge, pixel(600, 302), 20));
+  state.display.layout.window[0].scale = 0;
+  state.display.layout.frame[1].enable = 0;
+  compose();
   EXPECT_EQ(channel_in({0, 0, 720, 480}), 7u);
 }
 
-TEST_F(Preview, ZoomMagnifiesTheQuarterAtItsOrigin) {
+TEST_F(PreviewTest, ZoomMagnifiesTheQuarterAtItsOrigin) {
   lay_out(1, false);
-  bench_.state.channel[0].scene = Scene::still;
-  bench_.fields(2);
-  bench_.compose();
-  const auto plain = bench_.screen;
+  state.channel[0].scene = card::Scene::still;
+  fields(2);
+  compose();
+  const auto plain = screen;
   for (const driver::Zoom zoom : {driver::Zoom{1, 0, 0}, driver::Zoom{2, 360, 240}, driver::Zoom{1, 100, 60},
                                   driver::Zoom{1, 9999, 9999}}) {
-    bench_.state.display.layout.zoom = zoom;
-    bench_.compose();
+    state.display.layout.zoom = zoom;
+    compose();
     const u32 left = std::min(zoom.x, 360u), top = std::min(zoom.y, 240u);
     int wrong = 0;
     for (u32 y = 0; y < 480; y += 16) {
       for (u32 x = 0; x < 720; x += 24)
-        wrong += !near(bench_.pixel(x, y), pixel_of(plain, 720, left + x / 2, top + y / 2), 2);
+        wrong += !near(pixel(x, y), pixel_of(plain, left + x / 2, top + y / 2), 2);
     }
     EXPECT_EQ(wrong, 0) << "zoom at " << zoom.x << ", " << zoom.y;
   }
 }
 
 // Grid lines through the large window, and rectangles from the host that lie outside the screen.
-TEST_F(Preview, GridFollowsItsMaskAndNothingLeavesTheScreen) {
-  bench_.state.channel[0].scene = Scene::black;
+TEST_F(PreviewTest, GridFollowsItsMaskAndNothingLeavesTheScreen) {
+  state.channel[0].scene = card::Scene::black;
   lay_out(3, true);
-  bench_.state.display.layout.grid = {{0, 240, 480, 718, 0}, {0, 160, 320, 478, 0}, 0x744, 0};
-  bench_.fields(2);
-  bench_.compose();
-  EXPECT_TRUE(near(bench_.pixel(240, 100), kBlack, 0)) << "under the large window";
-  const Colour line = bench_.pixel(240, 400);
-  EXPECT_TRUE(near(line, bench_.pixel(480, 50), 0) && near(line, bench_.pixel(100, 320), 0));
+  state.display.layout.grid = {{0, 240, 480, 718, 0}, {0, 160, 320, 478, 0}, 0x744, 0};
+  fields(2);
+  compose();
+  EXPECT_TRUE(near(pixel(240, 100), card::kBlack, 0)) << "under the large window";
+  const Colour line = pixel(240, 400);
+  EXPECT_TRUE(near(line, pixel(480, 50), 0) && near(line, pixel(100, 320), 0));
 
   constexpr u32 kFar = 0xFFFFFFFF;
-  bench_.state.display.layout.grid = {{0, 5000, kFar, 3, 1}, {7, kFar, 2, 900, kFar}, 0xFFFF, 0};
-  bench_.state.display.layout.frame[1] = {1, 700, 400, kFar, kFar, 1, 0};
-  bench_.state.display.layout.zoom = {1, kFar, kFar};
-  bench_.state.display.routing.fill(kFar);
-  bench_.window(3, {kFar - 8, 0, kFar, 480});
-  bench_.window(4, {699, 470, kFar, kFar});
-  bench_.window(5, {400, 300, 401, 301});
-  bench_.compose();  // the sanitizers watch
-  EXPECT_EQ(bench_.screen.size(), 720u * 480 * 2);
+  state.display.layout.grid = {{0, 5000, kFar, 3, 1}, {7, kFar, 2, 900, kFar}, 0xFFFF, 0};
+  state.display.layout.frame[1] = {1, 700, 400, kFar, kFar, 1, 0};
+  state.display.layout.zoom = {1, kFar, kFar};
+  state.display.routing.fill(kFar);
+  window(3, {kFar - 8, 0, kFar, 480});
+  window(4, {699, 470, kFar, kFar});
+  window(5, {400, 300, 401, 301});
+  compose();  // the sanitizers watch
+  EXPECT_EQ(screen.size(), 720u * 480 * 2);
 }
 
 }  // namespace
-}  // namespace virtual_card

@@ -1,6 +1,5 @@
-#include "picture_bench.h"
-
-#include <gtest/gtest.h>
+// Decoders for the streams of the picture side, and its world.
+#include "picture_test.h"
 
 #include <cstring>
 #include <memory>
@@ -10,8 +9,6 @@
 extern "C" {
 #include <libavcodec/avcodec.h>
 }
-
-namespace virtual_card {
 
 namespace {
 
@@ -111,7 +108,36 @@ std::vector<std::int16_t> decode_g726(const std::vector<u8> &bytes) {
   return {samples, samples + frame->nb_samples};
 }
 
-std::vector<Encoded> PictureBench::take_mpeg4() {
+void PictureTest::power_up() {
+  engine.reset();
+  for (card::FrameQueue *queue : {&mpeg4, &mjpeg, &audio}) queue->clear();
+  next = 0;
+  state = {};
+  state.encoding = true;
+  for (unsigned i = 0; i < card::kChannels; ++i) {
+    state.display.layout.window[i] = {i, i, 0, 0, 0, 0, 0, ZV_WINDOW_ENABLED};
+    state.display.routing[i] = i;
+  }
+}
+
+void PictureTest::encode(unsigned channel, u32 scale_code, u32 interval_code, u32 gop, u32 qp) {
+  card::EncoderSettings &encoder = state.channel[channel].encoder;
+  encoder.scale_code = scale_code;
+  encoder.interval_code = interval_code;
+  encoder.gop = gop;
+  encoder.qp = qp;
+}
+
+void PictureTest::fields(int count) {
+  using std::chrono::microseconds;
+  for (const std::int64_t end = next + count; next < end; ++next) {
+    const auto passed = card::video_standard(state.standard).duration(next);
+    const microseconds wall_time = microseconds(1'700'000'000'000'000) + duration_cast<microseconds>(passed);
+    engine.field(state, {state.standard, next, wall_time});
+  }
+}
+
+std::vector<Encoded> PictureTest::take_mpeg4() {
   std::vector<Encoded> frames;
   while (const auto ready = mpeg4.pop(std::chrono::microseconds{0})) {
     const std::vector<u8> &area = ready->area;
@@ -125,7 +151,7 @@ std::vector<Encoded> PictureBench::take_mpeg4() {
   return frames;
 }
 
-std::vector<Encoded> PictureBench::take_jpeg() {
+std::vector<Encoded> PictureTest::take_jpeg() {
   std::vector<Encoded> frames;
   while (const auto ready = mjpeg.pop(std::chrono::microseconds{0})) {
     const std::vector<u8> &area = ready->area;
@@ -135,7 +161,7 @@ std::vector<Encoded> PictureBench::take_jpeg() {
   return frames;
 }
 
-Decoded PictureBench::look(unsigned channel) {
+Decoded PictureTest::look(unsigned channel) {
   fields(next % 2 == 0 ? 2 : 1);
   std::optional<Encoded> newest;
   for (Encoded &frame : take_jpeg())
@@ -143,5 +169,3 @@ Decoded PictureBench::look(unsigned channel) {
   take_mpeg4();
   return newest ? decode_jpeg(*newest) : Decoded{};
 }
-
-}  // namespace virtual_card

@@ -1,5 +1,9 @@
-#ifndef TESTS_VIRTUAL_CARD_CARD_FIXTURE_H
-#define TESTS_VIRTUAL_CARD_CARD_FIXTURE_H
+/**
+ * @file node_test.h
+ * The world of the tests that reach the card as a program does: libc calls on its device nodes.
+ */
+#ifndef NODE_TEST_H
+#define NODE_TEST_H
 
 #include <fcntl.h>
 #include <gmock/gmock.h>
@@ -9,17 +13,16 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <span>
+#include <utility>
 
 #include "support.h"
 #include "virtual_card.h"
 #include "zv_driver.h"
 
-namespace card = virtual_card;
 namespace driver = zarvo::driver;
 using namespace std::chrono_literals;
 
-/// A call's result, or the negated error number.
+/// The result of a call, or the negated error number.
 inline long answer(long result) {
   return result == -1 ? -errno : result;
 }
@@ -30,7 +33,7 @@ inline long read_node(int fd, void *buffer, std::size_t count) {
   return answer(read(fd, unchecked, count));
 }
 
-/// Sends a record to a node and takes back what it answered.
+/// Sends a command. A record that is not const receives the reply.
 template <typename Record>
 long send(int fd, u32 code, Record &record) {
   return answer(ioctl(fd, code, &record));
@@ -44,8 +47,8 @@ inline long send(int fd, u32 code) {
   return answer(ioctl(fd, code));
 }
 
-/// A card as built whose time only the test moves, with its four nodes open.
-class CardTest : public ::testing::Test {
+/// A card at power-up whose time stands still until the test advances it, with its four nodes open.
+class NodeTest : public testing::Test {
  protected:
   void SetUp() override {
     card::reset();
@@ -64,35 +67,50 @@ class CardTest : public ::testing::Test {
     audio = open(driver::kAudioNode, O_RDWR | O_CLOEXEC);
     video_input = open(driver::kVideoInputNode, O_RDWR | O_CLOEXEC);
     ASSERT_TRUE(encoder >= 0 && display >= 0 && audio >= 0 && video_input >= 0);
+    region = static_cast<u8 *>(mmap(nullptr, kRegion, PROT_READ | PROT_WRITE, MAP_SHARED, encoder, 0));
+    ASSERT_NE(region, MAP_FAILED);
   }
   void close_nodes() {
+    if (region != nullptr) munmap(std::exchange(region, nullptr), kRegion);
     for (int *fd : {&encoder, &display, &audio, &video_input})
       if (*fd >= 0) close(std::exchange(*fd, -1));
   }
-
-  long read_mpeg4() { return read_node(encoder, nullptr, driver::kMpeg4ReadSize); }
-  long read_mjpeg() { return read_node(encoder, nullptr, driver::kMjpegReadSize); }
-  /// What the node answers in the second word of a record.
-  static u32 ask(int fd, u32 code, u32 first) {
-    std::array<u32, 2> record{first, 0xFF};
-    EXPECT_EQ(send(fd, code, record), 0);
-    return record[1];
+  /// Starts the card again with another clock.
+  void run_with(card::ClockMode mode, double speed = 1) {
+    close_nodes();
+    card::set_clock(mode, speed);
+    open_nodes();
   }
-  u32 codec_register(u32 address) { return ask(display, driver::DISP_IOC_READ_REG, address); }
-  u32 video_input_register(u32 address) { return ask(video_input, driver::VIN_IOC_READ_REG, address); }
-  u32 board_command(u32 command) { return ask(video_input, driver::VIN_IOC_BOARD_CMD, command); }
-  /// One channel in CIF at 30 frames a second.
+
+  /// Encodes a channel in CIF, 30 frames a second.
   void encode_channel(u32 channel) {
     EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_SCALE, driver::ChannelValue{channel, 2}), 0);
     EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_INTERVAL, driver::Interval{channel, 1, 0}), 0);
     EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_QP, driver::ChannelValue{channel, 10}), 0);
     EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_GOP, driver::ChannelValue{channel, 30}), 0);
   }
+  void start() { EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0); }
+  void stop() { EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0); }
+  long read_mpeg4() { return read_node(encoder, nullptr, driver::kMpeg4ReadSize); }
+  long read_mjpeg() { return read_node(encoder, nullptr, driver::kMjpegReadSize); }
+  long read_audio(void *buffer) { return read_node(audio, buffer, driver::kAudioReadCount); }
+  /// Bytes of the stream region.
+  std::vector<u8> area(std::size_t offset, std::size_t size) {
+    return {region + offset, region + offset + size};
+  }
+  /// The second word of a record whose first word is `first`, after the command.
+  static u32 ask(int fd, u32 code, u32 first) {
+    u32 record[] = {first, 0xFF};
+    EXPECT_EQ(send(fd, code, record), 0);
+    return record[1];
+  }
+  u32 codec_register(u32 address) { return ask(display, driver::DISP_IOC_READ_REG, address); }
+  u32 video_input_register(u32 address) { return ask(video_input, driver::VIN_IOC_READ_REG, address); }
+  u32 board_command(u32 command) { return ask(video_input, driver::VIN_IOC_BOARD_CMD, command); }
 
-  int encoder = -1;
-  int display = -1;
-  int audio = -1;
-  int video_input = -1;
+  static constexpr std::size_t kRegion = driver::kStreamRegionSize;
+  int encoder = -1, display = -1, audio = -1, video_input = -1;
+  u8 *region = nullptr;  ///< the stream region, mapped from the encoder node
 };
 
 #endif
