@@ -13,3 +13,10 @@ function(zarvo_target target)
     target_link_options(${target} PRIVATE -fsanitize=${ZARVO_SANITIZE})
   endif()
 endfunction()
+
+# zarvo_program(NAME SOURCES...): a program that knows its version.
+function(zarvo_program name)
+  add_executable(${name} ${ARGN})
+  zarvo_target(${name})
+  target_compile_definitions(${name} PRIVATE ZARVO_VERSION="${PROJECT_VERSION}")
+endfunction()

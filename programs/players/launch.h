@@ -19,7 +19,8 @@ struct PlayerCommand {
 };
 
 /// Opens the only argument, FILE, for reading. Returns the descriptor. If FILE is not a regular file with
-/// more than `header` bytes, prints the reason or the usage on standard error and returns -1.
+/// more than `header` bytes, prints the reason or the usage on standard error and returns -1. For an option,
+/// ends the program: with status 0 after the text for --help, -h or --version, else with status 2.
 int open_argument(int argc, char **argv, off_t header);
 
 /// Returns the last part of a path.

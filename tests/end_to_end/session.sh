@@ -8,6 +8,10 @@ printf '#!/bin/sh\nprintf "%%s\\n" "$#" "$1" >player.log\n' >"$FOLDER/work/Video
 chmod +x "$FOLDER/work/Videoplayer"
 
 set_clock '2026-03-03 14:10:00' # far from a change of the hour
+# A link in the place of a recording: what it leads to must stay as it is, and the other channels must record.
+echo precious >"$FOLDER/precious"
+mkdir -p "$FOLDER/work/Data/Video/20260303/CH09"
+ln -s "$FOLDER/precious" "$FOLDER/work/Data/Video/20260303/CH09/20260303-14.rec"
 open_program
 click btnPreviewStart
 wait_preview
@@ -20,7 +24,8 @@ click btnRecordStop
 expect "the recordings stay open after Stop" wait_until 10 files_closed
 
 mapfile -t files < <(find "$FOLDER/work/Data" -type f | sort)
-expect_equal "recorded files" 17 "${#files[@]}"
+expect_equal "recorded files" 16 "${#files[@]}"
+expect_equal "the file behind the link" precious "$(cat "$FOLDER/precious")"
 expect_decodes "${files[@]}"
 expect_equal "channel folders" 20 "$(find "$FOLDER/work/Data" -type d -name 'CH*' | wc -l)"
 header=$(find "$FOLDER/work/Data/Video" -path '*CH05*' -name '*.rec' -exec od -A n -t x1 -N 32 {} + | tr -d ' \n')
