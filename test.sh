@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # The one command that tests everything: ./test.sh
 #   ./test.sh quick    the release build and its tests only
-#   ./test.sh tidy     clang-tidy over all sources
+#   ./test.sh gates    the checks that need no build only
 # Stops at the first step that fails, so that its last line is ctest's summary of the release build
 # only when all steps before it have passed.
 set -euo pipefail
@@ -20,15 +20,29 @@ export ASAN_OPTIONS=strict_string_checks=1:detect_stack_use_after_return=1
 export UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1
 export TSAN_OPTIONS=halt_on_error=1:second_deadlock_stack=1:suppressions=$ZARVO_ROOT/tests/tsan.supp
 
-sources() {
-  if git rev-parse --git-dir >/dev/null 2>&1; then git ls-files '*.cpp' '*.h' '*.c'; else
-    find app bench examples include programs recording sdk tests virtual_card -name '*.cpp' -o -name '*.h' -o -name '*.c'
-  fi
+# The tree is in order: read by tools only, nothing of it runs.
+run_gates() {
+  say "Checking format, scripts and spelling"
+  tools/files '*.cpp' '*.h' '*.c' | xargs -d '\n' clang-format --dry-run -Werror
+  scripts | xargs -d '\n' shellcheck
+  tools/files '*' | xargs -d '\n' codespell --quiet-level 2
+  say "Checking arrows, documents and lengths"
+  tools/check-arrows
+  tools/check-docs
+  check_lengths
+  say "clang-tidy"
+  tools/tidy
 }
 
-check_format() {
-  say "Format of the sources (clang-format)"
-  sources | xargs clang-format --dry-run -Werror
+# Scripts say what they are in their first line; some have no suffix.
+scripts() {
+  tools/files '*' | xargs -d '\n' awk 'FNR == 1 && (/^#!.*sh$/ || /^# shellcheck shell=/) { print FILENAME }'
+}
+
+# clang-tidy checks the length of functions.
+check_lengths() {
+  tools/files '*' | grep -vE '\.(png|gif|svg|ui)$' |
+    xargs -d '\n' awk 'FNR == 401 { print FILENAME " has more than 400 lines"; long = 1 } END { exit long }'
 }
 
 # Warnings are errors here: what a user's compiler says must not stop his build, ours must.
@@ -47,23 +61,17 @@ smoke_demo() {
   ./demo.sh record --force --seconds 3 --output "build/smoke test"
 }
 
-run_tidy() {
-  build release
-  say "clang-tidy"
-  run-clang-tidy -quiet -p build/release '^(?!.*(_autogen|/headers/)).*/(app|bench|examples|programs|recording|sdk|tests|virtual_card)/.*\.cpp$'
-}
-
 mode=${1:-all}
 case $mode in
-  all | quick | tidy) ;;
-  *) die "'$mode' is unknown; possible are quick and tidy, or nothing for everything" ;;
+  all | quick | gates) ;;
+  *) die "'$mode' is unknown; possible are quick and gates, or nothing for everything" ;;
 esac
 install_missing
 case $mode in
-  tidy) run_tidy ;;
+  gates) run_gates ;;
   quick) build_and_test release ;;
   all)
-    check_format
+    run_gates
     build_and_test asan -LE real_time
     build_and_test tsan -LE real_time
     smoke_demo

@@ -16,7 +16,7 @@ const char *const *frame_rate_list(ZV_VIDEO_STANDARD standard) {
 
 std::string frame_rate_label(const RECORD_FILE_HEADER &header) {
   const bool ntsc = header.record_height % 240 == 0;
-  const std::string whole = std::to_string(header.frame_rate);
+  std::string whole = std::to_string(header.frame_rate);
   std::string cut;
   for (auto label = frame_rate_list(ntsc ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL); *label != nullptr;
        ++label) {

@@ -27,7 +27,7 @@ inline Quality quality_of(int item) {
 /// Two fields count twice.
 constexpr int allowed_channels(const Quality &quality, ZV_TWOFIELD_MODE fields) {
   if (quality.scale == SCALE_ZV_NO_ENCODE) return 0;
-  return ZV_CHANNELS / (quality.cif_pictures * (fields == TWOFIELD_ENABLE ? 2 : 1));
+  return static_cast<int>(ZV_CHANNELS) / (quality.cif_pictures * (fields == TWOFIELD_ENABLE ? 2 : 1));
 }
 
 #endif

@@ -4,7 +4,10 @@
 . "$(dirname "$0")/common.sh"
 
 mkdir -p "$FOLDER/work"
-printf '#!/bin/sh\nprintf "%%s\\n" "$#" "$1" >player.log\n' >"$FOLDER/work/Videoplayer"
+cat >"$FOLDER/work/Videoplayer" <<'SCRIPT'
+#!/bin/sh
+printf '%s\n' "$#" "$1" >player.log
+SCRIPT
 chmod +x "$FOLDER/work/Videoplayer"
 
 set_clock '2026-03-03 14:10:00' # far from a change of the hour

@@ -157,7 +157,7 @@ int close(int fd) {
 }
 
 int close_range(unsigned first, unsigned last, int flags) {
-  if ((flags & CLOSE_RANGE_CLOEXEC) == 0) close_nodes(first, last);
+  if ((static_cast<unsigned>(flags) & CLOSE_RANGE_CLOEXEC) == 0) close_nodes(first, last);
   return real::close_range(first, last, flags);
 }
 
