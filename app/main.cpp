@@ -4,6 +4,7 @@
 #include <clocale>
 #include <csignal>
 #include <cstdio>
+#include <cstdlib>
 #include <string>
 
 #include "demodialog/demodialog.h"
@@ -24,6 +25,21 @@ bool print_text(const std::string &argument) {
   return (argument == "-h" || argument == "--help") && std::fputs(kHelp, stdout) >= 0;
 }
 
+/// Handles Qt's messages while it looks for a display. If there is none, Qt prints several lines and aborts;
+/// this prints one line and ends the program.
+void on_display_message(QtMsgType type, const QMessageLogContext &context, const QString &text) {
+  static QString reason;  // the first line is the most precise
+  if (type == QtFatalMsg) {
+    std::fprintf(stderr, "zarvo_demo: there is no usable display: %s\n", qPrintable(reason));
+    std::_Exit(1);
+  }
+  if (!QByteArrayView(context.category).startsWith("qt.qpa")) {
+    std::fprintf(stderr, "%s\n", qPrintable(qFormatLogMessage(type, context, text)));
+  } else if (reason.isEmpty()) {
+    reason = text;
+  }
+}
+
 }  // namespace
 
 int main(int argc, char **argv) {
@@ -35,8 +51,10 @@ int main(int argc, char **argv) {
   // Keep recording when the reader of the lines has gone, or when a file reaches its size limit.
   std::signal(SIGPIPE, SIG_IGN);
   std::signal(SIGXFSZ, SIG_IGN);
-  set_overlay_environment();                   // before Qt starts threads
+  set_overlay_environment();  // before Qt starts threads
+  qInstallMessageHandler(on_display_message);
   const QApplication application(argc, argv);  // takes the options of Qt out of argv
+  qInstallMessageHandler(nullptr);
   if (argc > 1) {
     std::fprintf(stderr,
                  "zarvo_demo: '%s' is not an option; possible are --help, --version and those of Qt\n",
