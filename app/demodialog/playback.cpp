@@ -17,11 +17,12 @@ class RecordingChooser : public QFileDialog {
  public:
   using QFileDialog::QFileDialog;
 
-  /// Returns the chosen file with symbolic links resolved; empty when no file is chosen.
+  /// Returns the chosen file with symbolic links resolved; empty when no file is chosen. A resolved path that
+  /// is not UTF-8 names no file in Qt; the chosen path is then kept.
   QString chosen() const {
     const QString file = typed_.isEmpty() ? selectedFiles().value(0) : typed_;
     const QString resolved = QFileInfo(file).canonicalFilePath();
-    return resolved.isEmpty() ? file : resolved;
+    return QFileInfo::exists(resolved) ? resolved : file;
   }
 
  protected:
