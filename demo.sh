@@ -1,5 +1,6 @@
 #!/usr/bin/env bash
 # Shows the whole system on this machine. See usage() below.
+[ -n "${BASH_VERSION:-}" ] || exec bash "$0" "$@" # started as "sh demo.sh"
 set -euo pipefail
 # shellcheck source=tools/common.sh
 . "$(dirname "${BASH_SOURCE[0]}")/tools/common.sh"
@@ -20,19 +21,22 @@ Installs missing packages, builds, and writes its results to build/demo.
 TEXT
 }
 
-BUILD=$ZARVO_ROOT/build/release
+BUILD=${ZARVO_BUILD:-$ZARVO_ROOT/build/product} # test.sh names a folder where everything is built
 RESULTS=$ZARVO_ROOT/build/demo
 SHOTS=$RESULTS/screenshots
 TOUR=$RESULTS/tour # the scripted operator's working directory; the user's recordings are in $RESULTS/Data
 CARD=$BUILD/virtual_card/libzarvo_virtual_card.so
 PROGRAM=$BUILD/app/zarvo_demo
-WIDGET_MAP=$BUILD/tests/end_to_end/widget_map
+WIDGET_MAP=$BUILD/tools/widget_map
 
 prepare() {
-  install_missing
-  say "Building (release) in $BUILD"
-  build release zarvo_record zarvo_motion zarvo_demo zarvo_virtual_card Videoplayer Audioplayer widget_map
+  if [ -z "${ZARVO_BUILD:-}" ]; then
+    install_missing "Installing and building take about 5 minutes on two cores." demo
+    say "Building in $BUILD"
+    build product zarvo_record zarvo_motion zarvo_demo zarvo_virtual_card Videoplayer Audioplayer widget_map
+  fi
   use_card "$CARD"
+  if [[ $ZARVO_ROOT == /tmp/zarvo-* ]]; then say "Some tools cannot deal with the name of this folder: using the link $ZARVO_ROOT"; fi
   mkdir -p "$RESULTS"
   if real_card; then say "Using the card of this machine"; else say "No card here: using the virtual card"; fi
 }
@@ -51,10 +55,18 @@ run_window() {
 }
 
 run_record() {
-  local log=$RESULTS/record.log pictures=$RESULTS/record/pictures line file frames files=() saved=()
+  local log=$RESULTS/record.log pictures=$RESULTS/record/pictures status=0 line file frames files=() saved=()
   say "Recording without the program: zarvo_record --seconds 5 $*"
   rm -rf "$RESULTS/record"
-  "${ON_CARD[@]}" "$BUILD/examples/zarvo_record" --seconds 5 --output "$RESULTS/record" "$@" | tee "$log"
+  "${ON_CARD[@]}" "$BUILD/examples/zarvo_record" --seconds 5 --output "$RESULTS/record" "$@" 2>&1 | tee "$log" || status=$?
+  case $status in
+    0) ;;
+    3) slow "$(missing_frames "$log")" ;;
+    *)
+      fail "zarvo_record ended with status $status"
+      return
+      ;;
+  esac
   mapfile -t files < <(sed -nE 's/: [0-9]+ (frames|blocks), [0-9]+ bytes, .*//p' "$log")
   [ ${#files[@]} -gt 0 ] || return 0 # --help records nothing
 
@@ -64,13 +76,21 @@ run_record() {
   while read -r line; do
     [[ $line =~ ^(.*):\ ([0-9]+)\ frames,\ [0-9]+\ bytes, ]] || continue
     file=${BASH_REMATCH[1]} frames=${BASH_REMATCH[2]}
+    [ "$frames" -gt 0 ] || continue # report_streams has told
     [ "$(decoded_frames "$file")" = "$frames" ] || fail "$file: not all of its $frames frames decode"
-    [ $# -gt 0 ] || { [ "$frames" -ge 148 ] && [ "$frames" -le 152 ]; } || fail "$file: $frames frames instead of 150"
     saved+=("$pictures/$(basename "$file").png")
     save_frame "$file" "$((frames / 2))" "${saved[-1]}" || fail "$file: no frame to save"
   done <"$log"
+  [ ${#saved[@]} -gt 0 ] || return 0
   montage "${saved[@]}" -geometry 352x240+2+2 "$RESULTS/record/frames.png"
   echo "A frame of each channel: $RESULTS/record/frames.png"
+}
+
+# missing_frames LOG: how many frames of how many the tallies of zarvo_record miss.
+missing_frames() {
+  awk '/ frames, .*expected [0-9]+, missing [0-9]+/ {
+    sub(/.*, expected /, ""); expected += $1; sub(/.*missing /, ""); missing += $1
+  } END { printf "%d of %d frames are missing", missing, expected }' "$1"
 }
 
 # shot NAME [WINDOW]: a screenshot of the window (or the whole screen), and one frame of the tour.
@@ -79,6 +99,9 @@ shot() {
   STEP=$((STEP + 1))
   import -silent -window root -crop 1530x890+0+0 +repage -resize 60% "$SHOTS/tour-$(printf '%02d' "$STEP").png"
 }
+
+# expect_rate RATE: notes if the preview is slower. The first second of a layout may be short.
+expect_rate() { wait_until 5 rate_near "$1" || slow "the preview shows $(preview_rate) pictures a second, not $1"; }
 
 tour_preview() {
   local split
@@ -89,7 +112,7 @@ tour_preview() {
     click "btnSplit$split"
     sleep 1.2 # until the screenshot shows the new layout
     shot "preview-split-$split" "$PREVIEW"
-    wait_until 10 rate_near 30 || fail "the preview in $split runs at $(preview_rate) pictures a second, not 30"
+    expect_rate 30
   done
   echo "  caption: $(preview_caption)"
 }
@@ -117,7 +140,7 @@ tour_panels() {
   sleep 1
   shot preview-focus-5 "$PREVIEW"
   click btnPreviewStop
-  wait_until 10 preview_gone || fail "the preview window did not close"
+  wait_until 120 preview_gone || fail "the preview window did not close"
 }
 
 tour_pal() {
@@ -126,11 +149,11 @@ tour_pal() {
   click btnSplit16
   click btnPreviewStart
   wait_preview
-  wait_until 10 rate_near 25 || fail "the preview runs at $(preview_rate) pictures a second, not 25"
+  expect_rate 25
   echo "  caption: $(preview_caption)"
   shot preview-pal "$PREVIEW"
   click btnPreviewStop
-  wait_until 10 preview_gone || fail "the preview window did not close"
+  wait_until 120 preview_gone || fail "the preview window did not close"
   click radioNTSC
 }
 
@@ -145,12 +168,12 @@ tour_recording() {
   click checkCh2
   shot dialog-quality-chosen "$DIALOG"
   click btnRecordStart
-  wait_line kbps 6 30
+  wait_line kbps 6
   shot dialog-recording "$DIALOG"
   click btnRecordStop
-  wait_until 10 files_closed || fail "the recordings stay open after Stop"
+  wait_until 120 files_closed || fail "the recordings stay open after Stop"
   click btnPreviewStop
-  wait_until 10 preview_gone || fail "the preview window did not close"
+  wait_until 120 preview_gone || fail "the preview window did not close"
 
   say "The recorded files: header, contents (codec, width, height, frames) and ffmpeg's verdict"
   mapfile -t files < <(find "$TOUR/Data" -name '*.rec' -o -name '*.aud' | sort)
@@ -163,16 +186,16 @@ tour_playback() {
   say "Playing a recording"
   file=$(find "$TOUR/Data" -path '*CH07*' -name '*.rec' -print -quit)
   click btnPlayback
-  wait_until 10 xdotool search --onlyvisible --name 'Choose a file to playback' || die "no file dialog appeared"
+  wait_until 120 xdotool search --onlyvisible --name 'Choose a file to playback' || die "no file dialog appeared"
   chooser=$(xdotool search --onlyvisible --name 'Choose a file to playback' | head -n 1)
   shot playback-chooser "$chooser"
   xdotool windowactivate --sync "$chooser" type --delay 5 -- "$file"
   xdotool key Return
-  wait_until 20 xdotool search --onlyvisible --name "^Channel 7 - ${file##*/}" || die "no player appeared"
+  wait_until 120 xdotool search --onlyvisible --name "^Channel 7 - ${file##*/}" || die "no player appeared"
   player=$(xdotool search --onlyvisible --name "^Channel 7 - ${file##*/}" | head -n 1)
   sleep 0.5 # until the player shows the first picture
   shot player "$player"
-  wait_until 30 player_gone "$file" || fail "the player does not end"
+  wait_until 120 player_gone "$file" || fail "the player does not end"
 }
 player_gone() { ! xdotool search --onlyvisible --name "^Channel 7 - ${1##*/}"; }
 
@@ -218,17 +241,31 @@ fail() {
   FAILED=1
 }
 
+# slow WHAT: all is right but late; the demo goes on.
+slow() {
+  printf 'SLOW: %s\n' "$*"
+  SLOW=1
+}
+
 finish() {
-  say "Results are in $RESULTS"
+  say "Results are in $(cd -P "$RESULTS" && pwd)"
   [ -z "${1:-}" ] || printf '%s\n' "$@"
   if [ "$FAILED" -ne 0 ]; then
     echo "Something failed: see the lines with FAILED above." >&2
     exit 1
   fi
-  echo "Everything worked."
+  if [ "$SLOW" -eq 0 ]; then
+    echo "Everything worked."
+  elif real_card; then
+    echo "Everything worked, but frames are missing: see the lines with SLOW above. The machine or its disk is too slow."
+  else
+    echo "Everything worked, but this machine was too slow to be sixteen cameras too: see the lines with SLOW above."
+    echo "End other programs, or record fewer channels: ./demo.sh record --channels 1-4"
+  fi
 }
 
 FAILED=0
+SLOW=0
 mode=${1:-all}
 [ $# -eq 0 ] || shift
 case $mode in
@@ -242,7 +279,9 @@ case $mode in
     die "'$mode' is not one of record, tour and window"
     ;;
 esac
-if [ "$mode" = all ] && [ -n "${DISPLAY:-}${WAYLAND_DISPLAY:-}" ]; then mode=window; fi
+display=${DISPLAY:-}${WAYLAND_DISPLAY:-}
+if [ "$mode" = all ] && [ -n "$display" ]; then mode=window; fi
+if [ "$mode" = window ] && [ -z "$display" ]; then die "there is no display for the window; try ./demo.sh tour"; fi
 
 prepare
 case $mode in

@@ -55,10 +55,12 @@ build_and_test() { # PRESET CTEST-OPTION...
   ctest --test-dir "build/$preset" -j "$(nproc)" "$@"
 }
 
-# What a newcomer runs first; the folder has a blank on purpose.
+# What a newcomer runs first; the folder has a blank on purpose. It uses the programs of the release build.
 smoke_demo() {
+  say "Building release"
+  build release -- -DZARVO_WERROR=ON
   say "Recording with demo.sh"
-  ./demo.sh record --force --seconds 3 --output "build/smoke test"
+  ZARVO_BUILD=$ZARVO_ROOT/build/release ./demo.sh record --force --seconds 3 --output "build/smoke test"
 }
 
 mode=${1:-all}
@@ -66,7 +68,7 @@ case $mode in
   all | quick | gates) ;;
   *) die "'$mode' is unknown; possible are quick and gates, or nothing for everything" ;;
 esac
-install_missing
+install_missing "Building and testing take most of an hour on two cores." demo tests
 case $mode in
   gates) run_gates ;;
   quick) build_and_test release ;;

@@ -10,38 +10,68 @@ die() {
   exit 1
 }
 
-# install_missing: installs the missing packages of tools/packages.txt, without questions.
+# plain_root: lets ZARVO_ROOT be a link to the tree if the path of the tree has characters that CMake, ninja,
+# the dynamic linker or xdotool cannot deal with: quotes, ':', ';', '&', letters that the locale does not have, ...
+# The link is the same for each run, because builds keep the path.
+plain_root() {
+  local LC_ALL=C folder link
+  case $ZARVO_ROOT in *[!A-Za-z0-9/._+\ -]*) ;; *) return 0 ;; esac
+  folder=/tmp/zarvo-$(id -u)
+  link=$folder/$(printf %s "$ZARVO_ROOT" | cksum | tr ' ' -)
+  mkdir -m 700 "$folder" 2>/dev/null || { [ -O "$folder" ] && [ ! -L "$folder" ]; } || die "$folder is not yours"
+  [ "$(readlink "$link")" = "$ZARVO_ROOT" ] || ln -sfn "$ZARVO_ROOT" "$link"
+  ZARVO_ROOT=$link
+}
+plain_root
+
+# install_missing NOTE LIST...: installs, without questions, the packages of tools/packages-LIST.txt that are
+# missing. Its first line says how much is fetched; the note ends that line.
 install_missing() {
-  local as_root=() missing=() package
-  command -v dpkg-query >/dev/null && command -v apt-get >/dev/null ||
-    die "this script installs its tools with apt-get (Debian 12); elsewhere install the packages of tools/packages.txt yourself"
-  while read -r package; do
-    dpkg-query -W -f '${db:Status-Status}\n' "$package" 2>/dev/null | grep -qx installed || missing+=("$package")
-  done < <(grep -v '^#' "$ZARVO_ROOT/tools/packages.txt")
+  local note=$1 missing names size reached=1 as_root=() apt=(env LC_ALL=C DEBIAN_FRONTEND=noninteractive apt-get)
+  shift
+  type dpkg-query apt-get >/dev/null 2>&1 ||
+    die "this script installs packages with apt-get (Debian 12); elsewhere install what tools/packages-*.txt list yourself"
+  mapfile -t missing < <(for list; do cat "$ZARVO_ROOT/tools/packages-$list.txt"; done | grep -v '^#' |
+    grep -vxFf <(dpkg-query -W -f '${db:Status-Status} ${Package}\n' | sed -n 's/^installed //p'))
   [ ${#missing[@]} -gt 0 ] || return 0
+  names=${missing[*]}
   if [ "$(id -u)" -ne 0 ]; then
-    command -v sudo >/dev/null || die "these packages are missing and need root to install: ${missing[*]}"
+    sudo true 2>/dev/null || die "these packages are missing, and installing them needs root: $names"
     as_root=(sudo)
   fi
-  say "Installing ${#missing[@]} missing packages with apt-get: ${missing[*]}"
-  "${as_root[@]}" apt-get update -q
-  "${as_root[@]}" env DEBIAN_FRONTEND=noninteractive apt-get install -q -y --no-install-recommends "${missing[@]}"
+  apt=("${as_root[@]}" "${apt[@]}" -o Acquire::Retries=2 -o Acquire::http::Timeout=30)
+  "${apt[@]}" update -qq -o APT::Update::Error-Mode=any || reached=0
+  size=$("${apt[@]}" install --assume-no --no-install-recommends "${missing[@]}" | sed -nE \
+    's/^Need to get (.*) of archives.*/\1 to fetch, /p; s/^After this operation, (.*) of additional.*/\1 on disk/p' | tr -d '\n')
+  if [ -z "$size" ]; then
+    [ $reached -eq 1 ] || die "cannot reach the package servers; these packages are missing: $names"
+    die "the package servers of this system do not have all these packages (those of Debian 12 do): $names"
+  fi
+  say "Installing ${#missing[@]} missing packages: $size. $note"
+  "${apt[@]}" install -y --no-install-recommends --download-only "${missing[@]}" ||
+    die "cannot reach the package servers; these packages are missing: $names"
+  "${apt[@]}" install -y --no-install-recommends "${missing[@]}" || die "apt-get cannot install these packages: $names"
 }
 
-# build PRESET [TARGET...] [-- CMAKE-OPTION...]: configures and builds build/PRESET, with ccache if it is installed.
+# build PRESET [TARGET...] [-- CMAKE-OPTION...]: builds build/PRESET, with ccache if it is installed. Configures it
+# first if there are options or it is not yet configured for this place: the tree may have been moved.
 build() {
-  local preset=$1 targets=() options=()
+  local preset=$1 folder=$ZARVO_ROOT/build/$1 targets=() options=() cache
   shift
   while [ $# -gt 0 ] && [ "$1" != -- ]; do
     targets+=("$1")
     shift
   done
   [ $# -eq 0 ] || options=("${@:2}")
-  if command -v ccache >/dev/null; then
-    options+=(-DCMAKE_C_COMPILER_LAUNCHER=ccache -DCMAKE_CXX_COMPILER_LAUNCHER=ccache)
+  cache=$folder/CMakeCache.txt
+  if [ -f "$cache" ] && ! grep -qxF "CMAKE_HOME_DIRECTORY:INTERNAL=$ZARVO_ROOT" "$cache"; then rm -r "$folder"; fi
+  if [ ${#options[@]} -gt 0 ] || [ ! -f "$folder/build.ninja" ]; then
+    if command -v ccache >/dev/null; then
+      options+=(-DCMAKE_C_COMPILER_LAUNCHER=ccache -DCMAKE_CXX_COMPILER_LAUNCHER=ccache)
+    fi
+    cmake -S "$ZARVO_ROOT" --preset "$preset" "${options[@]}" >/dev/null || return
   fi
-  (cd "$ZARVO_ROOT" && cmake --preset "$preset" "${options[@]}" >/dev/null &&
-    cmake --build --preset "$preset" -j "$(nproc)" ${targets[0]:+--target "${targets[@]}"})
+  cmake --build "$folder" -j "$(nproc)" ${targets[0]:+--target "${targets[@]}"}
 }
 
 # real_card: whether this machine has a card.

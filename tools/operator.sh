@@ -13,12 +13,12 @@ open_display() {
   trap close_display EXIT
   Xvfb -displayfd 3 -screen 0 1680x1200x24 -nolisten tcp 3>"$OPERATOR_FOLDER/display" >"$OPERATOR_FOLDER/xvfb.log" 2>&1 &
   XVFB=$!
-  wait_until 20 test -s "$OPERATOR_FOLDER/display" || die "Xvfb did not start: $(cat "$OPERATOR_FOLDER/xvfb.log")"
+  wait_until 120 test -s "$OPERATOR_FOLDER/display" || die "Xvfb did not start: $(cat "$OPERATOR_FOLDER/xvfb.log")"
   DISPLAY=:$(cat "$OPERATOR_FOLDER/display")
   export DISPLAY QT_QPA_PLATFORM=xcb SDL_VIDEODRIVER=x11 XDG_RUNTIME_DIR=$OPERATOR_FOLDER
   openbox >"$OPERATOR_FOLDER/openbox.log" 2>&1 &
   OPENBOX=$!
-  wait_until 20 window_manager_runs || die "openbox did not start"
+  wait_until 120 window_manager_runs || die "openbox did not start"
 }
 
 # Windows that appear before the window manager is ready may stay hidden.
@@ -41,7 +41,7 @@ start_program() {
   [ ${#WIDGET[@]} -gt 0 ] || read_widget_map
   (cd "$1" && exec "${ON_CARD[@]}" "$PROGRAM") >"$LOG" 2>&1 &
   DEMO=$!
-  wait_until 30 dialog_shown || die "the dialog did not appear: $(cat "$LOG")"
+  wait_until 120 dialog_shown || die "the dialog did not appear: $(cat "$LOG")"
   xdotool windowmove "$DIALOG" 20 40
   focus_dialog
 }
@@ -70,9 +70,9 @@ choose() {
   WINDOWS=$(program_windows)
   for ((n = 0; n < $2; ++n)); do keys+=(Down); done
   click "$1"
-  wait_until 5 popup_shown || die "the list of $1 did not open"
+  wait_until 120 popup_shown || die "the list of $1 did not open"
   xdotool key --delay 30 "${keys[@]}" Return
-  wait_until 5 popup_gone || die "the list of $1 did not close"
+  wait_until 120 popup_gone || die "the list of $1 did not close"
 }
 
 # A popup is one more visible window of the program.
@@ -87,15 +87,15 @@ enter() {
 }
 
 # wait_line PATTERN [COUNT [SECONDS]]: waits until the program has printed that many lines with the pattern.
-wait_line() { wait_until "${3:-20}" has_lines "$1" "${2:-1}" || die "the program did not print '$1': $(tail -n 5 "$LOG")"; }
+wait_line() { wait_until "${3:-120}" has_lines "$1" "${2:-1}" || die "the program did not print '$1': $(tail -n 5 "$LOG")"; }
 has_lines() { [ "$(grep -c -- "$1" "$LOG")" -ge "$2" ]; }
 lines() { grep -c -- "$1" "$LOG"; }
 
 # wait_preview: waits until the preview window exists and its caption shows a rate; sets PREVIEW to the window.
 wait_preview() {
-  wait_until 20 preview_shown || die "no preview window appeared: $(tail -n 5 "$LOG")"
+  wait_until 120 preview_shown || die "no preview window appeared: $(tail -n 5 "$LOG")"
   xdotool windowmove "$PREVIEW" 780 40 2>/dev/null
-  wait_until 20 preview_runs || die "the preview shows no pictures"
+  wait_until 120 preview_runs || die "the preview shows no pictures"
 }
 preview_shown() { PREVIEW=$(xdotool search --onlyvisible --name '^Preview' | head -n 1) && [ -n "$PREVIEW" ]; }
 preview_gone() { ! preview_shown; }
@@ -113,7 +113,7 @@ picture() { import -silent -window "$1" "$2" && printf '  saved %s\n' "$2"; }
 close_program() {
   focus_dialog
   xdotool key alt+F4
-  wait_until 30 process_gone "$DEMO" || die "the program did not end after its dialog was closed"
+  wait_until 120 process_gone "$DEMO" || die "the program did not end after its dialog was closed"
   STATUS=0
   wait "$DEMO" || STATUS=$?
   DEMO=
