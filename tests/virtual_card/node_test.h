@@ -26,25 +26,19 @@ using namespace std::chrono_literals;
 inline long answer(long result) {
   return result == -1 ? -errno : result;
 }
-
 /// A read that the compiler does not check: the card's reads take null, and counts beyond the buffer.
 inline long read_node(int fd, void *buffer, std::size_t count) {
   void *volatile unchecked = buffer;
   return answer(read(fd, unchecked, count));
 }
-
-/// Sends a command. A record that is not const receives the reply.
-template <typename Record>
-long send(int fd, u32 code, Record &record) {
-  return answer(ioctl(fd, code, &record));
+/// The result of a command, with its record if it takes one.
+long send(int fd, u32 code, auto... record) {
+  return answer(ioctl(fd, code, &record...));
 }
-template <typename Record>
-long send(int fd, u32 code, const Record &record) {
-  Record copy = record;
-  return send(fd, code, copy);
-}
-inline long send(int fd, u32 code) {
-  return answer(ioctl(fd, code));
+/// The record that a command returns.
+auto reply(int fd, u32 code, auto record) {
+  EXPECT_EQ(answer(ioctl(fd, code, &record)), 0);
+  return record;
 }
 
 /// A card at power-up whose time stands still until the test advances it, with its four nodes open.
@@ -62,10 +56,10 @@ class NodeTest : public testing::Test {
   }
 
   void open_nodes() {
-    encoder = open(driver::kEncoderNode, O_RDWR | O_CLOEXEC);
-    display = open(driver::kDisplayNode, O_RDWR | O_CLOEXEC);
-    audio = open(driver::kAudioNode, O_RDWR | O_CLOEXEC);
-    video_input = open(driver::kVideoInputNode, O_RDWR | O_CLOEXEC);
+    encoder = open(driver::kEncoderNode, O_RDWR);
+    display = open(driver::kDisplayNode, O_RDWR);
+    audio = open(driver::kAudioNode, O_RDWR);
+    video_input = open(driver::kVideoInputNode, O_RDWR);
     ASSERT_TRUE(encoder >= 0 && display >= 0 && audio >= 0 && video_input >= 0);
     region = static_cast<u8 *>(mmap(nullptr, kRegion, PROT_READ | PROT_WRITE, MAP_SHARED, encoder, 0));
     ASSERT_NE(region, MAP_FAILED);
@@ -75,42 +69,35 @@ class NodeTest : public testing::Test {
     for (int *fd : {&encoder, &display, &audio, &video_input})
       if (*fd >= 0) close(std::exchange(*fd, -1));
   }
-  /// Starts the card again with another clock.
+  /// Opens the nodes again, with another clock.
   void run_with(card::ClockMode mode, double speed = 1) {
     close_nodes();
     card::set_clock(mode, speed);
     open_nodes();
   }
 
-  /// Encodes a channel in CIF, 30 frames a second.
-  void encode_channel(u32 channel) {
+  /// Encodes a channel in CIF, 30 frames a second, with quantiser 10.
+  void encode(u32 channel, u32 gop = 30) {
     EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_SCALE, driver::ChannelValue{channel, 2}), 0);
     EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_INTERVAL, driver::Interval{channel, 1, 0}), 0);
     EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_QP, driver::ChannelValue{channel, 10}), 0);
-    EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_GOP, driver::ChannelValue{channel, 30}), 0);
+    EXPECT_EQ(send(encoder, driver::ENC_IOC_SET_GOP, driver::ChannelValue{channel, gop}), 0);
   }
   void start() { EXPECT_EQ(send(encoder, driver::ENC_IOC_START), 0); }
   void stop() { EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), 0); }
   long read_mpeg4() { return read_node(encoder, nullptr, driver::kMpeg4ReadSize); }
   long read_mjpeg() { return read_node(encoder, nullptr, driver::kMjpegReadSize); }
-  long read_audio(void *buffer) { return read_node(audio, buffer, driver::kAudioReadCount); }
-  /// Bytes of the stream region.
-  std::vector<u8> area(std::size_t offset, std::size_t size) {
-    return {region + offset, region + offset + size};
-  }
-  /// The second word of a record whose first word is `first`, after the command.
-  static u32 ask(int fd, u32 code, u32 first) {
-    u32 record[] = {first, 0xFF};
-    EXPECT_EQ(send(fd, code, record), 0);
-    return record[1];
-  }
+  long read_audio() { return read_node(audio, audio_blocks.data(), driver::kAudioReadCount); }
+  /// The second word of a record, after a command that takes the first.
+  static u32 ask(int fd, u32 code, u32 first) { return reply(fd, code, std::array<u32, 4>{first, 0xFF})[1]; }
   u32 codec_register(u32 address) { return ask(display, driver::DISP_IOC_READ_REG, address); }
   u32 video_input_register(u32 address) { return ask(video_input, driver::VIN_IOC_READ_REG, address); }
   u32 board_command(u32 command) { return ask(video_input, driver::VIN_IOC_BOARD_CMD, command); }
 
   static constexpr std::size_t kRegion = driver::kStreamRegionSize;
   int encoder = -1, display = -1, audio = -1, video_input = -1;
-  u8 *region = nullptr;  ///< the stream region, mapped from the encoder node
+  u8 *region = nullptr;  ///< the stream region
+  std::array<u8, 256> audio_blocks{};
 };
 
 #endif

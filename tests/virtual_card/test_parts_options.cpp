@@ -4,28 +4,21 @@
 #include <gtest/gtest.h>
 
 #include "nodes/options.h"
+#include "support.h"
 
 using namespace std::chrono_literals;
 
-namespace {
-
-using ::testing::AllOf;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-using virtual_card::Options;
-using virtual_card::parse_options;
-
 TEST(OptionsText, SetsWhatItSays) {
-  const Options options = parse_options(
+  const card::Options options = card::parse_options(
       "lost=3,7-9;silent=2;still=1,16;black=5;speed=2.5;camera3=/a b/clip.mp4;camera16=x;nowait;absent;"
       "board=dd;log=/tmp/l=1;vanish=0.5-3;");
-  EXPECT_THAT(options.error, IsEmpty());
+  EXPECT_EQ(options.error, "");
   EXPECT_EQ(options.lost, 0x01C4u);
   EXPECT_EQ(options.silent, 0x2u);
   EXPECT_EQ(options.still, 0x8001u);
   EXPECT_EQ(options.black, 0x10u);
   EXPECT_EQ(options.speed, 2.5);
-  EXPECT_THAT(options.films, ::testing::ElementsAre(std::pair(2u, "/a b/clip.mp4"), std::pair(15u, "x")));
+  EXPECT_THAT(options.films, testing::ElementsAre(std::pair(2u, "/a b/clip.mp4"), std::pair(15u, "x")));
   EXPECT_TRUE(options.nowait && options.absent);
   EXPECT_EQ(options.board_version, 0xDDu);
   EXPECT_EQ(options.log_file, "/tmp/l=1");
@@ -33,12 +26,10 @@ TEST(OptionsText, SetsWhatItSays) {
   EXPECT_EQ(options.vanish_to, 3s);
 }
 
-// What was typed and what would have been right, or nobody finds the slip.
+// The error names what was typed and what is possible.
 TEST(OptionsText, WhatIsWrongIsNamedWithWhatIsPossible) {
   const struct {
-    const char *text;
-    const char *named;
-    const char *possible;
+    const char *text, *named, *possible;
   } cases[] = {
       {"sped=4", "\"sped\" is unknown", "cameraN, lost, silent"},
       {"speed=4;;Lost=1", "\"Lost\" is unknown", "vanish"},
@@ -58,9 +49,8 @@ TEST(OptionsText, WhatIsWrongIsNamedWithWhatIsPossible) {
       {"camera17=/x", "\"camera17=/x\"", "1-16"},
       {"camera3", "\"camera3\"", "camera3=/path/clip.mp4"},
   };
-  for (const auto &each : cases)
-    EXPECT_THAT(parse_options(each.text).error, AllOf(HasSubstr(each.named), HasSubstr(each.possible)))
-        << each.text;
+  for (const auto &[text, named, possible] : cases)
+    EXPECT_THAT(card::parse_options(text).error,
+                testing::AllOf(testing::HasSubstr(named), testing::HasSubstr(possible)))
+        << text;
 }
-
-}  // namespace
