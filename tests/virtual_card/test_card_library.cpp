@@ -58,12 +58,14 @@ TEST(Library, TheCardCallsNoNameThatItTakes) {
   EXPECT_THAT(lines_of(listing, taken), IsEmpty());
 }
 
-/// What a program prints that knows nothing of the card, with the library in front of it.
+/// What a program prints that knows nothing of the card, with the library in front of it. Behind a sanitizer
+/// the sanitizer's runtime must be the first.
 std::string preloaded(const std::string &command, const std::string &options = "",
                       const std::string &other_libraries = "") {
-  return output_of("export LC_ALL=C ASAN_OPTIONS=verify_asan_link_order=0:detect_leaks=0; " +
-                   ("ZARVO_VIRTUAL_CARD='" + options + "' LD_PRELOAD='" CARD_LIBRARY + other_libraries) +
-                   "' " + command + " 2>&1");
+  return output_of("export LC_ALL=C ASAN_OPTIONS=detect_leaks=0 ZARVO_VIRTUAL_CARD='" + options +
+                   "'; runtime=$(ldd " CARD_LIBRARY
+                   " | grep -o '/.*/lib[at]san[^ ]*'); LD_PRELOAD=\"$runtime " CARD_LIBRARY +
+                   other_libraries + "\" " + command + " 2>&1");
 }
 std::string opened(const std::string &nodes, const std::string &options = "") {
   return preloaded("head -qc0 " + nodes, options);
@@ -74,8 +76,9 @@ std::string opened(const std::string &nodes, const std::string &options = "") {
 TEST(Preload, TheCardIsThereForThisProgramOnlyAndSilent) {
   EXPECT_EQ(opened("/dev/zarvo_enc0 /dev/zarvo_disp0 /dev/null"), "");
   EXPECT_THAT(opened("/dev/zarvo_dec0"), HasSubstr("No such file"));
-  EXPECT_EQ(preloaded("sh -c 'echo \"<$LD_PRELOAD>\"; env | grep LD_PRELOAD'"), "<>\n");
-  EXPECT_EQ(preloaded("printenv LD_PRELOAD", "", ":libdl.so.2 libm.so.6"), "libdl.so.2:libm.so.6\n");
+  EXPECT_THAT(preloaded("sh -c 'echo $LD_PRELOAD; env'"), testing::Not(HasSubstr("libzarvo_virtual_card")));
+  EXPECT_THAT(preloaded("printenv LD_PRELOAD", "", ":libdl.so.2 libm.so.6"),
+              testing::EndsWith("libdl.so.2:libm.so.6\n"));
 }
 
 TEST(Preload, OptionsComeFromTheEnvironment) {
