@@ -6,6 +6,7 @@
 #include <pthread.h>
 #include <time.h>
 
+#include <cstring>
 #include <mutex>
 
 namespace {
@@ -25,14 +26,12 @@ std::string thresholds(const Bytes &record) {
 
 std::string command_line(u32 code, const Bytes &record) {
   std::string text = command_name(code);
-  const bool map = text == "VIN_IOC_SET_MOTION_MAP" && !record.empty();
-  std::vector<u32> words(record.begin(), record.end());
-  if (record.size() != 3) {
-    words.resize(map ? 5 : record.size() / 4);
-    std::copy_n(record.data(), words.size() * 4, reinterpret_cast<u8 *>(words.data()));
-  }
-  if (std::islower(text[0]) && !words.empty()) {
-    if (words.size() == 3) text = line(text, words[0]);
+  const bool map = text == "VIN_IOC_SET_MOTION_MAP";
+  const std::size_t size = record.size() == 3 ? 1 : 4;  // the record of a decoder's register has bytes
+  std::vector<u32> words(map ? 5 : record.size() / size);
+  for (std::size_t n = 0; n < words.size(); ++n) std::memcpy(&words[n], &record[n * size], size);
+  if (std::islower(text[0]) && words.size() > 1) {
+    if (size == 1) text = line(text, words[0]);
     const u32 *access = &words[words.size() - 2];
     return text + " 0x" + hex(access[0]) + (text.find("write") < text.size() ? ' ' + hex(access[1]) : "");
   }
@@ -50,7 +49,7 @@ std::string describe(const card::Call &call) {
 }
 
 std::mutex delivery_mutex;
-std::vector<Delivery> delivery_list;
+std::vector<std::pair<std::string, Bytes>> deliveries;
 
 bool strikes(int &countdown) {
   return countdown > 0 && --countdown == 0;
@@ -116,27 +115,29 @@ int __wrap_clock_gettime(clockid_t, timespec *now) {
 }
 }
 
-std::function<void(const Delivery &)> on_delivery;
+std::function<void(const std::string &)> on_delivery;
 
 void keep(char stream, u32 channel, const u8 *data, i32 length, i32 flags) {
   const u8 *area = stream == 'm' ? zarvo::mpeg4_buf : stream == 'j' ? zarvo::mjpeg_buf : zarvo::audio_buf;
   EXPECT_TRUE(channel < ZV_CHANNELS && length >= 0 && data >= area && data + length <= area + 0x100000);
-  const Delivery delivery{line({stream}, channel, data - area, length) + ' ' + hex(u32(flags)),
-                          Bytes(data, data + std::min(length, 8192))};
-  if (on_delivery) on_delivery(delivery);
+  const std::string got = line({stream}, channel, data - area, length) + ' ' + hex(u32(flags));
+  if (on_delivery) on_delivery(got);
   const std::lock_guard lock(delivery_mutex);
-  delivery_list.push_back(delivery);
-}
-
-std::vector<Delivery> deliveries() {
-  const std::lock_guard lock(delivery_mutex);
-  return delivery_list;
+  deliveries.emplace_back(got, Bytes(data, data + std::min(length, 8192)));
 }
 
 Lines delivered() {
+  const std::lock_guard lock(delivery_mutex);
   Lines lines;
-  for (const Delivery &delivery : deliveries()) lines.push_back(delivery.line);
+  for (const auto &[line, data] : deliveries) lines.push_back(line);
   return lines;
+}
+
+Bytes data_of(const std::string &line) {
+  const std::lock_guard lock(delivery_mutex);
+  const auto got = std::find_if(deliveries.rbegin(), deliveries.rend(),
+                                [&](const auto &delivery) { return delivery.first == line; });
+  return got != deliveries.rend() ? got->second : Bytes();
 }
 
 ZV_VIDEO_CONFIG settings(ZV_SCALE_VALUE scale, u32 interval, ZV_TWOFIELD_MODE two) {
@@ -154,7 +155,7 @@ void SdkTest::SetUp() {
   card::set_clock(card::ClockMode::manual);
   faults.malloc_countdown = faults.thread_countdown = faults.threads = 0;
   on_delivery = nullptr;
-  delivery_list.clear();
+  deliveries.clear();
   open_card();
   card::record_log(true);
 }

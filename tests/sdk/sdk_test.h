@@ -59,16 +59,13 @@ struct Faults {
 };
 extern Faults faults;
 
-/// What a callback got. The line is "stream channel offset length flags", where the stream is m, j or a, the
-/// offset is that in the stream's area, and the flags are hexadecimal.
-struct Delivery {
-  std::string line;
-  Bytes data;  ///< the first 8 KiB
-};
-std::vector<Delivery> deliveries();
+/// What the callbacks got, a line each: "stream channel offset length flags", where the stream is m, j or a,
+/// the offset is that in the stream's area, and the flags are hexadecimal.
 Lines delivered();
+/// The first 8 KiB that came with the last such line.
+Bytes data_of(const std::string &line);
 /// Runs inside the callback.
-extern std::function<void(const Delivery &)> on_delivery;
+extern std::function<void(const std::string &line)> on_delivery;
 void keep(char stream, u32 channel, const u8 *data, i32 length, i32 flags);
 template <char kStream>
 void callback(u32 channel, u8 *data, i32 length, i32 flags) {

@@ -2,7 +2,6 @@
 
 #include <climits>
 #include <cstring>
-#include <map>
 #include <random>
 
 #include "sdk_test.h"
@@ -41,7 +40,7 @@ class Capture : public SdkTest {
     return delivered();
   }
   static void wait_for_ten_more() {
-    EXPECT_TRUE(eventually([end = deliveries().size() + 10] { return deliveries().size() >= end; }));
+    EXPECT_TRUE(eventually([end = delivered().size() + 10] { return delivered().size() >= end; }));
   }
   /// Starts with frames and blocks without end, as fast as they are read.
   void start_endless() {
@@ -70,15 +69,14 @@ TEST_F(Capture, FramesArriveWithHeaderFlagsAndPlace) {
   card::queue_mjpeg(mjpeg(4, scan, 5016));
   card::script_motion(1u << 3);
   card::set_decoder_register(0, 0x5A, 0xF7);
+  card::set_decoder_register(1, 0x5A, 0xFE);
   ASSERT_THAT(
-      capture({"m 3 64 66051 10001", "j 4 447 5591 0"}),
-      UnorderedElementsAre("m 3 44 1020 10001", "m 9 64 1000 0", "m 3 64 66051 10001", "j 4 447 5591 0"));
-  std::map<std::string, Bytes> data;
-  for (const Delivery &got : deliveries()) data[got.line] = got.data;
-  const Bytes intra = data["m 3 44 1020 10001"], jpeg = data["j 4 447 5591 0"];
+      capture({"m 3 64 66051 10001", "j 4 447 5591 1"}),
+      UnorderedElementsAre("m 3 44 1020 10001", "m 9 64 1000 0", "m 3 64 66051 10001", "j 4 447 5591 1"));
+  const Bytes intra = data_of("m 3 44 1020 10001"), jpeg = data_of("j 4 447 5591 1");
   EXPECT_TRUE(std::equal(intra.begin(), intra.begin() + 20, zarvo::g_mpeg4_header.begin()));
   EXPECT_EQ(Bytes(intra.begin() + 20, intra.end()), stream);
-  EXPECT_EQ(data["m 9 64 1000 0"], stream);
+  EXPECT_EQ(data_of("m 9 64 1000 0"), stream);
   EXPECT_EQ(Bytes(&jpeg[565], &jpeg[569]), (Bytes{0, 240, 1, 96}));
   EXPECT_EQ(Bytes(jpeg.begin() + 593, jpeg.end()), Bytes(scan.begin(), scan.end() - 2));
   EXPECT_EQ(count(operations(), "ENC_IOC_MPEG4_REQUEST"), count(operations(), "ENC_IOC_MPEG4_DONE") + 1);
@@ -91,7 +89,7 @@ TEST_F(Capture, StatusIsPolledEachTenthOfASecondOfCaptureTime) {
   for (const u32 microseconds : {0, 50000, 99999, 100000})
     card::queue_mpeg4(mpeg4(kPredicted | 10, Bytes(10), 5, microseconds));
   card::script_motion(1 << 3);
-  on_delivery = [](const Delivery &) { card::script_motion(0); };
+  on_delivery = [](const std::string &) { card::script_motion(0); };
   const std::string moving = "m 3 64 10 10000", still = "m 3 64 10 0";
   EXPECT_THAT(capture({still}), ElementsAre(moving, moving, moving, still));
   EXPECT_EQ(count(issued(), "DISP_IOC_GET_MOTION 8"), 1u);  // the second asks with the bits it had
@@ -103,19 +101,20 @@ TEST_F(Capture, StartAndStopSendTheirCommandsOnce) {
   for (int i = 0; i < 2; ++i) ASSERT_EQ(zv_Start(handle), ZV_OK);
   ASSERT_TRUE(eventually([] { return count(operations(), "ENC_IOC_START") > 0; }));
   for (int i = 0; i < 2; ++i) ASSERT_EQ(zv_Stop(handle), ZV_OK);
-  const auto log = card::log();
-  const Lines all = operations(), lines = issued();
-  EXPECT_THAT(Lines(lines.begin(), lines.begin() + 3),
-              ElementsAre("read 0x310", "write 0x310 80000005", "ENC_IOC_START"));
-  ASSERT_EQ(lines.size(), 3 + 16 * 5 + 1u);
-  EXPECT_EQ(lines[3 + 2 * 5], "ENC_IOC_SET_SCALE 2 0");
-  EXPECT_EQ(lines.back(), "ENC_IOC_STOP");
+  const Lines all = operations();
   // Every pass: request, read, done, read; and no audio read without an enabled input.
-  EXPECT_EQ(count(all, "ENC_IOC_MPEG4_REQUEST"), count(all, "ENC_IOC_MPEG4_DONE"));
+  for (const char *other : {"ENC_IOC_MPEG4_DONE", "read encoder 0x100000", "read encoder 0xffc00"})
+    EXPECT_EQ(count(all, "ENC_IOC_MPEG4_REQUEST"), count(all, other));
   EXPECT_EQ(count(all, "read audio 0x4"), 0u);
-  for (const card::Call &call : log)
+  for (const card::Call &call : card::log())
     EXPECT_TRUE(call.value == 0 ||
                 (call.code != driver::ENC_IOC_STOP && call.operation != card::Operation::read));
+  const Lines lines = issued();
+  ASSERT_EQ(lines.size(), 3 + 16 * 5 + 1u);
+  EXPECT_THAT(Lines(lines.begin(), lines.begin() + 3),
+              ElementsAre("read 0x310", "write 0x310 80000005", "ENC_IOC_START"));
+  EXPECT_EQ(lines[3 + 2 * 5], "ENC_IOC_SET_SCALE 2 0");
+  EXPECT_EQ(lines.back(), "ENC_IOC_STOP");
 }
 
 TEST_F(Capture, StartRefusesAndRecovers) {
@@ -141,7 +140,8 @@ TEST_F(Capture, AudioBlocksOfTheMaskOnly) {
   EXPECT_EQ(zv_EnableAudioChannels(handle, 0x5), ZV_OK);
   for (const long result : {0, 192}) card::queue_audio({blocks, result});  // 0: no data yet, tried again
   EXPECT_THAT(capture({"a 2 96 48 0"}), ElementsAre("a 0 0 48 0", "a 2 96 48 0"));
-  EXPECT_EQ(deliveries()[1].data, Bytes(48, 2));
+  EXPECT_EQ(data_of("a 2 96 48 0"), Bytes(48, 2));
+  EXPECT_GE(count(operations(), "read audio 0x4"), 2u);
   EXPECT_EQ(kept().audio_mask, 0u);
 }
 
@@ -165,13 +165,11 @@ TEST_F(Capture, LimitsOfEveryField) {
 TEST_F(Capture, AnyBytes) {
   enable(0xFFFF);
   std::mt19937 random(20240229);
-  const long large = kReadsAreWatched ? 0x100002 : INT_MAX;
-  const long results[] = {1, 16, 17, 64, 700, 0xFFBFF, 0xFFC00, 0x100000, large, INT_MIN, -1};
   for (int i = 0; i < 400; ++i) {
     Bytes area(64 + random() % 64);
     for (u8 &byte : area) byte = static_cast<u8>(random());
     if (i % 2 == 0) area[1] = area[2] = area[3] = 0;  // half of them with a sound channel
-    const long result = results[random() % std::size(results)];
+    const long result = std::array{1, 17, 64, 0xFFC00, 0x100000, -1}[random() % 6];
     card::queue_mpeg4({area, result});
     card::queue_mjpeg({area, result});
   }
@@ -183,8 +181,8 @@ TEST_F(Capture, AnyBytes) {
 /// Catches: a callback after zv_Stop(), when files are closed; a frame delivered once the stop has begun.
 TEST_F(Capture, NothingArrivesAfterStop) {
   std::atomic<bool> held{false};
-  on_delivery = [&](const Delivery &got) {
-    if (got.line[0] != 'm' || held.exchange(true)) return;
+  on_delivery = [&](const std::string &got) {
+    if (got[0] != 'm' || held.exchange(true)) return;
     EXPECT_TRUE(eventually([] { return zarvo::start_flag == 0; }));
   };
   for (int round = 0; round < 3; ++round) {
@@ -203,8 +201,8 @@ TEST_F(Capture, NothingArrivesAfterStop) {
 TEST_F(Capture, StopFromACallbackEndsCaptureAndItStartsAgain) {
   std::atomic<char> stopper{0};
   std::atomic<int> status{-1};
-  on_delivery = [&](const Delivery &got) {
-    char stream = got.line[0];
+  on_delivery = [&](const std::string &got) {
+    char stream = got[0];
     if (!stopper.compare_exchange_strong(stream, 0)) return;
     status = zv_Stop(handle);
     EXPECT_TRUE(eventually([] { return zarvo::start_flag != 0; }));

@@ -137,6 +137,7 @@ TEST_F(Opening, PreviewScreenBelievesOnlyWhatFits) {
     EXPECT_EQ(zv_GetPreviewScreen(handle, &picture), result);
     const bool fits = index < 4 && result > 0 && result <= 0x240000;
     EXPECT_EQ(picture, fits ? zarvo::preview_buf[index] : nullptr) << index;
+    EXPECT_EQ(sent(), "read display 0x240000");
   }
 }
 

@@ -32,6 +32,11 @@ TEST_F(Picture, PropertiesGoToTheChannelsRegisters) {
   EXPECT_EQ(sent(), "");
 }
 
+TEST_F(Picture, ChannelNumbers) {
+  EXPECT_EQ(sent(zv_EnableVideoChannelNumber(handle, 6)), "ENC_IOC_CHANNEL_NUMBER_ON 6");
+  EXPECT_EQ(sent(zv_DisableVideoChannelNumber(handle, 7)), "ENC_IOC_CHANNEL_NUMBER_OFF 7");
+}
+
 /// Catches: rounding that drifts, so that a slider moves by itself when the panel reads the value back.
 TEST_F(Picture, PropertiesSurviveARoundTrip) {
   ZV_VIDEO_PROPERTY reg{}, back{};
