@@ -3,6 +3,7 @@
 #include <SDL.h>
 
 #include <QTest>
+#include <algorithm>
 #include <atomic>
 #include <csignal>
 #include <mutex>
@@ -85,12 +86,20 @@ TEST_F(PreviewTest, ShowsTheCardsPictureInAWindowOfTheChosenSize) {
     window.captions.clear();
     press(dialog->btnPreviewStart);
     EXPECT_FALSE(dialog->radioPAL->isEnabled());
-    ASSERT_TRUE(eventually([] { return std::lock_guard(window.mutex), window.captions.size() >= 2; }));
+    ASSERT_TRUE(eventually([] { return std::lock_guard(window.mutex), window.captions.size() >= 3; }));
+    virtual_card::record_log(true);
     press(dialog->btnPreviewStop);
     join_preview_thread();
+    const auto log = virtual_card::log();
+    EXPECT_EQ(std::ranges::count(log, zarvo::driver::DISP_IOC_PREVIEW_OFF, &virtual_card::Call::code), 1);
     EXPECT_EQ(std::pair(window.width, window.height), pal ? std::pair(720, 576) : std::pair(704, 480));
     EXPECT_EQ(window.captions[0], "Preview");
-    EXPECT_THAT(window.captions[1], testing::MatchesRegex("Preview FPS : [1-9][0-9]*"));
+    // However late the thread runs, a second holds no more pictures than have their turn in it.
+    for (const std::string &caption : {window.captions[1], window.captions[2]}) {
+      EXPECT_TRUE(caption.starts_with("Preview FPS : "));
+      const int rate = std::atoi(caption.substr(14).c_str());
+      EXPECT_TRUE(rate > 0 && rate <= (pal ? 26 : 31)) << rate;
+    }
     EXPECT_NE(window.plane, std::vector<Uint8>(window.plane.size(), window.plane[0]));
   }
 }
@@ -140,6 +149,20 @@ TEST_F(PreviewTest, ObeysStartAndStopInQuickSuccession) {
             expected);
 }
 
+// Catches, with ThreadSanitizer: a change of the layout that races with the thread's own.
+TEST_F(PreviewTest, TakesChangesWhileItStartsAndEnds) {
+  for (int n = 0; n < 10; ++n) {
+    dialog->StartPreview();
+    for (QAbstractButton *button : {static_cast<QAbstractButton *>(dialog->btnSplit4),
+                                    static_cast<QAbstractButton *>(dialog->btnSetFocus),
+                                    static_cast<QAbstractButton *>(g_check_handle[n])})
+      button->click();
+    dialog->StopPreview();
+    for (QRadioButton *button : {dialog->radioPAL, dialog->radio704, dialog->radioNTSC, dialog->radio720})
+      button->click();
+  }
+}
+
 // Neither a closed window nor a card that lies about lengths and buffers ends the preview. Ctrl-C ends
 // the program: it must not become an event that nobody reads.
 TEST_F(PreviewTest, GoesOnUntilItIsStopped) {
@@ -175,10 +198,11 @@ TEST_F(PreviewTest, CopiesRowByRowIntoAPaddedOverlay) {
   for (const std::size_t padding : {0, 16}) {
     ASSERT_EQ(InitialSDL(static_cast<int>(kWidth + padding), kHeight), 0);
     overlay->w = kWidth;
-    UpDataYUVScreen(picture.data(), kRow * 2 + 6);
     const std::size_t pitch = kRow + padding * 2;
+    std::fill_n(overlay->pixels[0], pitch * kHeight, Uint8{0});
+    UpDataYUVScreen(picture.data(), kRow * 2 + 6);
     for (std::size_t n = 0; n < pitch * kHeight; ++n)
-      EXPECT_EQ(window.plane[n] == 200, n % pitch < kRow && n < pitch * 2 + 6) << n;
+      EXPECT_EQ(window.plane[n], n % pitch < kRow && n < pitch * 2 + 6 ? 200 : 0) << n;
     UpDataYUVScreen(picture.data(), 1 << 30);
     CloseSDL();
   }

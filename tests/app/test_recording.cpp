@@ -176,7 +176,7 @@ TEST_F(Recording, AFullOrVanishedDiskStopsTheRecording) {
   for (const bool vanished : {false, true}) {
     for (const bool new_hour : {false, true}) {
       set_clock("2009-03-03 14:05:00");
-      fake_system::disk_free = 500;
+      fake_system::disk_free = 100;  // exactly the limit
       start(kCif, 1);
       ASSERT_EQ(g_finish_record, 0);
       fake_system::disk_free = 50;
