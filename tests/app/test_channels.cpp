@@ -57,6 +57,10 @@ TEST_F(Channels, StatusIsShownReadOnlyAndLeavesTheModes) {
   dialog->radioEnPreview->click();
   EXPECT_EQ(enabled_boxes(), 0xFFFFu);
   EXPECT_EQ(dialog->CheckCheckBox(), 0xFFFFu);
+  for (const bool on : {true, false}) {
+    (on ? dialog->btnMotionStart : dialog->btnMotionStop)->click();
+    EXPECT_EQ(dialog->btnMotionStop->isEnabled(), on);
+  }
 }
 
 }  // namespace

@@ -181,8 +181,10 @@ void expect_nothing_clipped(const QWidget *parent) {
     if (is_group(child)) {
       expect_nothing_clipped(child);
     } else {
-      const QSize text = child->fontMetrics().size(0, child->property("text").toString());
+      const char *const shown = qobject_cast<const QComboBox *>(child) != nullptr ? "currentText" : "text";
+      const QSize text = child->fontMetrics().size(0, child->property(shown).toString());
       EXPECT_EQ(child->size().expandedTo(text), child->size()) << name;
+      EXPECT_TRUE(!is_group(parent) || child->y() >= parent->fontMetrics().ascent()) << name;
     }
   }
 }

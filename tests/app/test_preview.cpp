@@ -224,8 +224,9 @@ TEST_F(PreviewTest, KeepsTheOperatorsChoiceWhenTheCardRefusesIt) {
   EXPECT_EQ(std::tuple(dialog->comboFrameRate->count(), +zv_config.interval), std::tuple(15, 0u));
 }
 
-// The program tries the card ten times before it uses it, and ends when it cannot be opened once.
-TEST(OpenCardDeathTest, EndsTheProgramWhenTheCardCannotBeOpened) {
+// The program tries the card ten times before it uses it; it ends when the card cannot be opened once, or
+// when the preview thread cannot be made.
+TEST(EndingDeathTest, EndsTheProgramWithoutCardOrThread) {
   testing::GTEST_FLAG(death_test_style) = "threadsafe";
   using virtual_card::Operation;
   const std::tuple<Operation, int, const char *> cases[] = {
@@ -233,30 +234,21 @@ TEST(OpenCardDeathTest, EndsTheProgramWhenTheCardCannotBeOpened) {
       {Operation::open, 4 * 9 + 2, "ERROR:zv_Open Error!, try count = 9\n$"},
       {Operation::open, 4 * 10 + 1, "ERROR:zv_Open Error!\n$"},
       {Operation::close, 1, "ERROR:zv_Close Error!, try count = 0\nERROR:zv_Open Error!, try count = 1\n$"},
+      {Operation::open, 100, "Create pthread error\n$"},
   };
   for (const auto &[operation, countdown, printed] : cases)
     EXPECT_EXIT(
         {
           dup2(STDERR_FILENO, STDOUT_FILENO);
           virtual_card::inject({.operation = operation, .countdown = countdown, .for_good = true});
-          const DemoDialog dialog;
+          DemoDialog dialog;
+          pthread_attr_t huge;
+          pthread_attr_init(&huge);
+          pthread_attr_setstacksize(&huge, std::size_t{1} << 46);  // no room for such a thread
+          pthread_setattr_default_np(&huge);
+          dialog.StartPreview();
         },
         testing::ExitedWithCode(1), printed);
-}
-
-TEST(NoThreadDeathTest, EndsTheProgramWhenThePreviewThreadCannotBeMade) {
-  testing::GTEST_FLAG(death_test_style) = "threadsafe";
-  EXPECT_EXIT(
-      {
-        dup2(STDERR_FILENO, STDOUT_FILENO);
-        DemoDialog dialog;
-        pthread_attr_t huge;
-        pthread_attr_init(&huge);
-        pthread_attr_setstacksize(&huge, std::size_t{1} << 46);  // no room for such a thread
-        pthread_setattr_default_np(&huge);
-        dialog.StartPreview();
-      },
-      testing::ExitedWithCode(1), "Create pthread error\n$");
 }
 
 }  // namespace

@@ -1,3 +1,4 @@
+#include <fcntl.h>
 #include <sys/stat.h>
 
 #include "recording_fixture.h"
@@ -16,6 +17,9 @@ constexpr std::size_t kHeader = 32;
 TEST_F(Recording, TreeNamesAndHeaderOfOneHour) {
   dialog->radioPAL->click();
   choose(dialog->comboQPvalue, 3);
+  const fs::path fifth = "Data/Video/20090303/CH05/20090303-14.rec";
+  fs::create_directories(fifth.parent_path());
+  std::ofstream(fifth) << std::string(1 << 20, 'x');  // of an earlier recording
   EXPECT_THAT(start(kD1, 0x11, 0x2),
               testing::StartsWith(std::string(kHalfFree) + "WriteEnableCh() : g_record_ch =   11\n"
                                                            "WriteEnableCh() : g_audio_ch=    2\n"));
@@ -24,9 +28,14 @@ TEST_F(Recording, TreeNamesAndHeaderOfOneHour) {
                                    "./Data/Video/20090303/CH05/20090303-14.rec"));
   EXPECT_TRUE(fs::is_directory("Data/Video/20090303/CH16") && fs::is_directory("Data/Audio/20090303/CH04"));
   EXPECT_FALSE(fs::exists("Data/Video/20090303/CH17") || fs::exists("Data/Audio/20090303/CH05"));
+  EXPECT_EQ(fcntl(fileno(g_fp_mpg4[4]), F_GETFD), FD_CLOEXEC);  // a player must not hold the file
+  EXPECT_TRUE(eventually([&] { return fs::file_size(fifth) > kHeader; }));
   dialog->btnRecordStop->click();
-  const std::string expected("MPG4\xD0\2\0\0\x40\2\0\0\x19\0\0\0Channel 5\0\0\0\0\0\0", kHeader);
-  EXPECT_EQ(content_of("Data/Video/20090303/CH05/20090303-14.rec").substr(0, kHeader), expected);
+  const std::string expected("MPG4\xD0\2\0\0\x40\2\0\0\x19\0\0\0Channel 5\0\0\0\0\0\0\0\0\0\1\0",
+                             kHeader + 4);
+  const std::string content = content_of(fifth);
+  EXPECT_EQ(content.substr(0, expected.size()), expected);
+  EXPECT_NE(content.back(), 'x');
   EXPECT_EQ(fs::file_size("Data/Audio/20090303/CH02/20090303-14.aud") % 48, 0u);
 }
 

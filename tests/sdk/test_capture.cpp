@@ -1,6 +1,7 @@
 // Tests of capture: what the callbacks get of sound and of malformed frames, and stops at awkward moments.
 
 #include <climits>
+#include <csignal>
 #include <cstring>
 #include <random>
 
@@ -89,9 +90,18 @@ TEST_F(Capture, StatusIsPolledEachTenthOfASecondOfCaptureTime) {
   for (const u32 microseconds : {0, 50000, 99999, 100000})
     card::queue_mpeg4(mpeg4(kPredicted | 10, Bytes(10), 5, microseconds));
   card::script_motion(1 << 3);
-  on_delivery = [](const std::string &) { card::script_motion(0); };
+  const auto signals_blocked = [] {
+    sigset_t blocked;
+    pthread_sigmask(SIG_BLOCK, nullptr, &blocked);
+    return sigismember(&blocked, SIGINT) == 1;
+  };
+  on_delivery = [&](const std::string &) {
+    card::script_motion(0);
+    EXPECT_TRUE(signals_blocked());
+  };
   const std::string moving = "m 3 64 10 10000", still = "m 3 64 10 0";
   EXPECT_THAT(capture({still}), ElementsAre(moving, moving, moving, still));
+  EXPECT_FALSE(signals_blocked());
   EXPECT_EQ(count(issued(), "DISP_IOC_GET_MOTION 8"), 1u);  // the second asks with the bits it had
 }
 

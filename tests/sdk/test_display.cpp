@@ -80,11 +80,12 @@ TEST_F(Display, OnePictureOfSixteen) {
   EXPECT_EQ(display->window[15].scale, 5u);
   EXPECT_EQ(zv_display_pos2channel(display, 176, 120), 5);
   EXPECT_EQ(zv_display_pos2channel(display, 703, 479), 15);
-  EXPECT_EQ(zv_display_pos2channel(display, 704, 0), -1);  // 16 pixels on the right are left over
+  EXPECT_EQ(zv_display_pos2channel(display, 704, 0), -1);             // 16 pixels on the right are left over
+  std::swap(display->window[0].channel, display->window[6].channel);  // as the focus does
   ASSERT_EQ(zv_display_select_channel(display, 6), 0);
   const Lines lines = issued();
-  EXPECT_EQ(lines[7], "DISP_IOC_SET_WINDOW 6 6 1 0 0 720 480 1");
-  EXPECT_EQ(lines[8], "DISP_IOC_SET_WINDOW 7 7 0 0 0 0 0 1");
+  EXPECT_EQ(lines[1], "DISP_IOC_SET_WINDOW 0 6 1 0 0 720 480 1");
+  EXPECT_EQ(lines[7], "DISP_IOC_SET_WINDOW 6 0 0 0 0 0 0 1");
   EXPECT_EQ(lines[21], "DISP_IOC_SET_GRID 0 718 0 0 0 0 478 0 0 0 1 0");
   EXPECT_EQ(zv_GetPreviewMode(handle), 0u);
 }

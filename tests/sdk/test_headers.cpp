@@ -10,7 +10,7 @@
 
 namespace {
 
-class Headers : public SdkTest {};
+using Headers = SdkTest;
 
 /// Catches: a header of the wrong size, with which players show garbage or nothing.
 TEST_F(Headers, Mpeg4DescribesThePicture) {

@@ -5,7 +5,7 @@
 
 namespace {
 
-class Picture : public SdkTest {};
+using Picture = SdkTest;
 
 using Values = std::array<i32, 4>;
 Values values(const ZV_VIDEO_PROPERTY &p) {

@@ -89,8 +89,10 @@ TEST_F(Watchdog, StatusAndVersion) {
     card::script_board_replies(0x3A, {reply});
     EXPECT_EQ(zv_GetHardwareVersion(handle), version);
   }
-  card::inject({.operation = card::Operation::ioctl});
-  EXPECT_EQ(zv_GetHardwareVersion(handle), 3u);
+  for (const auto &[error, version] : {std::pair(EINTR, 0u), {EIO, 3u}}) {  // EINTR: asked again
+    card::inject({.operation = card::Operation::ioctl, .error = error});
+    EXPECT_EQ(zv_GetHardwareVersion(handle), version);
+  }
 }
 
 TEST_F(Watchdog, RegistersPrintTheirLine) {
