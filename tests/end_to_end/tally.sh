@@ -31,6 +31,7 @@ case $1 in
     expect_lines 16 'expected 359, missing (1[5-9]|2[0-9])[0-9], longest gap (6.9|7|8)' stdout
     expect_lines 4 'expected 7[45][0-9], missing [34][0-9]{2}, longest gap (6.9|7|8)' stdout
     expect_lines 20 'are missing' stderr
+    expect_lines 0 'frames/s' stderr # not a terminal
     ;;
   # Opens and reads of the card fail from second 2 on.
   vanish)
@@ -40,6 +41,11 @@ case $1 in
     expect "no line says that the streams have stopped" wait_until 30 told
     kill -TERM "$RECORDER"
     expect_end 3
+    ;;
+  terminal)
+    command=$(printf '%q ' "${ON_CARD[@]}" "$ZARVO_RECORD" --seconds 3 --channels 1 --output "$FOLDER/out")
+    script -qec "$command" /dev/null >"$FOLDER/stdout" || [ $? -eq 3 ] || die "$(cat "$FOLDER/stdout")"
+    expect_lines 1 '[12] s: [0-9]+ frames/s, [0-9]+ kbit/s, [0-9]+ missing' stdout
     ;;
   # The limit comes down while the file grows: the kernel sends SIGXFSZ, and the write fails.
   limit)
