@@ -38,6 +38,9 @@ expect_equal() { [ "$2" = "$3" ] || die "$1: expected '$2', got '$3'"; }
 # expect_decodes FILE...: every file must exist and decode without an error line.
 expect_decodes() { report_streams "$@" || die "not all recordings decode"; }
 
+# readme_block LANGUAGE: the code block of the README in that language.
+readme_block() { awk -v begin="\`\`\`$1" '$0 == "```" { inside = 0 } inside; $0 == begin { inside = 1 }' "$ZARVO_ROOT/README.md"; }
+
 # open_program: starts the demo application in $FOLDER/work, on an invisible display.
 open_program() {
   mkdir -p "$FOLDER/work/Data"

@@ -8,9 +8,6 @@
 # quietly COMMAND...: runs it and shows its output only if it fails.
 quietly() { "$@" >"$FOLDER/log" 2>&1 || die "$*: $(cat "$FOLDER/log")"; }
 
-# block LANGUAGE: the code block of the README in that language.
-block() { awk -v begin="\`\`\`$1" '$0 == "```" { inside = 0 } inside; $0 == begin { inside = 1 }' "$ZARVO_ROOT/README.md"; }
-
 # record_with NAME: the program recorder in the folder NAME must record 150 frames.
 record_with() {
   local frames
@@ -24,8 +21,8 @@ record_with() {
 with_cmake() {
   local folder=$FOLDER/$1
   mkdir "$folder"
-  block cmake | sed "$2" >"$folder/CMakeLists.txt"
-  block c | tee "$folder/main.c" >"$folder/main.cpp"
+  readme_block cmake | sed "$2" >"$folder/CMakeLists.txt"
+  readme_block c | tee "$folder/main.c" >"$folder/main.cpp"
   quietly cmake -G Ninja -S "$folder" -B "$folder" "${@:3}"
   quietly cmake --build "$folder"
   record_with "$1"
@@ -35,7 +32,7 @@ with_cmake() {
 with_pkg_config() {
   local flags
   mkdir "$FOLDER/$1"
-  block c >"$FOLDER/$1/main.c"
+  readme_block c >"$FOLDER/$1/main.c"
   flags=$(PKG_CONFIG_PATH=$2/lib/pkgconfig pkg-config --cflags --libs "${@:3}" zarvo-sdk)
   (cd "$FOLDER/$1" && eval "quietly cc main.c $flags -o recorder '-Wl,-rpath,$2/lib'")
   record_with "$1"
