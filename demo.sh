@@ -56,6 +56,7 @@ run_window() {
 
 run_record() {
   local log=$RESULTS/record.log pictures=$RESULTS/record/pictures status=0 line file frames files=() saved=()
+  case " $* " in *" -h "* | *" --help "* | *" --version "*) exec "$BUILD/examples/zarvo_record" "$@" ;; esac
   say "Recording without the program: zarvo_record --seconds 5 $*"
   rm -rf "$RESULTS/record"
   "${ON_CARD[@]}" "$BUILD/examples/zarvo_record" --seconds 5 --output "$RESULTS/record" "$@" 2>&1 | tee "$log" || status=$?
@@ -68,7 +69,6 @@ run_record() {
       ;;
   esac
   mapfile -t files < <(sed -nE 's/: [0-9]+ (frames|blocks), [0-9]+ bytes, .*//p' "$log")
-  [ ${#files[@]} -gt 0 ] || return 0 # --help records nothing
 
   say "What ffprobe and ffmpeg say about each file (codec, width, height, frames; audio: codec, rate, blocks)"
   report_streams "${files[@]}" || FAILED=1
