@@ -195,7 +195,7 @@ TEST_F(PreviewTest, LeavingWaitsForTheThreadBeforeTheCardIsClosed) {
 TEST_F(PreviewTest, CopiesRowByRowIntoAPaddedOverlay) {
   constexpr std::size_t kWidth = 16, kHeight = 4, kRow = kWidth * 2;
   std::vector<Uint8> picture(kRow * kHeight, 200);
-  for (const std::size_t padding : {0, 16}) {
+  for (const std::size_t padding : {0u, 16u}) {
     ASSERT_EQ(InitialSDL(static_cast<int>(kWidth + padding), kHeight), 0);
     overlay->w = kWidth;
     const std::size_t pitch = kRow + padding * 2;

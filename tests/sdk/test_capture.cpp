@@ -87,7 +87,7 @@ TEST_F(Capture, FramesArriveWithHeaderFlagsAndPlace) {
 /// Catches: a card polled at every frame, or flags that are never refreshed.
 TEST_F(Capture, StatusIsPolledEachTenthOfASecondOfCaptureTime) {
   enable(1);
-  for (const u32 microseconds : {0, 50000, 99999, 100000})
+  for (const u32 microseconds : {0u, 50000u, 99999u, 100000u})
     card::queue_mpeg4(mpeg4(kPredicted | 10, Bytes(10), 5, microseconds));
   card::script_motion(1 << 3);
   const auto signals_blocked = [] {

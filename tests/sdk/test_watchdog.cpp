@@ -33,7 +33,7 @@ TEST_F(Watchdog, StartsOnceFeedsEveryThirtySecondsAndStops) {
   faults.clock_ms = 1000;
   enable_watchdog();
   enable_watchdog();
-  for (unsigned kicks : {1, 2}) {
+  for (unsigned kicks : {1u, 2u}) {
     pass(29999);
     EXPECT_EQ(card::counters().watchdog_kicks, kicks);
     pass(1);

@@ -18,7 +18,7 @@ class NodePreview : public NodeTest {
   std::vector<u8> buffer(u32 index, long size = kPreviewBufferSize) {
     EXPECT_EQ(send(display, DISP_IOC_SELECT_BUFFER, index), 0);
     void *mapped = mmap(nullptr, kPreviewBufferSize, PROT_READ, MAP_SHARED, display, 0);
-    const std::vector<u8> bytes(static_cast<u8 *>(mapped), static_cast<u8 *>(mapped) + size);
+    std::vector<u8> bytes(static_cast<u8 *>(mapped), static_cast<u8 *>(mapped) + size);
     munmap(mapped, kPreviewBufferSize);
     return bytes;
   }
