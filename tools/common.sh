@@ -42,7 +42,7 @@ install_missing() {
   apt=("${as_root[@]}" "${apt[@]}" -o Acquire::Retries=2 -o Acquire::http::Timeout=30)
   "${apt[@]}" update -qq -o APT::Update::Error-Mode=any || reached=0
   size=$("${apt[@]}" install --assume-no --no-install-recommends "${missing[@]}" | sed -nE \
-    's/^Need to get (.*) of archives.*/\1 to fetch, /p; s/^After this operation, (.*) of additional.*/\1 on disk/p' | tr -d '\n')
+    's/^Need to get (.*) of archives.*/\1 to fetch, /p; s/^After this operation, (.*) of additional.*/\1 on disk/p' | tr -d '\n' || true)
   if [ -z "$size" ]; then
     [ $reached -eq 1 ] || die "cannot reach the package servers; these packages are missing: $names"
     die "the package servers of this system do not have all these packages (those of Debian 12 do): $names"
