@@ -149,15 +149,14 @@ void Camera::draw_scene() {
 }
 
 void Camera::draw(const Field &field) {
-  const u32 parity = field.parity();
-  if (drawn_[parity] == field.number) return;
-  drawn_[parity] = field.number;
-  if (look_.lost) return;
-  if (film_) {
+  std::int64_t &drawn = drawn_[field.parity()];
+  if (drawn == field.number) return;
+  if (film_ && !look_.lost) {
     draw_film(field);
-  } else if (look_.scene == Scene::moving) {
+  } else if (look_.scene == Scene::moving && !look_.lost) {
     draw_moving(field);
   }
+  drawn = field.number;
 }
 
 void Camera::draw_moving(const Field &field) {

@@ -47,12 +47,13 @@ std::vector<View> views(const CardState &state) {
 
 void Compositor::PlaneScaler::prepare(u32 in_width, u32 out_width) {
   if (in_width == in_width_ && out_width == out_width_) return;
+  in_width_ = 0;  // after a bad_alloc the next call starts again
+  for (auto &buffer : buffer_) buffer.resize(in_width);
+  taps_.resize(out_width);
   in_width_ = in_width;
   out_width_ = out_width;
   halved_width_ = in_width;
   while (halved_width_ >= 2 * out_width_ && halved_width_ % 2 == 0) halved_width_ /= 2;
-  for (auto &buffer : buffer_) buffer.resize(in_width);
-  taps_.resize(out_width);
   for (u32 i = 0; i < out_width; ++i) {
     const u32 at = std::min(i * halved_width_ * kOne / out_width, (halved_width_ - 1) * kOne);
     const u32 first = at / kOne;

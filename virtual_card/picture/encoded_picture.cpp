@@ -70,10 +70,10 @@ double picture_rate(u32 interval_code, bool interlaced, u32 standard) {
 void scale_picture(const Picture &from, u32 parity, EncodedSize size, EncodedPicture &to) {
   const u32 chroma_width = size.width / 2;
   const u32 fields = size.interlaced ? 2 : 1;
-  to.size = size;
   to.y.resize(std::size_t{size.width} * size.height);
   to.cb.resize(to.y.size() / 4);
   to.cr.resize(to.y.size() / 4);
+  to.size = size;
 
   for (u32 line = 0; line < size.height; ++line) {
     const u32 source = size.interlaced ? line : 2 * line + parity;

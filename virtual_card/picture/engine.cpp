@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <array>
 #include <atomic>
+#include <functional>
 #include <mutex>
 #include <optional>
 #include <thread>
@@ -62,8 +63,8 @@ void Engine::Parts::take_films() {
   const std::lock_guard lock(films_mutex);
   for (unsigned i = 0; i < kChannels; ++i) {
     if (!new_films[i]) continue;
-    channels[i]->camera().show_film(std::move(*new_films[i]));
-    new_films[i].reset();
+    channels[i]->camera().show_film(*new_films[i]);
+    new_films[i].reset();  // only now: after a bad_alloc the next field tries again
   }
 }
 
@@ -87,20 +88,21 @@ void Engine::field(const CardState &state, const Field &field) {
   parts.last = field;
   parts.take_films();
 
+  // From here on nothing is allocated, so that each frame for which memory runs out is counted.
   std::array<Channel::Work, kChannels> work;
-  std::vector<unsigned> busy;
+  std::array<unsigned, kChannels> busy{};
+  std::size_t jobs = 0;
   for (unsigned i = 0; i < kChannels; ++i) {
     work[i] = parts.channels[i]->work(state, field.number);
-    if (work[i].any()) busy.push_back(i);
+    if (work[i].any()) busy[jobs++] = i;
   }
-  if (!busy.empty()) {
-    parts.pool.run(busy.size(), [&](std::size_t job) {
-      parts.channels[busy[job]]->process(state, field, work[busy[job]]);
-    });
-  }
+  const auto process = [&](std::size_t job) {
+    parts.channels[busy[job]]->process(state, field, work[busy[job]]);
+  };
+  if (jobs != 0) parts.pool.run(jobs, std::ref(process));
   // Queue in the order of the channels, in whatever order they became ready.
-  for (const unsigned channel : busy) {
-    if (work[channel].size) parts.queue_output(channel, field.wall_time);
+  for (unsigned i = 0; i < kChannels; ++i) {
+    if (work[i].size) parts.queue_output(i, field.wall_time);
   }
   u32 motion = 0;
   for (unsigned i = 0; i < kChannels; ++i) {

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <array>
 #include <cstdio>
+#include <new>
 
 #include <jerror.h>
 #include <jpeglib.h>
@@ -20,7 +21,8 @@ constexpr u32 kStripLines = 2 * DCTSIZE;
 
 struct Failure {};
 
-[[noreturn]] void fail(j_common_ptr) {
+[[noreturn]] void fail(j_common_ptr jpeg) {
+  if (jpeg->err->msg_code == JERR_OUT_OF_MEMORY) throw std::bad_alloc();
   throw Failure{};
 }
 void say_nothing(j_common_ptr) {}
@@ -79,13 +81,16 @@ struct JpegEncoder::Compressor {
     errors.error_exit = fail;
     errors.output_message = say_nothing;
     fine_jpeg.err = &errors;
-    jpeg_create_compress(&jpeg);
-    jpeg_create_decompress(&fine_jpeg);
-    jpeg.dest = &sink;
   }
   ~Compressor() {
     jpeg_destroy_compress(&jpeg);
     jpeg_destroy_decompress(&fine_jpeg);
+  }
+  /// Not part of the constructor, so that the destructor frees what exists after a bad_alloc.
+  void create() {
+    jpeg_create_compress(&jpeg);
+    jpeg_create_decompress(&fine_jpeg);
+    jpeg.dest = &sink;
   }
   void abort() {
     jpeg_abort_compress(&jpeg);
@@ -146,7 +151,9 @@ struct JpegEncoder::Compressor {
   }
 };
 
-JpegEncoder::JpegEncoder() : compressor_(std::make_unique<Compressor>()) {}
+JpegEncoder::JpegEncoder() : compressor_(std::make_unique<Compressor>()) {
+  compressor_->create();
+}
 JpegEncoder::~JpegEncoder() = default;
 
 std::vector<u8> JpegEncoder::encode(const EncodedPicture &picture, bool fine) {
@@ -156,6 +163,9 @@ std::vector<u8> JpegEncoder::encode(const EncodedPicture &picture, bool fine) {
   } catch (const Failure &) {
     compressor_->abort();
     return {};
+  } catch (const std::bad_alloc &) {
+    compressor_->abort();
+    throw;
   }
   const Sink &sink = compressor_->sink;
   const auto begin = sink.bytes.begin();

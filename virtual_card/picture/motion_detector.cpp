@@ -19,6 +19,12 @@ constexpr u32 kMaxColumns = driver::kMotionMapSide;
 
 }  // namespace
 
+void MovedBlocks::resize(u32 new_columns, u32 new_rows) {
+  moved.assign(std::size_t{new_columns} * new_rows, 0);
+  columns = new_columns;
+  rows = new_rows;
+}
+
 MotionDetector::MotionDetector() {
   map_.fill(kDefaultMotionLevel);
 }
@@ -43,13 +49,11 @@ bool MotionDetector::looks_at(std::int64_t field) {
 void MotionDetector::look(const Picture &picture, std::int64_t field) {
   const u32 field_height = picture.lines / 2;
   const bool comparable = seen_.width == picture.width && seen_.lines == field_height;
-  blocks_.columns = picture.width / driver::kMotionBlock;
-  blocks_.rows = picture.lines / driver::kMotionBlock;
-  blocks_.moved.assign(std::size_t{blocks_.columns} * blocks_.rows, 0);
+  blocks_.resize(picture.width / driver::kMotionBlock, picture.lines / driver::kMotionBlock);
   if (!comparable) {
+    seen_.y.resize(std::size_t{picture.width} * field_height);
     seen_.width = picture.width;
     seen_.lines = field_height;
-    seen_.y.resize(std::size_t{picture.width} * field_height);
   }
 
   const std::lock_guard lock(mutex_);

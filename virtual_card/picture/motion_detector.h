@@ -21,6 +21,8 @@ struct MovedBlocks {
   u32 rows = 0;
   std::vector<u8> moved;  ///< columns x rows values, row by row; non-zero: motion
 
+  /// Clears all blocks. On bad_alloc nothing has changed.
+  void resize(u32 new_columns, u32 new_rows);
   bool at(u32 column, u32 row) const {
     return column < columns && row < rows && moved[std::size_t{row} * columns + column] != 0;
   }

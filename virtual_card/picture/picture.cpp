@@ -31,12 +31,12 @@ Colour colour_from_hsv(double hue, double saturation, double value) {
 }
 
 void Picture::resize(u32 new_width, u32 new_lines) {
-  width = new_width;
-  lines = new_lines;
-  const std::size_t pixels = std::size_t{width} * lines;
+  const std::size_t pixels = std::size_t{new_width} * new_lines;
   y.assign(pixels, kBlack.y);
   cb.assign(pixels / 2, kBlack.cb);
   cr.assign(pixels / 2, kBlack.cr);
+  width = new_width;
+  lines = new_lines;
 }
 
 Area clip(Area area, u32 width, u32 lines) {

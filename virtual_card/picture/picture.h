@@ -50,12 +50,14 @@ constexpr Lines field_lines(u32 parity) {
   return {parity, 2};
 }
 
+/// A resize or a copy changes the planes first and then the size: after a bad_alloc the planes are at least
+/// as large as the size says.
 struct Picture {
-  u32 width = 0;
-  u32 lines = 0;
   std::vector<u8> y;   ///< width x lines
   std::vector<u8> cb;  ///< width / 2 x lines
   std::vector<u8> cr;
+  u32 width = 0;
+  u32 lines = 0;
 
   void resize(u32 new_width, u32 new_lines);
   u8 *y_line(u32 line) { return y.data() + std::size_t{line} * width; }
