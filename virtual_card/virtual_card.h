@@ -155,6 +155,7 @@ struct Call {
   int protection = 0;        ///< mmap
   int flags = 0;             ///< open and mmap
   long result = 0;           ///< result that the host received; 0 for a mapping
+  int error = 0;             ///< errno of a call that failed
 };
 
 /// Clears the log and starts it, or stops it. The log is off at first.

@@ -7,6 +7,7 @@
 #include <array>
 #include <atomic>
 #include <mutex>
+#include <new>
 #include <vector>
 
 namespace virtual_card::descriptors {
@@ -93,10 +94,15 @@ int find(Device device) {
   return -1;
 }
 
-void add_mapping(void *address, std::size_t length, Device device) {
+bool add_mapping(void *address, std::size_t length, Device device) {
   const std::lock_guard lock(mapping_mutex);
-  mapping_list().push_back({reinterpret_cast<std::uintptr_t>(address), end_of(address, length), device});
+  try {
+    mapping_list().push_back({reinterpret_cast<std::uintptr_t>(address), end_of(address, length), device});
+  } catch (const std::bad_alloc &) {
+    return false;
+  }
   ++mapping_count;
+  return true;
 }
 
 std::optional<Device> mapping(const void *address, std::size_t length) {

@@ -36,7 +36,8 @@ Owner remove(int fd);
 /// Returns an open descriptor of the device, or -1.
 int find(Device device);
 
-void add_mapping(void *address, std::size_t length, Device device);
+/// Adds a mapping. Returns false when memory runs out.
+bool add_mapping(void *address, std::size_t length, Device device);
 /// Returns the device of a mapping that overlaps this range, if there is one.
 std::optional<Device> mapping(const void *address, std::size_t length);
 /// Removes the mappings that lie completely in this range. Returns their number.

@@ -14,6 +14,7 @@
 #include <new>
 #include <string_view>
 #include <system_error>
+#include <utility>
 
 #include "descriptors.h"
 #include "nodes/card.h"
@@ -30,11 +31,10 @@ bool is_node(const char *path) {
   return path != nullptr && std::strncmp(path, kPrefix.data(), kPrefix.size()) == 0;
 }
 
-/// Runs a call of the card. A result from -4095 to -1 is a negated error number: it goes into errno, and the
-/// call returns -1. Results below -4095 are returned unchanged, as libc does.
+/// Runs a call of the card. A negated error number goes into errno, and the call returns -1. Results below
+/// -kMaxError are returned unchanged, as libc does.
 template <typename Function>
 long answer(Function call) {
-  constexpr long kMaxError = 4095;
   const int before = errno;
   long result = 0;
   try {
@@ -191,11 +191,13 @@ void *mmap(real::Name spelling, void *address, std::size_t length, int protectio
   const Owner node = (flags & MAP_ANONYMOUS) != 0 ? Owner{} : owner(fd);
   if (!node.ours) return real::mmap(spelling, address, length, protection, flags, fd, offset);
   void *mapped = MAP_FAILED;
-  answer_for(node, [&](Card &card) {
+  answer_for(node, [&](Card &card) -> long {
     const MapRequest request{address, length, protection, flags, offset};
     const long result = card.mmap(node.device, fd, request, mapped);
-    if (result == 0) descriptors::add_mapping(mapped, length, node.device);
-    return result;
+    if (result != 0 || descriptors::add_mapping(mapped, length, node.device)) return result;
+    real::munmap(std::exchange(mapped, MAP_FAILED), length);
+    card.unmapped(1);
+    return -ENOMEM;
   });
   return mapped;
 }

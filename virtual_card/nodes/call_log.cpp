@@ -1,7 +1,17 @@
 // The log of calls on device nodes.
 #include "call_log.h"
 
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
 #include <iomanip>
+#include <new>
+#include <sstream>
+
+#include "host/files.h"
+#include "host/real_calls.h"
 
 namespace virtual_card {
 namespace {
@@ -9,7 +19,8 @@ namespace {
 constexpr const char *kOperations[] = {"open", "close", "ioctl", "read", "mmap", "munmap"};
 constexpr const char *kDevices[] = {"encoder", "display", "audio", "video_input", "none"};
 
-void write_line(std::ostream &out, const Call &call, const char *name) {
+std::string line_of(const Call &call, const char *name) {
+  std::ostringstream out;
   out << kDevices[static_cast<int>(call.device)] << ' ' << kOperations[static_cast<int>(call.operation)];
   out << std::hex << std::setfill('0');
   if (name != nullptr)
@@ -20,16 +31,26 @@ void write_line(std::ostream &out, const Call &call, const char *name) {
   for (const std::uint8_t byte : call.argument) out << std::setw(2) << static_cast<unsigned>(byte);
   out << std::dec;
   if (call.size != 0) out << " size " << call.size;
-  out << " = " << call.result << '\n' << std::flush;
+  out << " = " << call.result;
+  if (call.error != 0) {
+    const char *error = strerrorname_np(call.error);
+    out << ' ' << (error != nullptr ? error : std::to_string(call.error));
+  }
+  out << '\n';
+  return out.str();
 }
 
 }  // namespace
+
+CallLog::~CallLog() {
+  if (file_ > STDERR_FILENO) real::close(file_);
+}
 
 void CallLog::record(bool on) {
   const std::lock_guard lock(mutex_);
   recording_ = on;
   if (on) calls_.clear();
-  on_ = on || file_.is_open();
+  on_ = on || file_ >= 0;
 }
 
 std::vector<Call> CallLog::calls() const {
@@ -37,18 +58,46 @@ std::vector<Call> CallLog::calls() const {
   return calls_;
 }
 
-bool CallLog::write_to(const std::string &path) {
+bool CallLog::write_to(const std::string &path, std::string &error) {
   const std::lock_guard lock(mutex_);
-  file_.open(path);
-  on_ = recording_ || file_.is_open();
-  return file_.is_open();
+  const long fd = path == "/dev/stderr" ? STDERR_FILENO : create_file(path);
+  if (fd < 0) {
+    error = fd == -EINVAL ? "not a regular file" : std::strerror(static_cast<int>(-fd));
+    return false;
+  }
+  file_ = static_cast<int>(fd);
+  ::fstat(file_, &identity_);
+  on_ = true;
+  return true;
 }
 
-void CallLog::add(Call call, const char *name) {
+void CallLog::end_file(const char *reason) {
+  std::fprintf(stderr, "virtual card: the log ends here: %s\n", reason);
+  file_ = -1;
+  on_ = recording_;
+}
+
+void CallLog::write_line(const Call &call, const char *name) {
+  struct stat now {};
+  const bool same =
+      ::fstat(file_, &now) == 0 && now.st_ino == identity_.st_ino && now.st_dev == identity_.st_dev;
+  if (!same && file_ != STDERR_FILENO) return end_file("the program has closed its file");
+  if (const long error = write_all(file_, line_of(call, name)))
+    end_file(std::strerror(static_cast<int>(-error)));
+}
+
+void CallLog::add(Call call, long result, const char *name) noexcept {
   if (!on()) return;
+  const bool failed = result < 0 && result >= -kMaxError;
+  call.result = failed ? -1 : result;
+  call.error = failed ? static_cast<int>(-result) : 0;
   const std::lock_guard lock(mutex_);
-  if (file_.is_open()) write_line(file_, call, name);
-  if (recording_) calls_.push_back(std::move(call));
+  try {
+    if (file_ >= 0) write_line(call, name);
+    if (recording_) calls_.push_back(std::move(call));
+  } catch (const std::bad_alloc &) {
+    // The call has been carried out, whether or not it is in the log.
+  }
 }
 
 }  // namespace virtual_card

@@ -100,8 +100,8 @@ void Card::apply_options() {
   for (const auto &[channel, path] : options.films)
     if (options.error.empty() && !board_.engine.show_film(channel, path, &reason))
       options.error = "option \"camera" + std::to_string(channel + 1) + "\": " + reason;
-  if (!options.log_file.empty() && options.error.empty() && !board_.log.write_to(options.log_file))
-    options.error = "option \"log\": cannot write " + options.log_file;
+  if (!options.log_file.empty() && options.error.empty() && !board_.log.write_to(options.log_file, reason))
+    options.error = "option \"log\": cannot write " + options.log_file + ": " + reason;
   if (!options.error.empty())
     std::fprintf(stderr, "virtual card: ZARVO_VIRTUAL_CARD: %s\n", options.error.c_str());
 }
@@ -109,11 +109,6 @@ void Card::apply_options() {
 DeviceNode *Card::node(Device device) {
   const auto index = static_cast<std::size_t>(device);
   return index < nodes_.size() ? nodes_[index].get() : nullptr;
-}
-
-void Card::log(Call call, long result) {
-  call.result = result < 0 ? -1 : result;
-  board_.log.add(std::move(call));
 }
 
 void Card::stop_if_unused() {
@@ -139,13 +134,13 @@ long Card::open(Device device, int flags, int sibling) {
     stop_if_unused();
     return fd;
   }();
-  log(std::move(call), result);
+  board_.log.add(std::move(call), result);
   return result;
 }
 
 long Card::close(Device device) {
   const long result = -board_.injector.strike(Operation::close, device);
-  log({Operation::close, device}, result);
+  board_.log.add({Operation::close, device}, result);
   return result;
 }
 
@@ -163,7 +158,7 @@ long Card::read(Device device, std::uintptr_t buffer, std::size_t count) {
     Call call{Operation::read, device};
     call.value = buffer;
     call.size = count;
-    log(std::move(call), result);
+    board_.log.add(std::move(call), result);
   }
   return result;
 }
@@ -187,7 +182,7 @@ long Card::mmap(Device device, int fd, const MapRequest &request, void *&mapped)
     ++mapped_;
     return 0;
   }();
-  log(std::move(call), result);
+  board_.log.add(std::move(call), result);
   return result;
 }
 
@@ -195,7 +190,7 @@ long Card::munmap(Device device, std::size_t length) {
   Call call{Operation::munmap, device};
   call.size = length;
   const long result = -board_.injector.strike(Operation::munmap, device);
-  log(std::move(call), result);
+  board_.log.add(std::move(call), result);
   return result;
 }
 

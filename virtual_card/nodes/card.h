@@ -68,7 +68,6 @@ class Card {
   void apply_options();
   DeviceNode *node(Device device);
   void stop_if_unused();
-  void log(Call call, long result);
 
   Board board_;
   std::array<std::unique_ptr<DeviceNode>, 4> nodes_;

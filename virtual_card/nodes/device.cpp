@@ -19,8 +19,7 @@ long DeviceNode::ioctl(u32 code, std::uintptr_t argument) {
   logged.code = code;
   logged.value = argument;
   const long result = run(code, row, argument, &logged);
-  logged.result = result < 0 ? -1 : result;
-  board_.log.add(std::move(logged), row == nullptr ? nullptr : row->name);
+  board_.log.add(std::move(logged), result, row == nullptr ? nullptr : row->name);
   return result;
 }
 

@@ -8,9 +8,11 @@
 #include <algorithm>
 #include <bit>
 #include <cerrno>
+#include <cstdio>
 #include <cstring>
 #include <utility>
 
+#include "host/files.h"
 #include "host/real_calls.h"
 
 namespace virtual_card {
@@ -27,6 +29,7 @@ int make_file(const char *name, std::size_t size, bool close_on_exec) {
   constexpr std::intptr_t kSeals = F_SEAL_SHRINK | F_SEAL_GROW | F_SEAL_SEAL;
   const int fd = ::memfd_create(name, flags);
   if (fd < 0) return -errno;
+  const FileLimitFails no_signal;
   if (::ftruncate(fd, static_cast<off_t>(size)) == 0 && fcntl(fd, F_ADD_SEALS, kSeals) == 0) return fd;
   const int error = errno;
   real::close(fd);
@@ -41,6 +44,15 @@ long Region::open(int sibling, bool close_on_exec) {
     return fd < 0 ? -errno : fd;
   }
   release();
+  const long fd = make_memory(close_on_exec);
+  if (fd < 0)
+    std::fprintf(
+        stderr, "virtual card: cannot make the memory of /dev/%s, %zu KiB: %s\n", name_, size_ / 1024,
+        fd == -EFBIG ? "the file size limit (ulimit -f) is lower" : std::strerror(static_cast<int>(-fd)));
+  return fd;
+}
+
+long Region::make_memory(bool close_on_exec) {
   const int fd = make_file(name_, size_, close_on_exec);
   if (fd < 0 || size_ == 0) return fd;
   void *memory = real::mmap(real::Name::mmap, nullptr, size_, PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0);

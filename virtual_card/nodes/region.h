@@ -22,7 +22,8 @@ class Region {
   Region &operator=(const Region &) = delete;
 
   /// Returns a new descriptor for the host, or a negated error number. `sibling` is an open descriptor of the
-  /// node, or -1: then the memory is new and all zeros.
+  /// node, or -1: then the memory is new and all zeros. If it cannot be made, a line on standard error says
+  /// why.
   long open(int sibling, bool close_on_exec);
   /// Removes the card's mapping. The host's mappings stay valid.
   void release();
@@ -38,6 +39,8 @@ class Region {
   }
 
  private:
+  long make_memory(bool close_on_exec);
+
   const char *name_;
   std::size_t size_;
   std::mutex mutex_;  // guards memory_: the last close must not unmap it during a read

@@ -1,9 +1,13 @@
 // Reads a video file and loops it.
 #include "film.h"
 
+#include <sys/stat.h>
+
 #include <algorithm>
 #include <array>
+#include <cerrno>
 #include <cmath>
+#include <cstring>
 #include <utility>
 
 extern "C" {
@@ -34,6 +38,19 @@ std::string reason(int error) {
   return text.data();
 }
 
+/// Opens a regular file, by libav's file protocol only: no name may lead to the network, and no pipe may keep
+/// the host waiting.
+std::string open_file(const std::string &path, AVFormatContext **format) {
+  struct stat status {};
+  if (::stat(path.c_str(), &status) != 0) return std::strerror(errno);
+  if (!S_ISREG(status.st_mode)) return "not a regular file";
+  AVDictionary *options = nullptr;
+  av_dict_set(&options, "protocol_whitelist", "file", 0);
+  const int result = avformat_open_input(format, ("file:" + path).c_str(), nullptr, &options);
+  av_dict_free(&options);
+  return result < 0 ? reason(result) : std::string();
+}
+
 }  // namespace
 
 std::shared_ptr<Film> Film::open(const std::string &path, std::string *error) {
@@ -52,9 +69,7 @@ std::shared_ptr<Film> Film::open(const std::string &path, std::string *error) {
 
 std::string Film::open_stream(const std::string &path) {
   AVFormatContext *format = nullptr;
-  if (const int result = avformat_open_input(&format, path.c_str(), nullptr, nullptr); result < 0) {
-    return reason(result);
-  }
+  if (std::string problem = open_file(path, &format); !problem.empty()) return problem;
   format_.reset(format);
   if (const int result = avformat_find_stream_info(format, nullptr); result < 0) return reason(result);
   const AVCodec *codec = nullptr;
