@@ -50,6 +50,7 @@ TEST_F(NodeTest, TheLogTellsEveryCallWithItsRecord) {
   for (std::size_t n = 0; n < log.size(); ++n)
     EXPECT_EQ(std::tie(log[n].operation, log[n].device, log[n].code, log[n].result, log[n].size), expected[n])
         << n;
+  EXPECT_EQ(std::pair(log[3].error, log[8].error), std::pair(ENOTTY, ENOENT));
   EXPECT_EQ(log[0].flags, O_RDWR);
   ASSERT_EQ(log[1].argument.size(), sizeof(driver::MotionMap) + sizeof thresholds);
   EXPECT_EQ(log[1].argument[4], 2);

@@ -1,5 +1,7 @@
 // The library as a file: what it exports, what it leans on, and how it behaves when preloaded.
 
+#include <sys/stat.h>
+
 #include <cstdio>
 #include <cstdlib>
 #include <set>
@@ -76,9 +78,9 @@ std::string opened(const std::string &nodes, const std::string &options = "") {
 TEST(Preload, TheCardIsThereForThisProgramOnlyAndSilent) {
   EXPECT_EQ(opened("/dev/zarvo_enc0 /dev/zarvo_disp0 /dev/null"), "");
   EXPECT_THAT(opened("/dev/zarvo_dec0"), HasSubstr("No such file"));
-  EXPECT_THAT(preloaded("sh -c 'echo $LD_PRELOAD; env'"), testing::Not(HasSubstr("libzarvo_virtual_card")));
-  EXPECT_THAT(preloaded("printenv LD_PRELOAD", "", ":libdl.so.2 libm.so.6"),
-              testing::EndsWith("libdl.so.2:libm.so.6\n"));
+  const std::string child = "sh -c 'exec 3</dev/zarvo_enc0; echo $LD_PRELOAD; env'";
+  EXPECT_THAT(preloaded(child), testing::Not(HasSubstr("libzarvo_virtual_card")));
+  EXPECT_THAT(preloaded(child, "", ":libdl.so.2 libm.so.6"), HasSubstr("libdl.so.2:libm.so.6\n"));
 }
 
 TEST(Preload, OptionsComeFromTheEnvironment) {
@@ -90,9 +92,20 @@ TEST(Preload, OptionsComeFromTheEnvironment) {
                             "[^\n]*\n[^\n]*Invalid argument\n[^\n]*Invalid argument\n"));
   EXPECT_THAT(opened("/dev/zarvo_enc0", "camera2=/no/such.mp4"), HasSubstr("option \"camera2\": "));
   const std::string file = testing::TempDir() + "card_log_" + std::to_string(getpid());
-  opened("/dev/zarvo_vin0", "log=" + file);
-  EXPECT_THAT(output_of("cat " + file), HasSubstr("video_input open = "));
+  opened("/dev/zarvo_vin0 /dev/zarvo_dec0", "log=" + file);
+  EXPECT_THAT(output_of("cat " + file),
+              testing::MatchesRegex("video_input open = [0-9]+\n[^\n]*\nnone open = -1 ENOENT\n"));
   unlink(file.c_str());
+}
+
+// Catches: a limit that ends the program by a signal; a pipe without a reader that holds it for ever.
+TEST(Preload, WhatTheCardCannotHaveIsNamed) {
+  const std::string limited = "'ulimit -f 100; exec head -qc0 /dev/zarvo_enc0'";
+  EXPECT_THAT(preloaded("bash -c " + limited), HasSubstr("file size limit"));
+  const std::string pipe = testing::TempDir() + "card_pipe_" + std::to_string(getpid());
+  mkfifo(pipe.c_str(), 0600);
+  EXPECT_THAT(opened("/dev/zarvo_enc0", "log=" + pipe), HasSubstr("not a regular file"));
+  unlink(pipe.c_str());
 }
 
 }  // namespace

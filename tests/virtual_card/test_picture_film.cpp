@@ -1,5 +1,7 @@
 // Films in front of a camera.
 
+#include <sys/stat.h>
+
 #include <filesystem>
 #include <fstream>
 
@@ -96,9 +98,14 @@ TEST_F(PictureTest, MovementInAFilmIsMotion) {
 TEST_F(PictureTest, BadFilmsAreRefusedWithAReasonAndTheCameraStays) {
   encode(0, kCif, 1);
   const Folder folder;
-  const std::string files[] = {folder.path / "missing.mp4", folder.path, folder.file("empty.avi", ""),
+  const std::string files[] = {folder.path / "missing.mp4",
+                               folder.path,
+                               folder.file("empty.avi", ""),
                                folder.file("text.mp4", "no film, but words"),
-                               folder.file("short.y4m", "YUV4MPEG2 W64 H48 F10:1 Ip A1:1 C420\nFRAME\nabc")};
+                               folder.file("short.y4m", "YUV4MPEG2 W64 H48 F10:1 Ip A1:1 C420\nFRAME\nabc"),
+                               folder.path / "pipe",           // waits for a writer if it is opened
+                               "file:" + folder.clip(2, 25)};  // a URL, which may lead anywhere
+  mkfifo(files[5].c_str(), 0600);
   for (const std::string &path : files) {
     std::string error;
     EXPECT_FALSE(engine.show_film(0, path, &error)) << path;

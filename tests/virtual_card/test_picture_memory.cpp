@@ -31,10 +31,11 @@ namespace {
 
 class Memory : public PictureTest {
  protected:
-  /// Makes everything allocate again, for a larger picture, while one allocation fails. Then composes the same
-  /// preview in each run. Returns false when the work needs fewer allocations.
+  /// Makes everything allocate again, for a larger picture, while one allocation fails. Then composes the
+  /// same preview in each run. Returns false when the work needs fewer allocations.
   bool run(long failing) {
     power_up();
+    for (card::FrameQueue *queue : {&mpeg4, &mjpeg}) queue->reset_counters();
     encode(0, kHalfD1);
     state.channel[0].encoder.number_overlay = true;
     state.motion_enable = 1;

@@ -57,6 +57,7 @@ long answer(Function call) {
 /// Held while a descriptor of a node is opened, copied or closed: while open() copies a descriptor, no other
 /// thread may close it and reuse its number.
 constinit std::mutex node_mutex;
+constinit bool left_preload_list = false;  // guarded by node_mutex
 
 int open_node(const char *path, int flags) {
   return static_cast<int>(answer([&]() -> long {
@@ -64,6 +65,7 @@ int open_node(const char *path, int flags) {
     const Device device = device_of(path);
     Card &card = Card::instance();
     const std::lock_guard lock(node_mutex);
+    if (!std::exchange(left_preload_list, true)) leave_preload_list();
     const int sibling = device == Device::none ? -1 : descriptors::find(device);
     const long fd = card.open(device, flags, sibling);
     if (fd < 0) return fd;
@@ -119,7 +121,6 @@ void close_nodes(unsigned first, unsigned last) {
 struct AtLoad {
   AtLoad() {
     descriptors::settle();
-    leave_preload_list();
     pthread_atfork(
         [] {
           node_mutex.lock();

@@ -15,8 +15,8 @@ const char *base_name(const char *path) {
 }
 
 /// Removes the entries of a list whose file name is `name`; returns true when no entry is left. Edits the
-/// list in place, which is possible because it only gets shorter. setenv() cannot be used: a shell may
-/// replace it with its own function, which does not work this early.
+/// list in place, which is possible because it only gets shorter: a host that keeps pointers to its
+/// environment sees the change too.
 bool remove_from_list(char *list, const char *name) {
   const std::size_t length = std::strlen(name);
   char *to = list;
