@@ -58,7 +58,7 @@ class Capture {
   explicit Capture(bool mpeg4) {
     virtual_card::reset();
     virtual_card::set_clock(virtual_card::ClockMode::manual);
-    virtual_card::set_nowait(true);
+    virtual_card::apply("nowait");
     virtual_card::set_supply(bench::ready_made_supply(kFrameSize, mpeg4, !mpeg4, kFrames));
   }
   ~Capture() { virtual_card::clear_supply(); }

@@ -24,6 +24,13 @@ inline constexpr u32 kMaxLines = kPal.lines;
 /// The motion threshold of every block at power-up.
 inline constexpr u16 kDefaultMotionLevel = 12;
 
+/// What is in front of a camera. A film, if there is one, hides it.
+enum class Scene {
+  moving,  ///< bars, a moving object, a running clock
+  still,   ///< bars and the channel number; nothing moves
+  black    ///< black, like a covered lens
+};
+
 struct EncoderSettings {
   u32 scale_code = 0;     ///< 0 off, 1 half D1, 2 CIF, 9 D1
   u32 interval_code = 0;  ///< bits 0-7 skip, bit 9 drop mode

@@ -12,7 +12,7 @@ bool FrameQueue::push(ReadyFrame frame) {
   {
     const std::lock_guard lock(mutex_);
     const std::size_t size = frame.area.size();
-    const bool fits = bytes_ + size <= capacity_;
+    const bool fits = bytes_ + size <= capacity_ && frames_.size() < max_frames_;
     if (fits) {
       frames_.push_back(std::move(frame));
       bytes_ += size;
@@ -60,6 +60,17 @@ void FrameQueue::passed() {
   const std::lock_guard lock(mutex_);
   ++counters_.made;
   ++counters_.delivered;
+}
+
+void FrameQueue::lost_after_all() {
+  const std::lock_guard lock(mutex_);
+  --counters_.delivered;
+  ++counters_.lost;
+}
+
+void FrameQueue::limit_frames(std::optional<std::int64_t> frames) {
+  const std::lock_guard lock(mutex_);
+  max_frames_ = frames ? static_cast<std::size_t>(*frames) : ~std::size_t{0};
 }
 
 void FrameQueue::missed(std::uint64_t frames) {

@@ -44,6 +44,10 @@ class FrameQueue {
   void clear();
   /// Counts a frame that a read returned without the queue.
   void passed();
+  /// Counts a frame that was popped as lost instead of delivered.
+  void lost_after_all();
+  /// Limits the number of frames as well; none: only `capacity` counts.
+  void limit_frames(std::optional<std::int64_t> frames);
   /// Counts frames as lost that the card could not make, or not in time.
   void missed(std::uint64_t frames);
   void reset_counters();
@@ -54,6 +58,7 @@ class FrameQueue {
   std::condition_variable filled_;
   std::deque<ReadyFrame> frames_;
   std::size_t capacity_;
+  std::size_t max_frames_ = ~std::size_t{0};
   std::size_t bytes_ = 0;
   std::uint64_t wakes_ = 0;
   StreamCounters counters_;

@@ -1,6 +1,6 @@
 /**
  * @file virtual_card.h
- * Control of the virtual card for tests and benchmarks: unplug cameras, move the clock, inject faults, read
+ * Control of the virtual card for tests and benchmarks: unplug cameras, move the clock, break it, read
  * counters. Programs that only use the card do not need this header.
  *
  * All functions may be called from any thread. The first use of a device node or of this interface creates
@@ -53,26 +53,21 @@ void advance(std::chrono::microseconds time);
 /// Manual clock: advances by whole frames of the current standard; rounding errors do not add up.
 void advance_frames(int frames);
 
-// --- Cameras and audio inputs ------------------------------------------------------------------
+// --- Items -------------------------------------------------------------------------------------
 
-enum class Scene {
-  moving,  ///< bars, a moving object, a running clock
-  still,   ///< bars and the channel number; nothing moves
-  black    ///< black, like a covered lens
+/// Applies a line of items, the language of ZARVO_VIRTUAL_CARD and of zarvo_card, e.g.
+/// "lost=3; @5-8 stall=mpeg4". Times count from now in card time. A line replaces what earlier lines said of
+/// the same names: "lost=" only undoes it, and "reset" undoes everything. Throws std::invalid_argument, which
+/// says what is possible, for a wrong line; then nothing has changed.
+void apply(const std::string &line);
+
+/// A row of the table of items, for people.
+struct ItemText {
+  std::string usage;   ///< e.g. "lost=CHANNELS"
+  std::string values;  ///< the possible values
+  std::string effect;  ///< what the host sees
 };
-
-/// Unplug or plug a camera. An unplugged camera has a blue picture and no motion, and its decoder's video bit
-/// is clear.
-void unplug_camera(unsigned channel);
-void plug_camera(unsigned channel);
-/// Sets the scene in front of a camera. A film, if there is one, hides it.
-void set_scene(unsigned channel, Scene scene);
-/// Puts a video file in front of a camera; an empty path removes it. Returns false, with the reason in
-/// `error`, when the file cannot be read as video.
-bool show_film(unsigned channel, const std::string &path, std::string *error = nullptr);
-/// Switch the sound of an audio input off or on. Without sound the decoder's audio bit is clear.
-void silence_input(unsigned input);
-void sound_input(unsigned input);
+std::vector<ItemText> items();
 
 // --- Ready-made data ---------------------------------------------------------------------------
 
@@ -114,9 +109,6 @@ void set_supply(Supply supply);
 /// Ends the supply: the card's encoders deliver again.
 void clear_supply();
 
-/// Makes reads of an empty stream return at once instead of waiting up to 10 ms, as other drivers may do.
-void set_nowait(bool on);
-
 // --- Registers and replies ---------------------------------------------------------------------
 
 /// Read and write registers of the chips. A write has the same effects as the driver's register command.
@@ -131,8 +123,6 @@ void set_decoder_register(unsigned chip, unsigned address, std::uint8_t value);
 /// After them it replies normally. If a scripted reply is not the confirming one, the command is not carried
 /// out.
 void script_board_replies(std::uint32_t command, std::vector<std::uint32_t> replies);
-/// Sets the reply to the version command 0x3A: 0x00, 0xBB, 0xCC or 0xDD.
-void set_board_version(std::uint32_t reply);
 /// Makes DISP_IOC_GET_MOTION return these bits instead of the detected motion, until reset().
 void script_motion(std::uint32_t bits);
 /// Sets the motion threshold of all blocks of a channel, which VIN_IOC_GET_MOTION_LEVELS then returns. 0xFFFF
@@ -163,26 +153,6 @@ void record_log(bool on);
 /// Returns the calls on device nodes since record_log(true), in order.
 std::vector<Call> log();
 
-// --- Faults ------------------------------------------------------------------------------------
-
-/// Makes an operation on the device nodes fail with `error`: the `countdown`-th matching operation from now
-/// (1 is the next), and with `for_good` all that follow. `device` none matches every node, `code` 0 every
-/// command. A failing operation does nothing, except close: it fails and still closes the descriptor, as in
-/// Linux.
-struct Fault {
-  Operation operation;
-  int countdown = 1;
-  bool for_good = false;
-  int error = EIO;
-  Device device = Device::none;
-  std::uint32_t code = 0;
-};
-/// Sets the fault and the number of hits to 0. There is only one fault: it replaces an earlier one.
-void inject(Fault fault);
-void clear_fault();
-/// Returns how many operations the fault has made fail.
-int fault_hits();
-
 // --- Counters ----------------------------------------------------------------------------------
 
 struct StreamCounters {
@@ -196,6 +166,7 @@ struct Counters {
   StreamCounters mjpeg;
   StreamCounters audio;
   std::uint64_t previews = 0;         ///< preview pictures composed
+  std::uint64_t failed_calls = 0;     ///< calls that the item "fail" has made fail
   std::uint64_t watchdog_kicks = 0;   ///< times the watchdog was started or fed
   std::uint64_t watchdog_resets = 0;  ///< times the watchdog would have reset the machine
   bool watchdog_running = false;

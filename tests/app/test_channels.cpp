@@ -45,7 +45,7 @@ TEST_F(Channels, EachModeKeepsItsOwnSet) {
 
 // Fault: radio buttons that refuse to be unchecked would show a mode that is not edited.
 TEST_F(Channels, StatusIsShownReadOnlyAndLeavesTheModes) {
-  virtual_card::unplug_camera(2);
+  virtual_card::apply("lost=3");
   virtual_card::script_motion(0x8005);
   dialog->radioEnPreview->click();
   EXPECT_EQ(printed_by([&] { dialog->btnVideoStatus->click(); }), "g_video_ch = 4\n");

@@ -125,11 +125,9 @@ TEST_F(PreviewTest, EndsAtOnceWhenAStartUpCheckFails) {
 }
 
 TEST_F(PreviewTest, StartsAgainAfterTheCardVanished) {
-  using virtual_card::Operation, virtual_card::Device;
-  virtual_card::inject(
-      {.operation = Operation::read, .countdown = 3, .for_good = true, .device = Device::display});
+  virtual_card::apply("fail=display/read:ENODEV::2");
   EXPECT_EQ(printed_by_thread(), "Start video thread\nERROR:zv_GetPreviewScreen Error!\n" + kEnd);
-  virtual_card::clear_fault();
+  virtual_card::apply("fail=");
   dialog->StartPreview();
   wait_for_pictures(3);
 }
@@ -228,19 +226,18 @@ TEST_F(PreviewTest, KeepsTheOperatorsChoiceWhenTheCardRefusesIt) {
 // when the preview thread cannot be made.
 TEST(EndingDeathTest, EndsTheProgramWithoutCardOrThread) {
   testing::GTEST_FLAG(death_test_style) = "threadsafe";
-  using virtual_card::Operation;
-  const std::tuple<Operation, int, const char *> cases[] = {
-      {Operation::open, 1, "ERROR:zv_Open Error!, try count = 0\n$"},
-      {Operation::open, 4 * 9 + 2, "ERROR:zv_Open Error!, try count = 9\n$"},
-      {Operation::open, 4 * 10 + 1, "ERROR:zv_Open Error!\n$"},
-      {Operation::close, 1, "ERROR:zv_Close Error!, try count = 0\nERROR:zv_Open Error!, try count = 1\n$"},
-      {Operation::open, 100, "Create pthread error\n$"},
+  const std::pair<const char *, const char *> cases[] = {
+      {"fail=any/open:EIO", "ERROR:zv_Open Error!, try count = 0\n$"},
+      {"fail=any/open:EIO::37", "ERROR:zv_Open Error!, try count = 9\n$"},
+      {"fail=any/open:EIO::40", "ERROR:zv_Open Error!\n$"},
+      {"fail=any/close:EIO", "ERROR:zv_Close Error!, try count = 0\nERROR:zv_Open Error!, try count = 1\n$"},
+      {"fail=any/open:EIO::99", "Create pthread error\n$"},
   };
-  for (const auto &[operation, countdown, printed] : cases)
+  for (const auto &[item, printed] : cases)
     EXPECT_EXIT(
         {
           dup2(STDERR_FILENO, STDOUT_FILENO);
-          virtual_card::inject({.operation = operation, .countdown = countdown, .for_good = true});
+          virtual_card::apply(item);
           DemoDialog dialog;
           pthread_attr_t huge;
           pthread_attr_init(&huge);

@@ -173,7 +173,7 @@ void SdkTest::close_leaving_nothing() {
 }
 
 void SdkTest::TearDown() {
-  card::clear_fault();
+  card::apply("fail=");
   EXPECT_EQ(zv_Stop(handle), ZV_OK);
   close_leaving_nothing();
 }

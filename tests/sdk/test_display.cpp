@@ -167,7 +167,7 @@ TEST_F(Display, ZoomFreezesTheLayout) {
   EXPECT_EQ(zv_GetPreviewMode(handle), 1u);
   EXPECT_EQ(zv_display_zoom(display, 0, 0, 0), -1);
   EXPECT_EQ(zv_SetPreviewMode(handle, 0), ZV_OK);
-  card::inject({.operation = card::Operation::ioctl, .code = driver::DISP_IOC_SET_ZOOM});
+  card::apply("fail=any/ioctl/DISP_IOC_SET_ZOOM:EIO:1");
   EXPECT_EQ(zv_display_zoom(display, 0, 0, 0), -1);
   EXPECT_EQ(display->zoom, 1u);
   EXPECT_EQ(zv_display_zoom(display, 0, 0, 0), 0);

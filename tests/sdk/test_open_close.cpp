@@ -36,19 +36,19 @@ TEST_F(Opening, SendsTheCommandsOfOpenAndCloseInOrder) {
 
 /// Catches: a failure half way through opening that leaks, crashes, or leaves the SDK unable to open again.
 TEST_F(Opening, EveryFailureIsUndone) {
-  const auto fail = [](card::Operation operation) {
-    return [=](int nth) { card::inject({.operation = operation, .countdown = nth}); };
+  const auto fail = [](const std::string &operation) {
+    return [=](int nth) { card::apply("fail=any/" + operation + ":EIO:1:" + std::to_string(nth - 1)); };
   };
   const std::tuple<std::function<void(int)>, int, int> kinds[] = {
-      {fail(card::Operation::open), 4, ZV_ERR_OPEN},
-      {fail(card::Operation::mmap), 5, ZV_ERR_NO_MEMORY},
+      {fail("open"), 4, ZV_ERR_OPEN},
+      {fail("mmap"), 5, ZV_ERR_NO_MEMORY},
       {[](int nth) { faults.malloc_countdown = nth; }, 4, ZV_ERR_NO_MEMORY},
-      {fail(card::Operation::ioctl), 11, ZV_OK}};  // commands may fail: nothing depends on them
+      {fail("ioctl"), 11, ZV_OK}};  // commands may fail: nothing depends on them
   ASSERT_EQ(zv_Close(handle), ZV_OK);
   for (const auto &[fail_nth, calls, failure] : kinds)
     for (int nth = 1; nth <= calls + 1; ++nth) {
       const int expected = nth <= calls ? failure : ZV_OK;
-      card::clear_fault();
+      card::apply("fail=");
       fail_nth(nth);
       handle = nullptr;
       EXPECT_EQ(printed_by([&] { EXPECT_EQ(zv_Open(&handle), expected) << nth; }),
@@ -63,7 +63,7 @@ TEST_F(Opening, EveryFailureIsUndone) {
 /// Catches: a failed close that closes a number twice, when it may be somebody else's.
 TEST_F(Opening, CloseGoesOnAfterAFailure) {
   for (int failing = 1; failing <= 4; ++failing) {
-    card::inject({.operation = card::Operation::close, .countdown = failing});
+    card::apply("fail=any/close:EIO:1:" + std::to_string(failing - 1));
     EXPECT_EQ(zv_Close(handle), ZV_ERR_CLOSE);
     HANDLE second = nullptr;
     EXPECT_EQ(zv_Open(&second), ZV_ERR_ALREADY_OPEN);

@@ -75,8 +75,7 @@ TEST_F(Picture, MotionThresholdsAndAreas) {
     EXPECT_EQ(sent(zv_MarkMotionArea(handle, 3, &area.rect, area.mark)), area.map);
 
   // A refused map: the number is stored all the same.
-  card::inject(
-      {.operation = card::Operation::ioctl, .for_good = true, .code = driver::VIN_IOC_SET_MOTION_MAP});
+  card::apply("fail=any/ioctl/VIN_IOC_SET_MOTION_MAP:EIO");
   const ZV_RECT block{0, 0, 16, 16};
   EXPECT_EQ(zv_SetMotionSensitivity(handle, 4, 77), ZV_ERR_DEVICE);
   EXPECT_EQ(zv_MarkMotionArea(handle, 4, &block, 1), ZV_ERR_DEVICE);
@@ -92,7 +91,7 @@ TEST_F(Picture, MotionOnOffAndStatus) {
   EXPECT_EQ(sent(zv_StopMotionDetection(handle)),
             "read 0x260; write 0x260 55; DISP_IOC_MOTION_TRACE_OFF; write 0x268 ffff");
   card::script_motion(0xABCD0005);
-  card::unplug_camera(2);
+  card::apply("lost=3");
   EXPECT_EQ(zv_GetMotionStatus(handle), 1u);
   EXPECT_EQ(kept().motion_status, 1u);  // the next frames are tagged with it
 }

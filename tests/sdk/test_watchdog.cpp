@@ -89,8 +89,8 @@ TEST_F(Watchdog, StatusAndVersion) {
     card::script_board_replies(0x3A, {reply});
     EXPECT_EQ(zv_GetHardwareVersion(handle), version);
   }
-  for (const auto &[error, version] : {std::pair(EINTR, 0u), {EIO, 3u}}) {  // EINTR: asked again
-    card::inject({.operation = card::Operation::ioctl, .error = error});
+  for (const auto &[error, version] : {std::pair("EINTR", 0u), {"EIO", 3u}}) {  // EINTR: asked again
+    card::apply(std::string("fail=any/ioctl:") + error + ":1");
     EXPECT_EQ(zv_GetHardwareVersion(handle), version);
   }
 }

@@ -120,16 +120,13 @@ TEST_F(NodeTest, DecodersTellOfCamerasAndInputs) {
   const auto status = [&](u8 chip) {
     return reply(video_input, VIN_IOC_READ_TW2815, DecoderRegister{chip, kDecoderStatus, 0}).value;
   };
-  card::unplug_camera(0);
-  card::unplug_camera(13);
-  card::silence_input(2);
+  card::apply("lost=1,14;silent=3");
   EXPECT_EQ(status(0), 0xBE);
   EXPECT_EQ(status(3), 0x0D);
-  card::plug_camera(0);
-  card::sound_input(2);
+  card::apply("lost=14;silent=");
   EXPECT_EQ(status(0), 0xFF);
   card::set_decoder_register(1, kDecoderStatus, 0x0E);
-  card::unplug_camera(6);
+  card::apply("lost=7");
   EXPECT_EQ(status(1), 0x0E) << "what a test sets holds";
 
   EXPECT_EQ(card::decoder_register(3, 0x3A), 128);

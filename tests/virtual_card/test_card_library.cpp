@@ -85,12 +85,12 @@ TEST(Preload, TheCardIsThereForThisProgramOnlyAndSilent) {
 
 TEST(Preload, OptionsComeFromTheEnvironment) {
   EXPECT_THAT(opened("/dev/zarvo_enc0", "absent"), HasSubstr("No such file"));
-  EXPECT_THAT(opened("/dev/zarvo_enc0", "vanish=0-1000"), HasSubstr("No such device"));
+  EXPECT_THAT(opened("/dev/zarvo_enc0", "@0 vanish"), HasSubstr("No such device"));
   EXPECT_THAT(
       opened("/dev/zarvo_enc0 /dev/zarvo_disp0", "lots=3"),
-      testing::MatchesRegex("virtual card: ZARVO_VIRTUAL_CARD: option \"lots\" is unknown; possible are "
+      testing::MatchesRegex("virtual card: ZARVO_VIRTUAL_CARD: item \"lots\" is unknown; possible are "
                             "[^\n]*\n[^\n]*Invalid argument\n[^\n]*Invalid argument\n"));
-  EXPECT_THAT(opened("/dev/zarvo_enc0", "camera2=/no/such.mp4"), HasSubstr("option \"camera2\": "));
+  EXPECT_THAT(opened("/dev/zarvo_enc0", "camera2=/no/such.mp4"), HasSubstr("item \"camera2\": "));
   const std::string file = testing::TempDir() + "card_log_" + std::to_string(getpid());
   opened("/dev/zarvo_vin0 /dev/zarvo_dec0", "log=" + file);
   EXPECT_THAT(output_of("cat " + file),

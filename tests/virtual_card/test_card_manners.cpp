@@ -59,8 +59,7 @@ TEST_F(NodeTest, ARunningCardTakesCommands) {
     send(video_input, driver::VIN_IOC_SET_STANDARD, channel);
     send(video_input, driver::VIN_IOC_SET_MOTION_MAP,
          driver::MotionMap{channel, 0, 0, 64, 64, thresholds.data()});
-    card::set_scene(channel, round % 3 == 0 ? card::Scene::still : card::Scene::moving);
-    card::show_film(channel, "");
+    card::apply(round % 3 == 0 ? "still=1-2" : "still=;drop=mpeg4:2");
     const auto previews = card::counters().previews;
     EXPECT_TRUE(eventually([&] { return card::counters().previews > previews; }));
     reply(display, driver::DISP_IOC_GET_MOTION, u32{});

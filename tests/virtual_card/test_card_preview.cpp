@@ -32,7 +32,7 @@ class NodePreview : public NodeTest {
   }
   /// Shows a still channel in the first window.
   void preview_on(u32 channel = 0, u32 x_end = 720) {
-    card::set_scene(channel, card::Scene::still);
+    card::apply("still=1-16");
     EXPECT_EQ(send(display, DISP_IOC_PREVIEW_ON), 0);
     EXPECT_EQ(send(video_input, VIN_IOC_WRITE_REG, Register{kRegRouting, channel << kRoutingShift}), 0);
     EXPECT_EQ(
@@ -66,7 +66,7 @@ TEST_F(NodePreview, ThereIsNoneUntilItIsOnAndNoneAfterTheLastClose) {
 // Catches: a card that composes into the buffer the host still draws from.
 TEST_F(NodePreview, TheBufferInTheHostsHandsIsLeftAlone) {
   preview_on(0);
-  card::set_scene(0, card::Scene::moving);
+  card::apply("still=");
   for (int frames = 1; frames <= 9; ++frames) {
     u32 index = 0;
     card::advance_frames(1);
@@ -129,7 +129,7 @@ TEST_F(NodePreview, WhatTheChipsAreToldIsSeen) {
 
 TEST_F(NodePreview, MotionIsReportedAndMarkedWhereItIsSwitchedOn) {
   preview_on(6);
-  card::set_scene(6, card::Scene::moving);
+  card::apply("still=");
   EXPECT_EQ(send(display, DISP_IOC_WRITE_REG, Register{kRegMotionEnable, 1u << 22}), 0);
   const auto marks = [&] {
     const auto bytes = picture(6);

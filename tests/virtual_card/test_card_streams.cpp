@@ -101,7 +101,7 @@ TEST_F(NodeStreams, ASupplyIsDeliveredRoundAndRoundUpToItsLimit) {
 // Catches: encoder commands that are kept but reach no frame.
 TEST_F(NodeStreams, EncoderCommandsChangeTheFrames) {
   encode(2, 1);
-  card::set_scene(2, card::Scene::still);
+  card::apply("still=3");
   start();
   const auto sizes = [&] {
     card::advance_frames(1);

@@ -2,6 +2,7 @@
 #include "board.h"
 
 #include <cerrno>
+#include <cstdio>
 
 namespace virtual_card {
 namespace {
@@ -31,24 +32,24 @@ u32 PreviewBuffers::next() const {
 }
 
 Board::Board()
-    : mpeg4(kVideoQueue),
-      mjpeg(kVideoQueue),
-      audio(kAudioQueue),
+    : mpeg4(StreamKind::mpeg4, kVideoQueue),
+      mjpeg(StreamKind::mjpeg, kVideoQueue),
+      audio(StreamKind::audio, kAudioQueue),
       engine(mpeg4.queue, mjpeg.queue, audio.queue) {}
 
 void Board::reset() {
+  apply("reset");
   const std::lock_guard lock(mutex);
   settings = BoardSettings{};
   preview = PreviewBuffers{};
   encoding = false;
-  nowait = false;
-  options = Options{};
+  power_up_error.clear();
   clock.power_up(ClockMode::real_time, 1.0);
-  injector.reset();
+  call_faults.reset_hits();
   log.record(false);
   clear_supply();
   for (Stream *stream : {&mpeg4, &mjpeg, &audio}) {
-    stream->queue.clear();
+    stream->clear();
     stream->queue.reset_counters();
   }
   engine.reset();
@@ -61,12 +62,14 @@ long Board::set_standard(u32 standard) {
 }
 
 void Board::write_codec(u32 address, u32 value) {
+  if (conditions.stuck.contains(address)) return;
   settings.codec.write(address, value);
   settings.state.motion_enable = settings.codec.read(driver::kRegMotionEnable) >> driver::kMotionEnableShift;
   settings.state.mjpeg_quality = settings.codec.read(driver::kRegMjpegQuality);
 }
 
 void Board::write_video_input(u32 address, u32 value) {
+  if (conditions.stuck.contains(address)) return;
   settings.video_input.write(address, value);
   for (u32 n = 0; n < kChannels; ++n) {
     settings.state.channel[n].mask =
@@ -86,7 +89,7 @@ void Board::stop_encoding() {
   encoding = false;
   ++settings.session;
   for (Stream *stream : {&mpeg4, &mjpeg, &audio}) {
-    stream->queue.clear();
+    stream->clear();
     stream->queue.wake();
   }
 }
@@ -94,7 +97,7 @@ void Board::stop_encoding() {
 void Board::drop_frames_of_other_session(u32 session) {
   const std::lock_guard lock(mutex);
   if (session == settings.session) return;
-  for (Stream *stream : {&mpeg4, &mjpeg, &audio}) stream->queue.clear();
+  for (Stream *stream : {&mpeg4, &mjpeg, &audio}) stream->clear();
 }
 
 void Board::last_close() {
@@ -117,10 +120,68 @@ microseconds Board::read_wait() const {
              : microseconds{0};
 }
 
-bool Board::vanished() const {
-  if (options.vanish_to == nanoseconds{0}) return false;
+std::string Board::apply(std::string_view line, PowerUp *power_up) {
+  const std::lock_guard lock(script_mutex_);
   const nanoseconds now = clock.now();
-  return options.vanish_from <= now && now < options.vanish_to;
+  std::string error = script_.add(line, now, power_up);
+  if (error.empty()) change_conditions(now);
+  return error;
+}
+
+void Board::refresh(nanoseconds now) {
+  if (now < next_change()) return;
+  const std::lock_guard lock(script_mutex_);
+  change_conditions(now);
+}
+
+void Board::change_conditions(nanoseconds now) {
+  const Conditions next = script_.conditions(now);
+  next_change_ = script_.next_change(now).count();
+  for (unsigned n = 0; n < kChannels; ++n) {
+    const auto film_of = [n](const Conditions &each) {
+      const auto film = each.films.find(n);
+      return film == each.films.end() ? std::string{} : film->second;
+    };
+    std::string reason;
+    if (film_of(next) != film_of(conditions) && !engine.show_film(n, film_of(next), &reason))
+      std::fprintf(stderr, "virtual card: item \"camera%u\": %s\n", n + 1, reason.c_str());
+  }
+  set_conditions(next);
+}
+
+void Board::set_conditions(const Conditions &next) {
+  const std::lock_guard lock(mutex);
+  if (next.seed != conditions.seed) random_.seed(next.seed);
+  conditions = next;
+  CardState &state = settings.state;
+  for (u32 n = 0; n < kChannels; ++n) {
+    const u32 bit = 1u << n;
+    state.channel[n].scene = (next.black & bit) != 0   ? Scene::black
+                             : (next.still & bit) != 0 ? Scene::still
+                                                       : Scene::moving;
+  }
+  set_signals(0);
+  state.sound_present = ~next.silent & ((1u << kAudioInputs) - 1);
+  settings.controller.set_version(next.board_version);
+  settings.controller.set_faults(next.board_mute, next.board_wrong, next.watchdog_bites);
+  nowait = next.nowait;
+  absent = next.absent;
+  vanished = next.vanished;
+  call_faults.set(next.failing, next.delay);
+  Stream *const streams[] = {&mpeg4, &mjpeg, &audio};
+  for (std::size_t n = 0; n < std::size(streams); ++n) streams[n]->set_faults(next.streams[n], next.seed);
+  preview_faults.set(next.streams[static_cast<std::size_t>(StreamKind::preview)], next.seed);
+}
+
+void Board::set_signals(std::int64_t field) {
+  const bool off = field / conditions.flicker_fields % 2 != 0;
+  const u32 lost = conditions.lost | (off ? conditions.flicker : 0);
+  for (u32 n = 0; n < kChannels; ++n) settings.state.channel[n].lost = (lost >> n & 1) != 0;
+}
+
+u32 Board::read_register(const RegisterFile &registers, u32 address) {
+  if (conditions.garbage.contains(address)) return static_cast<u32>(random_());
+  return registers.read(address);
 }
 
 }  // namespace virtual_card

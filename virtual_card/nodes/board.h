@@ -10,13 +10,13 @@
 #include <optional>
 
 #include "board_controller.h"
+#include "call_faults.h"
 #include "call_log.h"
 #include "clock.h"
-#include "injector.h"
-#include "options.h"
 #include "picture/engine.h"
 #include "region.h"
 #include "register_file.h"
+#include "script.h"
 #include "stream.h"
 
 namespace virtual_card {
@@ -73,19 +73,33 @@ struct Board {
   void clear_supply();
   /// Returns how long a read may wait for a frame.
   microseconds read_wait() const;
-  /// Returns whether the card is pulled out now, by the option `vanish`.
-  bool vanished() const;
 
-  std::mutex mutex;  ///< guards `settings` and `preview`
+  /// Applies a line of items. Returns an empty text, or what is wrong with it; then nothing has changed.
+  std::string apply(std::string_view line, PowerUp *power_up = nullptr);
+  /// Brings the conditions up to date when the time line has changed them.
+  void refresh(nanoseconds now);
+  /// Returns the card time of the next change by the time line; nanoseconds::max() when there is none.
+  nanoseconds next_change() const { return nanoseconds{next_change_.load(std::memory_order_relaxed)}; }
+  /// Updates which cameras have a signal at a field. The caller holds `mutex`.
+  void set_signals(std::int64_t field);
+  /// Returns the value at which a register reads. The caller holds `mutex`.
+  u32 read_register(const RegisterFile &registers, u32 address);
+
+  std::mutex mutex;  ///< guards `settings`, `conditions`, `preview` and `preview_faults`
   BoardSettings settings;
+  Conditions conditions;
   PreviewBuffers preview;
+  StreamFaults preview_faults{StreamKind::preview};
   std::atomic<bool> encoding{false};  ///< copy of settings.state.encoding, for reads without the mutex
   std::atomic<bool> supplied{false};  ///< ready-made frames replace the encoders
-  std::atomic<bool> nowait{false};    ///< reads of an empty stream return at once
+  // Copies of members of `conditions`, for calls without the mutex.
+  std::atomic<bool> nowait{false};
+  std::atomic<bool> absent{false};
+  std::atomic<bool> vanished{false};
 
-  Options options;  ///< only power-up and reset() change it
+  std::string power_up_error;  ///< what is wrong with the options; opening a node fails then
   Clock clock;
-  Injector injector;
+  CallFaults call_faults;
   CallLog log;
   Stream mpeg4;
   Stream mjpeg;
@@ -95,6 +109,16 @@ struct Board {
   Region audio_region{"zarvo_g723_0", 0};
   Region video_input_region{"zarvo_vin0", 0};
   Engine engine;
+
+ private:
+  /// Computes the conditions at a time and carries them out. The caller holds script_mutex_.
+  void change_conditions(nanoseconds now);
+  void set_conditions(const Conditions &next);
+
+  std::mutex script_mutex_;  // guards script_; taken before `mutex`
+  Script script_;
+  std::atomic<std::int64_t> next_change_{nanoseconds::max().count()};
+  std::minstd_rand random_;  // guarded by `mutex`
 };
 
 }  // namespace virtual_card

@@ -4,6 +4,11 @@
 #include <algorithm>
 
 namespace virtual_card {
+namespace {
+
+constexpr u32 kWrongBits = 0x5A;
+
+}  // namespace
 
 u32 BoardController::command(u32 command, nanoseconds now) {
   const struct {
@@ -20,6 +25,8 @@ u32 BoardController::command(u32 command, nanoseconds now) {
     reply = script.front();
     script.pop_front();
   }
+  if (wrong_) reply ^= kWrongBits;
+  if (mute_) reply = 0;
   if (known != std::end(commands) && known->action != nullptr && reply == known->reply)
     (this->*known->action)(now);
   return reply;
@@ -29,8 +36,14 @@ void BoardController::script(u32 command, const std::vector<u32> &replies) {
   scripts_[command].assign(replies.begin(), replies.end());
 }
 
+void BoardController::set_faults(bool mute, bool wrong, bool bites) {
+  mute_ = mute;
+  wrong_ = wrong;
+  bites_ = bites;
+}
+
 bool BoardController::expired(nanoseconds now) {
-  if (!running_ || now < deadline_) return false;
+  if (!running_ || (now < deadline_ && !bites_)) return false;
   running_ = false;
   ++resets_;
   return true;

@@ -22,6 +22,9 @@ class BoardController {
   /// Carries out a command and returns the reply; an unknown command gets 0.
   u32 command(u32 command, nanoseconds now);
   void set_version(u32 reply) { version_ = reply; }
+  /// Sets what is broken: it replies 0, or something else, and does nothing; its watchdog resets the machine
+  /// although it is fed.
+  void set_faults(bool mute, bool wrong, bool bites);
   /// Sets the replies to the next commands with this code. If a reply is not the confirming one, the command
   /// is not carried out.
   void script(u32 command, const std::vector<u32> &replies);
@@ -39,6 +42,9 @@ class BoardController {
 
   u32 version_ = driver::kBoardVersionReplies[0];
   std::map<u32, std::deque<u32>> scripts_;
+  bool mute_ = false;
+  bool wrong_ = false;
+  bool bites_ = false;
   bool running_ = false;
   nanoseconds deadline_{0};
   std::uint64_t kicks_ = 0;

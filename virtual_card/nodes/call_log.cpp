@@ -6,41 +6,14 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
-#include <iomanip>
 #include <new>
-#include <sstream>
 
+#include "commands.h"
+#include "describe.h"
 #include "host/files.h"
 #include "host/real_calls.h"
 
 namespace virtual_card {
-namespace {
-
-constexpr const char *kOperations[] = {"open", "close", "ioctl", "read", "mmap", "munmap"};
-constexpr const char *kDevices[] = {"encoder", "display", "audio", "video_input", "none"};
-
-std::string line_of(const Call &call, const char *name) {
-  std::ostringstream out;
-  out << kDevices[static_cast<int>(call.device)] << ' ' << kOperations[static_cast<int>(call.operation)];
-  out << std::hex << std::setfill('0');
-  if (name != nullptr)
-    out << ' ' << name;
-  else if (call.operation == Operation::ioctl)
-    out << " 0x" << call.code;
-  if (!call.argument.empty()) out << ' ';
-  for (const std::uint8_t byte : call.argument) out << std::setw(2) << static_cast<unsigned>(byte);
-  out << std::dec;
-  if (call.size != 0) out << " size " << call.size;
-  out << " = " << call.result;
-  if (call.error != 0) {
-    const char *error = strerrorname_np(call.error);
-    out << ' ' << (error != nullptr ? error : std::to_string(call.error));
-  }
-  out << '\n';
-  return out.str();
-}
-
-}  // namespace
 
 CallLog::~CallLog() {
   if (file_ > STDERR_FILENO) real::close(file_);
@@ -50,7 +23,7 @@ void CallLog::record(bool on) {
   const std::lock_guard lock(mutex_);
   recording_ = on;
   if (on) calls_.clear();
-  on_ = on || file_ >= 0;
+  update();
 }
 
 std::vector<Call> CallLog::calls() const {
@@ -67,33 +40,50 @@ bool CallLog::write_to(const std::string &path, std::string &error) {
   }
   file_ = static_cast<int>(fd);
   ::fstat(file_, &identity_);
-  on_ = true;
+  update();
   return true;
+}
+
+void CallLog::listen(std::function<void(const LogLine &line)> listener) {
+  const std::lock_guard lock(mutex_);
+  listener_ = std::move(listener);
+  update();
+}
+
+void CallLog::update() {
+  on_ = recording_ || file_ >= 0 || listener_;
 }
 
 void CallLog::end_file(const char *reason) {
   std::fprintf(stderr, "virtual card: the log ends here: %s\n", reason);
   file_ = -1;
-  on_ = recording_;
+  update();
 }
 
-void CallLog::write_line(const Call &call, const char *name) {
+void CallLog::write_line(const std::string &line) {
   struct stat now {};
   const bool same =
       ::fstat(file_, &now) == 0 && now.st_ino == identity_.st_ino && now.st_dev == identity_.st_dev;
   if (!same && file_ != STDERR_FILENO) return end_file("the program has closed its file");
-  if (const long error = write_all(file_, line_of(call, name)))
-    end_file(std::strerror(static_cast<int>(-error)));
+  if (const long error = write_all(file_, line)) end_file(std::strerror(static_cast<int>(-error)));
 }
 
-void CallLog::add(Call call, long result, const char *name) noexcept {
+void CallLog::add(Call call, long result, std::chrono::nanoseconds time, const CommandRow *row,
+                  std::span<const std::uint8_t> record) noexcept {
   if (!on()) return;
   const bool failed = result < 0 && result >= -kMaxError;
   call.result = failed ? -1 : result;
   call.error = failed ? static_cast<int>(-result) : 0;
   const std::lock_guard lock(mutex_);
   try {
-    if (file_ >= 0) write_line(call, name);
+    if (file_ >= 0 || listener_) {
+      const bool of_capture_loop = call.operation == Operation::read ||
+                                   call.code == driver::ENC_IOC_MPEG4_REQUEST ||
+                                   call.code == driver::ENC_IOC_MPEG4_DONE;
+      const LogLine line{describe(call, row, record, time), name_of(call.device), of_capture_loop};
+      if (file_ >= 0) write_line(line.text);
+      if (listener_) listener_(line);
+    }
     if (recording_) calls_.push_back(std::move(call));
   } catch (const std::bad_alloc &) {
     // The call has been carried out, whether or not it is in the log.

@@ -79,36 +79,31 @@ Card::Card() {
   nodes_[1] = std::make_unique<DisplayDevice>(board_);
   nodes_[2] = std::make_unique<AudioDevice>(board_);
   nodes_[3] = std::make_unique<VideoInputDevice>(board_);
-  apply_options();
+  power_up();
 }
 
-void Card::apply_options() {
+void Card::power_up() {
   const char *text = std::getenv("ZARVO_VIRTUAL_CARD");
-  Options &options = board_.options;
-  options = parse_options(text == nullptr ? "" : text);
-  CardState &state = board_.settings.state;
-  for (u32 n = 0; n < kChannels; ++n) {
-    state.channel[n].lost = (options.lost >> n & 1) != 0;
-    if ((options.still >> n & 1) != 0) state.channel[n].scene = Scene::still;
-    if ((options.black >> n & 1) != 0) state.channel[n].scene = Scene::black;
-  }
-  state.sound_present &= ~options.silent;
-  board_.settings.controller.set_version(options.board_version);
-  board_.nowait = options.nowait;
-  if (options.speed != 1.0) board_.clock.power_up(ClockMode::fast, options.speed);
+  PowerUp power_up;
+  std::string &error = board_.power_up_error;
+  error = board_.apply(text == nullptr ? "" : text, &power_up);
+  if (power_up.speed != 1.0) board_.clock.power_up(ClockMode::fast, power_up.speed);
   std::string reason;
-  for (const auto &[channel, path] : options.films)
-    if (options.error.empty() && !board_.engine.show_film(channel, path, &reason))
-      options.error = "option \"camera" + std::to_string(channel + 1) + "\": " + reason;
-  if (!options.log_file.empty() && options.error.empty() && !board_.log.write_to(options.log_file, reason))
-    options.error = "option \"log\": cannot write " + options.log_file + ": " + reason;
-  if (!options.error.empty())
-    std::fprintf(stderr, "virtual card: ZARVO_VIRTUAL_CARD: %s\n", options.error.c_str());
+  if (!power_up.log_file.empty() && error.empty() && !board_.log.write_to(power_up.log_file, reason))
+    error = "item \"log\": cannot write " + power_up.log_file + ": " + reason;
+  // The socket of a forked child's parent stays the parent's.
+  if (!power_up.control_socket.empty() && error.empty() && left_to_parent == nullptr)
+    error = control_.start(power_up.control_socket);
+  if (!error.empty()) std::fprintf(stderr, "virtual card: ZARVO_VIRTUAL_CARD: %s\n", error.c_str());
 }
 
 DeviceNode *Card::node(Device device) {
   const auto index = static_cast<std::size_t>(device);
   return index < nodes_.size() ? nodes_[index].get() : nullptr;
+}
+
+void Card::log(Call call, long result) {
+  board_.log.add(std::move(call), result, board_.clock.now());
 }
 
 void Card::stop_if_unused() {
@@ -122,10 +117,11 @@ long Card::open(Device device, int flags, int sibling) {
   Call call{Operation::open, device};
   call.flags = flags;
   const long result = [&]() -> long {
-    if (const int error = board_.injector.strike(Operation::open, device)) return -error;
-    if (!board_.options.error.empty()) return -EINVAL;
-    if (device == Device::none || board_.options.absent) return -ENOENT;
-    if (board_.vanished()) return -ENODEV;
+    if (const int error = board_.call_faults.strike(Operation::open, device)) return -error;
+    if (!board_.power_up_error.empty()) return -EINVAL;
+    board_.refresh(board_.clock.now());
+    if (device == Device::none || board_.absent) return -ENOENT;
+    if (board_.vanished) return -ENODEV;
     const std::lock_guard lock(power_mutex_);
     if (open_ == 0 && !off_)
       if (const long error = runner_.start()) return error;
@@ -134,13 +130,13 @@ long Card::open(Device device, int flags, int sibling) {
     stop_if_unused();
     return fd;
   }();
-  board_.log.add(std::move(call), result);
+  log(std::move(call), result);
   return result;
 }
 
 long Card::close(Device device) {
-  const long result = -board_.injector.strike(Operation::close, device);
-  board_.log.add({Operation::close, device}, result);
+  const long result = -board_.call_faults.strike(Operation::close, device);
+  log({Operation::close, device}, result);
   return result;
 }
 
@@ -152,13 +148,14 @@ long Card::ioctl(Device device, u32 code, std::uintptr_t argument) {
 long Card::read(Device device, std::uintptr_t buffer, std::size_t count) {
   DeviceNode *target = node(device);
   if (target == nullptr) return -ENODEV;
-  long result = -board_.injector.strike(Operation::read, device);
-  if (result == 0) result = board_.vanished() ? -ENODEV : target->read(buffer, count);
+  long result = -board_.call_faults.strike(Operation::read, device);
+  if (result == 0)
+    result = board_.vanished.load(std::memory_order_relaxed) ? -ENODEV : target->read(buffer, count);
   if (board_.log.on()) {
     Call call{Operation::read, device};
     call.value = buffer;
     call.size = count;
-    board_.log.add(std::move(call), result);
+    log(std::move(call), result);
   }
   return result;
 }
@@ -171,7 +168,7 @@ long Card::mmap(Device device, int fd, const MapRequest &request, void *&mapped)
   call.protection = request.protection;
   call.flags = request.flags;
   const long result = [&]() -> long {
-    if (const int error = board_.injector.strike(Operation::mmap, device)) return -error;
+    if (const int error = board_.call_faults.strike(Operation::mmap, device)) return -error;
     if ((request.flags & MAP_SHARED) == 0) return -EINVAL;
     const long place = target->place_mapping(request.length, request.protection, request.offset);
     if (place < 0) return place;
@@ -182,15 +179,15 @@ long Card::mmap(Device device, int fd, const MapRequest &request, void *&mapped)
     ++mapped_;
     return 0;
   }();
-  board_.log.add(std::move(call), result);
+  log(std::move(call), result);
   return result;
 }
 
 long Card::munmap(Device device, std::size_t length) {
   Call call{Operation::munmap, device};
   call.size = length;
-  const long result = -board_.injector.strike(Operation::munmap, device);
-  board_.log.add(std::move(call), result);
+  const long result = -board_.call_faults.strike(Operation::munmap, device);
+  log(std::move(call), result);
   return result;
 }
 
@@ -237,6 +234,7 @@ bool Card::set_clock(ClockMode mode, double speed) {
 }
 
 void Card::power_off() {
+  control_.stop();
   const std::lock_guard lock(power_mutex_);
   off_ = true;
   runner_.stop();

@@ -8,7 +8,9 @@
 
 #include <sys/types.h>
 
+#include "control_server.h"
 #include "device.h"
+#include "requests.h"
 #include "runner.h"
 
 namespace virtual_card {
@@ -65,13 +67,16 @@ class Card {
 
  private:
   Card();
-  void apply_options();
+  void power_up();
   DeviceNode *node(Device device);
   void stop_if_unused();
+  void log(Call call, long result);
 
   Board board_;
   std::array<std::unique_ptr<DeviceNode>, 4> nodes_;
   Runner runner_{board_};
+  ControlServer control_{board_.log,
+                         [this](std::string_view request) { return answer_request(*this, request); }};
   std::mutex power_mutex_;  // guards the members below, and start and stop of runner_
   int open_ = 0;
   int mapped_ = 0;

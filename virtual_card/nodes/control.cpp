@@ -24,14 +24,6 @@ void refused(const char *what) {
   std::fprintf(stderr, "virtual card: %s refused: a device node is open or the value is wrong\n", what);
 }
 
-void set_sound(unsigned input, bool on) {
-  if (input >= kAudioInputs) throw std::out_of_range("audio input");
-  with_settings([&](BoardSettings &settings) {
-    u32 &present = settings.state.sound_present;
-    present = on ? present | 1u << input : present & ~(1u << input);
-  });
-}
-
 }  // namespace
 
 void reset() {
@@ -58,29 +50,12 @@ void advance_frames(int frames) {
   Card::instance().runner().advance_frames(frames);
 }
 
-void unplug_camera(unsigned channel) {
-  with_settings([&](BoardSettings &settings) { settings.state.channel.at(channel).lost = true; });
+void apply(const std::string &line) {
+  if (const std::string error = board().apply(line); !error.empty()) throw std::invalid_argument(error);
 }
 
-void plug_camera(unsigned channel) {
-  with_settings([&](BoardSettings &settings) { settings.state.channel.at(channel).lost = false; });
-}
-
-void set_scene(unsigned channel, Scene scene) {
-  with_settings([&](BoardSettings &settings) { settings.state.channel.at(channel).scene = scene; });
-}
-
-bool show_film(unsigned channel, const std::string &path, std::string *error) {
-  if (channel >= kChannels) throw std::out_of_range("channel");
-  return board().engine.show_film(channel, path, error);
-}
-
-void silence_input(unsigned input) {
-  set_sound(input, false);
-}
-
-void sound_input(unsigned input) {
-  set_sound(input, true);
+std::vector<ItemText> items() {
+  return item_texts();
 }
 
 void queue_mpeg4(ReadyFrame frame) {
@@ -109,10 +84,6 @@ void set_supply(Supply supply) {
 
 void clear_supply() {
   board().clear_supply();
-}
-
-void set_nowait(bool on) {
-  board().nowait = on;
 }
 
 std::uint32_t codec_register(std::uint32_t address) {
@@ -144,10 +115,6 @@ void script_board_replies(std::uint32_t command, std::vector<std::uint32_t> repl
   with_settings([&](BoardSettings &settings) { settings.controller.script(command, replies); });
 }
 
-void set_board_version(std::uint32_t reply) {
-  with_settings([&](BoardSettings &settings) { settings.controller.set_version(reply); });
-}
-
 void script_motion(std::uint32_t bits) {
   with_settings([&](BoardSettings &settings) { settings.scripted_motion = bits; });
 }
@@ -167,24 +134,13 @@ std::vector<Call> log() {
   return board().log.calls();
 }
 
-void inject(Fault fault) {
-  board().injector.set(fault);
-}
-
-void clear_fault() {
-  board().injector.clear();
-}
-
-int fault_hits() {
-  return board().injector.hits();
-}
-
 Counters counters() {
   Counters counters;
   counters.mpeg4 = board().mpeg4.queue.counters();
   counters.mjpeg = board().mjpeg.queue.counters();
   counters.audio = board().audio.queue.counters();
   with_settings([&](BoardSettings &settings) {
+    counters.failed_calls = board().call_faults.hits();
     counters.previews = board().preview.composed;
     counters.watchdog_kicks = settings.controller.kicks();
     counters.watchdog_resets = settings.controller.resets();

@@ -13,21 +13,23 @@ long DeviceNode::ioctl(u32 code, std::uintptr_t argument) {
   const auto found =
       std::find_if(rows.begin(), rows.end(), [&](const CommandRow &row) { return row.code == code; });
   const CommandRow *row = found == rows.end() ? nullptr : &*found;
-  if (!board_.log.on()) return run(code, row, argument, nullptr);
+  alignas(std::max_align_t) std::array<u8, kMaxRecord> record;
+  if (!board_.log.on()) return run(code, row, argument, record, nullptr);
 
   Call logged{Operation::ioctl, device_};
   logged.code = code;
   logged.value = argument;
-  const long result = run(code, row, argument, &logged);
-  board_.log.add(std::move(logged), result, row == nullptr ? nullptr : row->name);
+  const long result = run(code, row, argument, record, &logged);
+  const std::size_t size = row == nullptr ? 0 : row->size;
+  board_.log.add(std::move(logged), result, board_.clock.now(), row, std::span(record).first(size));
   return result;
 }
 
-long DeviceNode::run(u32 code, const CommandRow *row, std::uintptr_t argument, Call *logged) {
-  if (const int error = board_.injector.strike(Operation::ioctl, device_, code)) return -error;
+long DeviceNode::run(u32 code, const CommandRow *row, std::uintptr_t argument, std::span<u8> record,
+                     Call *logged) {
+  if (const int error = board_.call_faults.strike(Operation::ioctl, device_, code)) return -error;
   if (row == nullptr) return -ENOTTY;
 
-  alignas(std::max_align_t) std::array<u8, kMaxRecord> record;
   if (row->size > 0) {
     if (const long error = copy_from_user(record.data(), argument, row->size)) return error;
     if (logged != nullptr) {

@@ -12,6 +12,50 @@ namespace virtual_card {
 
 class DeviceNode;
 
+/// The names of a record's fields, for people, and how wide each is.
+struct RecordFields {
+  const char *names;
+  std::size_t width;
+  bool hexadecimal;
+};
+template <typename Record>
+inline constexpr RecordFields kRecordFields{"", 4, false};
+template <>
+inline constexpr RecordFields kRecordFields<u32>{"value", 4, false};
+template <>
+inline constexpr RecordFields kRecordFields<driver::ChannelValue>{"channel value", 4, false};
+template <>
+inline constexpr RecordFields kRecordFields<driver::Interval>{"channel code drop", 4, false};
+template <>
+inline constexpr RecordFields kRecordFields<driver::Cbr>{"channel value enable", 4, false};
+template <>
+inline constexpr RecordFields kRecordFields<driver::QpRange>{"channel max min enable", 4, false};
+template <>
+inline constexpr RecordFields kRecordFields<driver::Register>{"address value", 4, true};
+template <>
+inline constexpr RecordFields kRecordFields<driver::Zoom>{"level x y", 4, false};
+template <>
+inline constexpr RecordFields kRecordFields<driver::Grid>{
+    "column column column column column row row row row row cells", 4, false};
+template <>
+inline constexpr RecordFields kRecordFields<driver::FrameRect>{"number x_start y_start x_end y_end enable", 4,
+                                                               false};
+template <>
+inline constexpr RecordFields kRecordFields<driver::Mask>{"channel x_start x_end y_start y_end", 4, false};
+template <>
+inline constexpr RecordFields kRecordFields<driver::MotionMap>{"channel column row columns rows", 4, false};
+template <>
+inline constexpr RecordFields kRecordFields<driver::DecoderRegister>{"chip address value", 1, true};
+template <>
+inline constexpr RecordFields kRecordFields<driver::BoardCommand>{"command reply", 4, true};
+template <>
+inline constexpr RecordFields kRecordFields<driver::MotionLevels>{
+    "level level level level level level level level level level level level level level level level", 2,
+    false};
+template <>
+inline constexpr RecordFields kRecordFields<ZV_DISPLAY_WINDOW>{
+    "index channel scale x_start y_start x_end y_end flags", 4, false};
+
 /// A command that a node has. The node copies the record in, checks the first word if it is a channel, calls
 /// the handler with the board locked, and copies the record back if the command answers.
 struct CommandRow {
@@ -20,6 +64,7 @@ struct CommandRow {
   std::size_t size;
   bool channel_first;
   bool answers;
+  RecordFields fields;
   long (*handler)(DeviceNode &node, void *record);
 };
 
@@ -45,7 +90,9 @@ class DeviceNode {
   Board &board_;
 
  private:
-  long run(u32 code, const CommandRow *row, std::uintptr_t argument, Call *logged);
+  /// Runs a command. `record` receives the record as it is in the end; `logged`, if not null, the record as
+  /// it came in.
+  long run(u32 code, const CommandRow *row, std::uintptr_t argument, std::span<u8> record, Call *logged);
 
   Device device_;
   Region &region_;
@@ -91,7 +138,8 @@ constexpr CommandRow command(const char *name, u32 code, First first = First::wo
                              Answer answer = Answer::no) {
   constexpr std::size_t size = detail::Signature<decltype(Method)>::kSize;
   static_assert(size <= kMaxRecord);
-  return {name, code, size, first == First::channel, answer == Answer::yes, &detail::call<Method>};
+  constexpr RecordFields fields = kRecordFields<typename detail::Signature<decltype(Method)>::Record>;
+  return {name, code, size, first == First::channel, answer == Answer::yes, fields, &detail::call<Method>};
 }
 
 /// The row of a command of zv_driver.h. Further arguments are those of command().

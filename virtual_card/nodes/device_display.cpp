@@ -4,6 +4,7 @@
 #include <sys/mman.h>
 
 #include <cerrno>
+#include <cstring>
 #include <tuple>
 
 #include "host/user_memory.h"
@@ -34,12 +35,22 @@ constexpr CommandRow kCommands[] = {
 
 }  // namespace
 
-std::span<const CommandRow> DisplayDevice::commands() const {
+std::span<const CommandRow> DisplayDevice::table() {
   return kCommands;
 }
 
 Layout &DisplayDevice::layout() {
   return board_.settings.batching ? board_.settings.batch : board_.settings.state.display.layout;
+}
+
+bool DisplayDevice::pass_faults(u32 &index, long &result) {
+  if (board_.preview_faults.stalled()) return false;
+  Passing passing{StreamKind::preview, {std::vector<u8>(sizeof index), result}};
+  std::memcpy(passing.frame.area.data(), &index, sizeof index);
+  board_.preview_faults.change(passing);
+  std::memcpy(&index, passing.frame.area.data(), sizeof index);
+  result = passing.frame.result;
+  return true;
 }
 
 long DisplayDevice::read(std::uintptr_t buffer, std::size_t count) {
@@ -55,9 +66,10 @@ long DisplayDevice::read(std::uintptr_t buffer, std::size_t count) {
     index = *board_.preview.newest;
     result = board_.preview.size;
   }
+  if (board_.preview_faults.any() && !pass_faults(index, result)) return 0;
   if (const long error = copy_to_user(buffer, &index, sizeof index)) return error;
   if (scripted.empty())
-    board_.preview.handed = index;
+    board_.preview.handed = board_.preview.newest;
   else
     scripted.pop_front();
   return result;
@@ -137,7 +149,7 @@ long DisplayDevice::set_standard(u32 &standard) {
 }
 
 long DisplayDevice::read_register(driver::Register &record) {
-  record.value = board_.settings.codec.read(record.address);
+  record.value = board_.read_register(board_.settings.codec, record.address);
   return 0;
 }
 

@@ -36,10 +36,14 @@ class DisplayDevice : public DeviceNode {
   long get_motion(u32 &bits);
   long select_buffer(u32 &index);
 
+  static std::span<const CommandRow> table();
+
  protected:
-  std::span<const CommandRow> commands() const override;
+  std::span<const CommandRow> commands() const override { return table(); }
 
  private:
+  /// Applies the faults of the preview to what a read tells. Returns false when the read finds no picture.
+  bool pass_faults(u32 &index, long &result);
   /// Returns the layout that layout commands change: the batch between begin and end of an update, else the
   /// layout that is shown.
   Layout &layout();

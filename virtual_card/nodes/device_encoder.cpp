@@ -31,15 +31,16 @@ constexpr CommandRow kCommands[] = {
 
 }  // namespace
 
-std::span<const CommandRow> EncoderDevice::commands() const {
+std::span<const CommandRow> EncoderDevice::table() {
   return kCommands;
 }
 
 long EncoderDevice::read(std::uintptr_t, std::size_t count) {
   const bool encoding = board_.encoding.load(std::memory_order_relaxed);
   const auto frame_of = [&](Stream &stream, std::size_t offset, std::size_t end) {
-    return stream.read(encoding, board_.read_wait(),
-                       [&](std::span<const u8> area) { region().write(offset, area, end); });
+    return stream.read(
+        encoding, board_.read_wait(), [&] { return board_.clock.now(); },
+        [&](std::span<const u8> area) { region().write(offset, area, end); });
   };
   if (count == driver::kMpeg4ReadSize) return frame_of(board_.mpeg4, 0, driver::kMpeg4AreaSize);
   if (count == driver::kMjpegReadSize)

@@ -35,8 +35,10 @@ class EncoderDevice : public DeviceNode {
   long stop();
   long accept() { return 0; }
 
+  static std::span<const CommandRow> table();
+
  protected:
-  std::span<const CommandRow> commands() const override;
+  std::span<const CommandRow> commands() const override { return table(); }
 
  private:
   EncoderSettings &settings(u32 channel) { return board_.settings.state.channel[channel].encoder; }

@@ -41,7 +41,7 @@ long fetch_thresholds(const driver::MotionMap &map, std::vector<u16> &thresholds
 
 }  // namespace
 
-std::span<const CommandRow> VideoInputDevice::commands() const {
+std::span<const CommandRow> VideoInputDevice::table() {
   return kCommands;
 }
 
@@ -74,7 +74,7 @@ long VideoInputDevice::set_standard(u32 &standard) {
 }
 
 long VideoInputDevice::read_register(driver::Register &record) {
-  record.value = board_.settings.video_input.read(record.address);
+  record.value = board_.read_register(board_.settings.video_input, record.address);
   return 0;
 }
 

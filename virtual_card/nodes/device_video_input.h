@@ -26,8 +26,10 @@ class VideoInputDevice : public DeviceNode {
   long board_command(driver::BoardCommand &record);
   long get_motion_levels(driver::MotionLevels &levels);
 
+  static std::span<const CommandRow> table();
+
  protected:
-  std::span<const CommandRow> commands() const override;
+  std::span<const CommandRow> commands() const override { return table(); }
   void log_pointed_to(u32 code, const void *record, std::vector<u8> &log) const override;
 };
 

@@ -103,6 +103,7 @@ void Runner::run_until(nanoseconds time) {
     run(first);
   }
   board_.clock.move_to(time);
+  board_.refresh(time);
   watch(time);
 }
 
@@ -115,7 +116,8 @@ CardState Runner::snapshot(u32 *session) {
 Runner::Next Runner::next() {
   const CardState state = snapshot();
   if (state.standard != schedule_.standard()) schedule_.change_standard(state.standard, field_);
-  const Next all[] = {{Event::field, schedule_.due(field_)},
+  const Next all[] = {{Event::change, board_.next_change()},
+                      {Event::field, schedule_.due(field_)},
                       {Event::audio, audio_block_ * kAudioBlock},
                       {Event::video_supply, pace_due(video_pace_, state)},
                       {Event::audio_supply, pace_due(audio_pace_, state)}};
@@ -139,19 +141,21 @@ nanoseconds Runner::pace_due(Pace &pace, const CardState &state) {
 
 void Runner::run(const Next &next) {
   try {
-    run_event(next.event);
+    run_event(next);
   } catch (const std::bad_alloc &) {
     // The event's counter has already advanced, so the next event follows.
   }
 }
 
-void Runner::run_event(Event event) {
+void Runner::run_event(const Next &next) {
   const auto supply = [](Pace &pace) {
     ++pace.count;
     for (Stream *stream : pace.streams)
       if (stream != nullptr) stream->supply_due();
   };
-  switch (event) {
+  switch (next.event) {
+    case Event::change:
+      return board_.refresh(next.due);
     case Event::field:
       return run_field();
     case Event::audio:
@@ -164,6 +168,10 @@ void Runner::run_event(Event event) {
 }
 
 void Runner::run_field() {
+  {
+    const std::lock_guard lock(board_.mutex);
+    if (board_.conditions.flicker != 0) board_.set_signals(field_);
+  }
   u32 session = 0;
   CardState state = snapshot(&session);
   const bool supplied = board_.supplied;
@@ -203,6 +211,11 @@ void Runner::compose(const CardState &state) {
   ++board_.preview.composed;
 }
 
+Picture Runner::look(unsigned channel) {
+  const std::lock_guard lock(run_mutex_);
+  return board_.engine.look(snapshot(), channel);
+}
+
 void Runner::watch(nanoseconds now) {
   const std::lock_guard lock(board_.mutex);
   if (board_.settings.controller.expired(now))
@@ -210,6 +223,7 @@ void Runner::watch(nanoseconds now) {
 }
 
 void Runner::skip_to(nanoseconds now) {
+  board_.refresh(now);
   const CardState state = snapshot();
   const std::int64_t field = schedule_.first_at(now);
   const std::int64_t block = audio_block_at(now);

@@ -29,6 +29,9 @@ class Runner {
   /// Starts again at card time 0. Call it after Clock::power_up(), while the thread is stopped.
   void power_up();
 
+  /// Draws what a camera shows at the last field.
+  Picture look(unsigned channel);
+
   /// Manual clock only: runs everything that becomes due in the time, on the caller's thread.
   void advance(nanoseconds time);
   void advance_frames(int frames);
@@ -39,7 +42,7 @@ class Runner {
     std::int64_t count;  ///< frames that became due since `since`
     nanoseconds since;   ///< start of encoding or of the supply, the later one
   };
-  enum class Event { field, audio, video_supply, audio_supply };
+  enum class Event { change, field, audio, video_supply, audio_supply };
   struct Next {
     Event event;
     nanoseconds due;
@@ -50,7 +53,7 @@ class Runner {
   Next next();
   /// Runs one event. On bad_alloc the rest of the event is skipped.
   void run(const Next &next);
-  void run_event(Event event);
+  void run_event(const Next &next);
   void run_until(nanoseconds time);
   void run_field();
   void run_audio_block();

@@ -156,6 +156,16 @@ void Engine::compose(const CardState &state, std::span<u8> uyvy) {
   parts.compositor.compose(state, windows, sources, uyvy);
 }
 
+Picture Engine::look(const CardState &state, unsigned channel) {
+  Parts &parts = *parts_;
+  parts.take_films();
+  const Field complete = parts.last.parity() != 0 ? parts.last : parts.last.before();
+  Channel &shown = *parts.channels[channel];
+  shown.draw(state, complete.before());
+  shown.draw(state, complete);
+  return shown.camera().picture();
+}
+
 u32 Engine::motion() const {
   return parts_->motion.load(std::memory_order_relaxed);
 }

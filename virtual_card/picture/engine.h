@@ -13,6 +13,7 @@
 #include "card_state.h"
 #include "field.h"
 #include "frame_queue.h"
+#include "picture.h"
 
 namespace virtual_card {
 
@@ -31,6 +32,9 @@ class Engine {
 
   /// Composes the newest preview picture from the last fields into `uyvy`, width x lines x 2 bytes.
   void compose(const CardState &state, std::span<u8> uyvy);
+
+  /// Draws and returns what a camera shows at the last field.
+  Picture look(const CardState &state, unsigned channel);
 
   /// Returns the mask of channels with motion at the last field. Any thread.
   u32 motion() const;

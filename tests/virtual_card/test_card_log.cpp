@@ -1,24 +1,10 @@
-// The injector, the log and the reset.
+// The log, and the reset of the card.
 
 #include "node_test.h"
 
 namespace {
 
 using card::Device, card::Operation;
-
-TEST_F(NodeTest, AFaultMatchesItsNodeAndCommandOnly) {
-  card::inject({Operation::ioctl, 2, true, EIO, Device::none, driver::DISP_IOC_GET_HEIGHT});
-  EXPECT_EQ(send(display, driver::DISP_IOC_GET_WIDTH, u32{}), 0);
-  for (const long result : {0, -EIO, -EIO})
-    EXPECT_EQ(send(display, driver::DISP_IOC_GET_HEIGHT, u32{}), result);
-  EXPECT_EQ(card::fault_hits(), 2);
-  card::inject({Operation::read, 1, true, EIO, Device::audio});
-  EXPECT_EQ(read_mpeg4(), 0);
-  EXPECT_EQ(card::fault_hits(), 0);
-  card::inject({Operation::close, 1, false, EIO});
-  EXPECT_EQ(answer(close(std::exchange(display, -1))), -EIO);
-  EXPECT_EQ(card::open_descriptors(), 3) << "a close that fails closes, as in Linux";
-}
 
 TEST_F(NodeTest, TheLogTellsEveryCallWithItsRecord) {
   card::record_log(true);
@@ -65,17 +51,17 @@ TEST_F(NodeTest, TheLogTellsEveryCallWithItsRecord) {
 
 // Tests that find the card half reset measure the test before them.
 TEST_F(NodeTest, ResetIsRefusedWhileANodeIsOpenAndForgetsEverythingElse) {
-  card::inject({Operation::ioctl, 1, true});
+  card::apply("fail=any/ioctl:EIO");
   card::queue_mpeg4({{1}, 1});
   testing::internal::CaptureStderr();
   card::reset();
   card::set_clock(card::ClockMode::real_time);
   EXPECT_THAT(testing::internal::GetCapturedStderr(), testing::HasSubstr("reset() refused"));
   EXPECT_EQ(send(encoder, driver::ENC_IOC_STOP), -EIO);
-  EXPECT_EQ(card::fault_hits(), 1);
+  EXPECT_EQ(card::counters().failed_calls, 1u);
   close_nodes();
   card::reset();
-  EXPECT_EQ(card::fault_hits(), 0);
+  EXPECT_EQ(card::counters().failed_calls, 0u);
   EXPECT_EQ(card::counters().mpeg4.made, 0u);
   open_nodes();
   stop();
