@@ -185,7 +185,7 @@ constexpr ItemRow kRows[] = {
     {"seed", "=NUMBER", "a number from 0 to 4294967295", "the start of all random values", read_seed},
     {"speed", "=FACTOR", "a number from 0.01 to 1000", "card time runs so many times as fast", read_speed,
      true},
-    {"log", "=FILE", "a file to write", "writes a line for each call on a node",
+    {"log", "=FILE", "a regular file, or /dev/stderr", "writes a line for each call on a node",
      read_path<&PowerUp::log_file>, true},
     {"state", "=FILE", "a file to read and write", "keeps registers and settings between two programs",
      read_path<&PowerUp::state_file>, true},
@@ -194,7 +194,8 @@ constexpr ItemRow kRows[] = {
 };
 
 constexpr std::string_view kCamera = "camera";
-constexpr const char *kCameraValues = "camera number 1-16 and a video file, e.g. camera3=/path/clip.mp4";
+constexpr const char *kCameraValues =
+    "camera number 1-16 and a regular file that libavformat reads as video, e.g. camera3=/path/clip.mp4";
 
 Effect read_camera(unsigned number, std::string_view path, std::string &reason) {
   if (!Film::open(std::string(path), &reason)) return {};

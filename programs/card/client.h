@@ -1,0 +1,20 @@
+/**
+ * @file client.h
+ * The client's side of the virtual card's control socket.
+ */
+#ifndef CARD_CLIENT_H
+#define CARD_CLIENT_H
+
+#include <functional>
+#include <string>
+
+namespace card {
+
+/// Sends a request and calls `take` with the pieces of the answer as they come. Returns an empty text when
+/// the card has carried the request out, or what is wrong.
+std::string ask(const std::string &socket, const std::string &request,
+                const std::function<void(const std::string &piece)> &take);
+
+}  // namespace card
+
+#endif
