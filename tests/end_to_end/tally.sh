@@ -35,7 +35,7 @@ case $1 in
     ;;
   # Opens and reads of the card fail from second 2 on.
   vanish)
-    export ZARVO_VIRTUAL_CARD='vanish=2-100'
+    export ZARVO_VIRTUAL_CARD='@2 vanish'
     start --seconds 0 --channels 1-2 --audio 1
     told() { [ "$(grep -c 'nothing has come for' "$FOLDER/stderr")" = 3 ]; }
     expect "no line says that the streams have stopped" wait_until 30 told
