@@ -62,7 +62,7 @@ TEST(ItemLine, WhatIsWrongIsNamedWithWhatIsPossible) {
       {"@1 speed=2", "\"speed\"", "power-up only"},
       {"nowait=1", "\"nowait\": value \"1\"", "no value"},
       {"board=aa", "\"board\": value \"aa\"", "bb, cc or dd"},
-      {"log=", "\"log\"", "a file"},
+      {"log=", "\"log\"", "a regular file"},
       {"@8-5 vanish", "@8-5 vanish", "@FROM-TO"},
       {"@every 5 for 6 vanish", "@every", "SECONDS for SECONDS"},
       {"@5", "\"@5\"", "a time is"},
