@@ -33,7 +33,7 @@ prepare() {
   if [ -z "${ZARVO_BUILD:-}" ]; then
     install_missing "Installing and building take about 5 minutes on two cores." demo
     say "Building in $BUILD"
-    build product zarvo_record zarvo_motion zarvo_demo zarvo_virtual_card Videoplayer Audioplayer widget_map
+    build product zarvo_record zarvo_motion zarvo_card zarvo_demo zarvo_virtual_card Videoplayer Audioplayer widget_map
   fi
   use_card "$CARD"
   if [[ $ZARVO_ROOT == /tmp/zarvo-* ]]; then say "Some tools cannot deal with the name of this folder: using the link $ZARVO_ROOT"; fi
