@@ -211,6 +211,7 @@ tour_sizes() {
 }
 
 run_tour() {
+  local losses
   say "A scripted operator uses the program on an invisible display"
   rm -rf "$TOUR" "$SHOTS"
   mkdir -p "$SHOTS"
@@ -226,6 +227,7 @@ run_tour() {
   tour_playback
   close_program
   [ "$STATUS" -eq 0 ] || fail "the program ended with status $STATUS"
+  ! losses=$(grep '^virtual card: .* lost' "$LOG") || slow "$losses"
   tour_sizes
   close_display
 

@@ -27,7 +27,7 @@ plain_root
 # install_missing NOTE LIST...: installs, without questions, the packages of tools/packages-LIST.txt that are
 # missing. Its first line says how much is fetched; the note ends that line.
 install_missing() {
-  local note=$1 missing names size reached=1 as_root=() apt=(env LC_ALL=C DEBIAN_FRONTEND=noninteractive apt-get)
+  local note=$1 missing names size reached=1 quiet=() as_root=() apt=(env LC_ALL=C DEBIAN_FRONTEND=noninteractive apt-get)
   shift
   type dpkg-query apt-get >/dev/null 2>&1 ||
     die "this script installs packages with apt-get (Debian 12); elsewhere install what tools/packages-*.txt list yourself"
@@ -48,7 +48,8 @@ install_missing() {
     die "the package servers of this system do not have all these packages (those of Debian 12 do): $names"
   fi
   say "Installing ${#missing[@]} missing packages: $size. $note"
-  "${apt[@]}" install -y --no-install-recommends --download-only "${missing[@]}" ||
+  [ $reached -eq 1 ] || quiet=(-qq) # apt has said why
+  "${apt[@]}" "${quiet[@]}" install -y --no-install-recommends --download-only "${missing[@]}" ||
     die "cannot reach the package servers; these packages are missing: $names"
   "${apt[@]}" install -y --no-install-recommends "${missing[@]}" || die "apt-get cannot install these packages: $names"
 }
