@@ -32,7 +32,7 @@ WIDGET_MAP=$BUILD/tools/widget_map
 prepare() {
   if [ -z "${ZARVO_BUILD:-}" ]; then
     install_missing "Installing and building take about 5 minutes on two cores." demo
-    say "Building in $BUILD"
+    say "Building in $BUILD; the first time this takes minutes"
     build product zarvo_record zarvo_motion zarvo_card zarvo_demo zarvo_virtual_card Videoplayer Audioplayer widget_map
   fi
   use_card "$CARD"

@@ -4,6 +4,7 @@
 #   ./test.sh gates    the checks that need no build only
 # Stops at the first step that fails, so that its last line is ctest's summary of the release build
 # only when all steps before it have passed.
+[ -n "${BASH_VERSION:-}" ] || exec bash "$0" "$@" # started as "sh test.sh"
 set -euo pipefail
 # shellcheck source=tools/common.sh
 . "$(dirname "${BASH_SOURCE[0]}")/tools/common.sh"

@@ -32,4 +32,8 @@ for program in "${programs[@]}"; do
       grep -q -- --version "$FOLDER/stderr"
   done
 done
+if [ -n "$PROGRAM" ]; then
+  QT_QPA_PLATFORM=xcb run 1 "$PROGRAM"
+  expect_equal "lines without a display: $(cat "$FOLDER/stderr")" 1 "$(wc -l <"$FOLDER/stderr")"
+fi
 expect_equal "what the programs have made" '' "$(ls -A)"
