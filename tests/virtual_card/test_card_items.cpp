@@ -124,7 +124,7 @@ TEST_F(ItemTest, RandomDamageRepeatsWithTheSeed) {
     card::apply(line);
     queue_frames(1);
     const long size = read_mpeg4();
-    const std::vector<u8> bytes(region, region + size);
+    std::vector<u8> bytes(region, region + size);
     card::apply("reset");
     return bytes;
   };
@@ -165,8 +165,7 @@ TEST_F(ItemTest, CallsFailAsOftenAsTheItemSays) {
   const auto width = [&] { return send(display, driver::DISP_IOC_GET_WIDTH, word); };
   card::apply("fail=display/ioctl/DISP_IOC_GET_WIDTH:EIO:2:1");
   EXPECT_EQ(send(display, driver::DISP_IOC_GET_HEIGHT, word), 0);
-  std::vector<long> results;
-  for (int n = 0; n < 4; ++n) results.push_back(width());
+  std::vector<long> results{width(), width(), width(), width()};
   EXPECT_THAT(results, testing::ElementsAre(0, -EIO, -EIO, 0));
   card::apply("fail=any/ioctl:EINTR:every2");
   results = {width(), width(), width(), width()};

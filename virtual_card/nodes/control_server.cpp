@@ -67,7 +67,7 @@ std::string ControlServer::start(const std::string &path) {
                        bind(listener_, reinterpret_cast<const sockaddr *>(&address), sizeof address) == 0;
   if (listens) path_ = path;
   if (!listens || listen(listener_, kMaxClients) != 0) {
-    const std::string error = refused(path, std::strerror(errno));
+    std::string error = refused(path, std::strerror(errno));
     stop();
     return error;
   }
