@@ -1,5 +1,6 @@
 // A bounded queue between the card's encoders and the host's reads.
 #include <algorithm>
+#include <utility>
 
 #include "frame_queue.h"
 #include "host/monotonic_time.h"
@@ -19,6 +20,7 @@ bool FrameQueue::push(ReadyFrame frame) {
     }
     ++counters_.made;
     if (!fits) {
+      if (counts_unread_) ++session_unread_;
       ++counters_.lost;
       return false;
     }
@@ -29,6 +31,7 @@ bool FrameQueue::push(ReadyFrame frame) {
 
 std::optional<ReadyFrame> FrameQueue::pop(std::chrono::microseconds wait) {
   std::unique_lock lock(mutex_);
+  read_ = true;
   if (frames_.empty() && wait.count() > 0) {
     const auto wakes = wakes_;
     const auto until = monotonic_now() + wait;
@@ -42,12 +45,27 @@ std::optional<ReadyFrame> FrameQueue::pop(std::chrono::microseconds wait) {
   return frame;
 }
 
-void FrameQueue::wake() {
+void FrameQueue::end_session() {
   {
     const std::lock_guard lock(mutex_);
+    frames_.clear();
+    bytes_ = 0;
+    if (read_) unread_ += session_unread_;
+    session_unread_ = 0;
+    read_ = false;
     ++wakes_;
   }
   filled_.notify_all();
+}
+
+std::uint64_t FrameQueue::take_unread() {
+  const std::lock_guard lock(mutex_);
+  return std::exchange(unread_, 0);
+}
+
+void FrameQueue::count_unread(bool on) {
+  const std::lock_guard lock(mutex_);
+  counts_unread_ = on;
 }
 
 void FrameQueue::clear() {
@@ -82,6 +100,7 @@ void FrameQueue::missed(std::uint64_t frames) {
 void FrameQueue::reset_counters() {
   const std::lock_guard lock(mutex_);
   counters_ = {};
+  unread_ = session_unread_ = 0;
 }
 
 StreamCounters FrameQueue::counters() const {

@@ -35,13 +35,18 @@ class FrameQueue {
       missed(1);
     }
   }
-  /// Removes and returns the oldest frame. Waits for one at most `wait`; returns none after that time or a
-  /// wake().
+  /// Removes and returns the oldest frame. Waits for one at most `wait`; returns none after that time or an
+  /// end_session().
   std::optional<ReadyFrame> pop(std::chrono::microseconds wait);
-  /// Ends the waits of the pop() calls that are in progress.
-  void wake();
   /// Drops the frames without counting them as lost.
   void clear();
+  /// Ends a session of encoding: drops the frames and ends the waits of the pop() calls that are in progress.
+  void end_session();
+  /// Returns the number of frames that found the queue full since the last call, in sessions in which the
+  /// host has read the stream.
+  std::uint64_t take_unread();
+  /// Tells whether it is the host's fault when the queue is full.
+  void count_unread(bool on);
   /// Counts a frame that a read returned without the queue.
   void passed();
   /// Counts a frame that was popped as lost instead of delivered.
@@ -61,6 +66,10 @@ class FrameQueue {
   std::size_t max_frames_ = ~std::size_t{0};
   std::size_t bytes_ = 0;
   std::uint64_t wakes_ = 0;
+  bool counts_unread_ = true;
+  bool read_ = false;                 ///< the host has read the stream in this session
+  std::uint64_t session_unread_ = 0;  ///< frames of this session that found the queue full
+  std::uint64_t unread_ = 0;          ///< those of earlier sessions that count
   StreamCounters counters_;
 };
 

@@ -2,7 +2,8 @@
 #include "board.h"
 
 #include <cerrno>
-#include <cstdio>
+
+#include "host/message.h"
 
 namespace virtual_card {
 namespace {
@@ -88,10 +89,7 @@ void Board::stop_encoding() {
   settings.state.encoding = false;
   encoding = false;
   ++settings.session;
-  for (Stream *stream : {&mpeg4, &mjpeg, &audio}) {
-    stream->clear();
-    stream->queue.wake();
-  }
+  for (Stream *stream : {&mpeg4, &mjpeg, &audio}) stream->end_session();
 }
 
 void Board::drop_frames_of_other_session(u32 session) {
@@ -144,7 +142,7 @@ void Board::change_conditions(nanoseconds now) {
     };
     std::string reason;
     if (film_of(next) != film_of(conditions) && !engine.show_film(n, film_of(next), &reason))
-      std::fprintf(stderr, "virtual card: item \"camera%u\": %s\n", n + 1, reason.c_str());
+      print_message("item \"camera%u\": %s", n + 1, reason.c_str());
   }
   set_conditions(next);
 }

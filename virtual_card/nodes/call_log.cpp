@@ -4,13 +4,13 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <cstdio>
 #include <cstring>
 #include <new>
 
 #include "commands.h"
 #include "describe.h"
 #include "host/files.h"
+#include "host/message.h"
 #include "host/real_calls.h"
 
 namespace virtual_card {
@@ -55,7 +55,7 @@ void CallLog::update() {
 }
 
 void CallLog::end_file(const char *reason) {
-  std::fprintf(stderr, "virtual card: the log ends here: %s\n", reason);
+  print_message("the log ends here: %s", reason);
   file_ = -1;
   update();
 }

@@ -5,16 +5,18 @@
 #include <sys/mman.h>
 
 #include <cerrno>
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
 #include <system_error>
 
 #include "device_audio.h"
 #include "device_display.h"
 #include "device_encoder.h"
 #include "device_video_input.h"
+#include "host/message.h"
 #include "host/real_calls.h"
+#include "state_file.h"
 
 namespace virtual_card {
 namespace {
@@ -33,6 +35,15 @@ class Making {
   Making(const Making &) = delete;
   Making &operator=(const Making &) = delete;
 };
+
+/// Returns the path without links, from the root: the host may change its folder before the last close, and
+/// then the file behind a link is replaced, not the link.
+std::string lasting_path(const std::string &path) {
+  std::error_code error;
+  const auto absolute = std::filesystem::absolute(path, error);
+  const auto resolved = std::filesystem::weakly_canonical(absolute, error);
+  return error ? path : resolved.string();
+}
 
 /// Ends the card's threads at exit, before the host's libraries are unloaded.
 struct AtExit {
@@ -91,10 +102,15 @@ void Card::power_up() {
   std::string reason;
   if (!power_up.log_file.empty() && error.empty() && !board_.log.write_to(power_up.log_file, reason))
     error = "item \"log\": cannot write " + power_up.log_file + ": " + reason;
+  if (!power_up.state_file.empty() && error.empty()) {
+    state_file_ = lasting_path(power_up.state_file);
+    reason = load_state(state_file_, nodes_);
+    if (!reason.empty()) error = "item \"state\": " + state_file_ + ": " + reason;
+  }
   // The socket of a forked child's parent stays the parent's.
   if (!power_up.control_socket.empty() && error.empty() && left_to_parent == nullptr)
     error = control_.start(power_up.control_socket);
-  if (!error.empty()) std::fprintf(stderr, "virtual card: ZARVO_VIRTUAL_CARD: %s\n", error.c_str());
+  if (!error.empty()) print_message("ZARVO_VIRTUAL_CARD: %s", error.c_str());
 }
 
 DeviceNode *Card::node(Device device) {
@@ -106,11 +122,25 @@ void Card::log(Call call, long result) {
   board_.log.add(std::move(call), result, board_.clock.now());
 }
 
-void Card::stop_if_unused() {
-  if (open_ > 0) return;
+void Card::stop() {
   runner_.stop();
   board_.last_close();
   for (const auto &each : nodes_) each->region().release();
+}
+
+void Card::last_close() {
+  stop();
+  if (!state_file_.empty()) {
+    const std::string reason = save_state(state_file_, board_);
+    if (!reason.empty()) print_message("%s keeps an older state: %s", state_file_.c_str(), reason.c_str());
+  }
+  const unsigned long long frames = board_.mpeg4.queue.take_unread() + board_.mjpeg.queue.take_unread();
+  const unsigned long long blocks = board_.audio.queue.take_unread();
+  if (frames + blocks > 0)
+    print_message(
+        "%llu video frames and %llu blocks of each audio input are lost: the program did not read them in "
+        "time",
+        frames, blocks);
 }
 
 long Card::open(Device device, int flags, int sibling) {
@@ -127,7 +157,7 @@ long Card::open(Device device, int flags, int sibling) {
       if (const long error = runner_.start()) return error;
     const long fd = node(device)->region().open(sibling, (flags & O_CLOEXEC) != 0);
     if (fd >= 0) ++open_;
-    stop_if_unused();
+    if (open_ == 0) stop();
     return fd;
   }();
   log(std::move(call), result);
@@ -198,8 +228,7 @@ void Card::duplicated() {
 
 void Card::closed() {
   const std::lock_guard lock(power_mutex_);
-  --open_;
-  stop_if_unused();
+  if (--open_ == 0) last_close();
 }
 
 void Card::unmapped(int count) {
@@ -221,6 +250,7 @@ bool Card::reset() {
   const std::lock_guard lock(power_mutex_);
   if (open_ > 0) return false;
   board_.reset();
+  state_file_.clear();
   runner_.power_up();
   return true;
 }
@@ -238,6 +268,7 @@ void Card::power_off() {
   const std::lock_guard lock(power_mutex_);
   off_ = true;
   runner_.stop();
+  if (open_ > 0) last_close();
 }
 
 }  // namespace virtual_card

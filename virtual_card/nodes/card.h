@@ -69,7 +69,9 @@ class Card {
   Card();
   void power_up();
   DeviceNode *node(Device device);
-  void stop_if_unused();
+  void stop();
+  /// Stops the card, saves its state and reports the frames that the host did not read in time.
+  void last_close();
   void log(Call call, long result);
 
   Board board_;
@@ -80,6 +82,7 @@ class Card {
   std::mutex power_mutex_;  // guards the members below, and start and stop of runner_
   int open_ = 0;
   int mapped_ = 0;
+  std::string state_file_;  // none: empty
   bool off_ = false;
 };
 

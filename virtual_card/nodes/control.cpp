@@ -1,9 +1,9 @@
 // The functions of virtual_card.h.
 
-#include <cstdio>
 #include <stdexcept>
 
 #include "card.h"
+#include "host/message.h"
 
 namespace virtual_card {
 namespace {
@@ -21,7 +21,7 @@ auto with_settings(Use use) {
 }
 
 void refused(const char *what) {
-  std::fprintf(stderr, "virtual card: %s refused: a device node is open or the value is wrong\n", what);
+  print_message("%s refused: a device node is open or the value is wrong", what);
 }
 
 }  // namespace

@@ -28,8 +28,11 @@ std::string number(u32 value, bool hexadecimal) {
   return text;
 }
 
-std::string describe_record(const RecordFields &fields, std::span<const u8> record) {
-  std::string text;
+}  // namespace
+
+std::string describe_command(const CommandRow &row, std::span<const u8> record) {
+  const RecordFields &fields = row.fields;
+  std::string text = row.name;
   for (std::string_view names = fields.names; !names.empty() && !record.empty();) {
     const auto [name, rest] = split(names, ' ');
     // Masks, addresses and packed words are read in hexadecimal.
@@ -40,15 +43,13 @@ std::string describe_record(const RecordFields &fields, std::span<const u8> reco
   return text;
 }
 
-}  // namespace
-
 std::string describe(const Call &call, const CommandRow *row, std::span<const u8> record,
                      std::chrono::nanoseconds time) {
   char stamp[32];
   std::snprintf(stamp, sizeof stamp, "%.6f ", std::chrono::duration<double>(time).count());
   std::string line = std::string(stamp) + name_of(call.device) + " " + name_of(call.operation);
   if (row != nullptr) {
-    line += " " + std::string(row->name) + describe_record(row->fields, record);
+    line += " " + describe_command(*row, record);
   } else if (call.operation == Operation::ioctl) {
     line += " " + number(call.code, true);
   }

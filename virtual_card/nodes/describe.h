@@ -13,6 +13,8 @@
 
 namespace virtual_card {
 
+/// Returns e.g. "DISP_IOC_READ_REG address=0x310 value=0x5".
+std::string describe_command(const CommandRow &row, std::span<const u8> record);
 /// Returns e.g. "12.345678 display ioctl DISP_IOC_READ_REG address=0x310 value=0x5 = 0". `time` is card time;
 /// `record` is the record after the command.
 std::string describe(const Call &call, const CommandRow *row, std::span<const u8> record,

@@ -3,10 +3,20 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <cstring>
 
 #include "host/user_memory.h"
 
 namespace virtual_card {
+namespace {
+
+bool channel_fits(const CommandRow &row, const void *record) {
+  u32 channel = 0;
+  if (row.channel_first) std::memcpy(&channel, record, sizeof channel);
+  return channel < kChannels;
+}
+
+}  // namespace
 
 long DeviceNode::ioctl(u32 code, std::uintptr_t argument) {
   const auto rows = commands();
@@ -25,6 +35,12 @@ long DeviceNode::ioctl(u32 code, std::uintptr_t argument) {
   return result;
 }
 
+long DeviceNode::execute(const CommandRow &row, void *record) {
+  if (!channel_fits(row, record)) return -EINVAL;
+  const std::lock_guard lock(board_.mutex);
+  return row.handler(*this, record);
+}
+
 long DeviceNode::run(u32 code, const CommandRow *row, std::uintptr_t argument, std::span<u8> record,
                      Call *logged) {
   if (const int error = board_.call_faults.strike(Operation::ioctl, device_, code)) return -error;
@@ -37,18 +53,11 @@ long DeviceNode::run(u32 code, const CommandRow *row, std::uintptr_t argument, s
       log_pointed_to(row->code, record.data(), logged->argument);
     }
   }
-  if (row->channel_first) {
-    u32 channel;
-    std::copy_n(record.begin(), sizeof channel, reinterpret_cast<u8 *>(&channel));
-    if (channel >= kChannels) return -EINVAL;
-  }
+  if (!channel_fits(*row, record.data())) return -EINVAL;
   // Test whether the reply can be written back before the command changes anything.
   if (row->answers)
     if (const long error = copy_to_user(argument, record.data(), row->size)) return error;
-  {
-    const std::lock_guard lock(board_.mutex);
-    if (const long result = row->handler(*this, record.data()); result != 0) return result;
-  }
+  if (const long error = execute(*row, record.data())) return error;
   return row->answers ? copy_to_user(argument, record.data(), row->size) : 0;
 }
 

@@ -81,6 +81,8 @@ class DeviceNode {
   virtual long place_mapping(std::size_t length, int protection, off_t offset);
 
   Region &region() { return region_; }
+  /// Carries out a command of this node. Returns 0 or a negated error number. `record` has row.size bytes.
+  long execute(const CommandRow &row, void *record);
 
  protected:
   virtual std::span<const CommandRow> commands() const { return {}; }

@@ -187,7 +187,7 @@ constexpr ItemRow kRows[] = {
      true},
     {"log", "=FILE", "a regular file, or /dev/stderr", "writes a line for each call on a node",
      read_path<&PowerUp::log_file>, true},
-    {"state", "=FILE", "a file to read and write", "keeps registers and settings between two programs",
+    {"state", "=FILE", "a regular file, or none yet", "keeps registers and settings from program to program",
      read_path<&PowerUp::state_file>, true},
     {"control", "=SOCKET", "a path for a UNIX socket", "zarvo_card can change and watch the card",
      read_path<&PowerUp::control_socket>, true},

@@ -8,11 +8,11 @@
 #include <algorithm>
 #include <bit>
 #include <cerrno>
-#include <cstdio>
 #include <cstring>
 #include <utility>
 
 #include "host/files.h"
+#include "host/message.h"
 #include "host/real_calls.h"
 
 namespace virtual_card {
@@ -46,8 +46,8 @@ long Region::open(int sibling, bool close_on_exec) {
   release();
   const long fd = make_memory(close_on_exec);
   if (fd < 0)
-    std::fprintf(
-        stderr, "virtual card: cannot make the memory of /dev/%s, %zu KiB: %s\n", name_, size_ / 1024,
+    print_message(
+        "cannot make the memory of /dev/%s, %zu KiB: %s", name_, size_ / 1024,
         fd == -EFBIG ? "the file size limit (ulimit -f) is lower" : std::strerror(static_cast<int>(-fd)));
   return fd;
 }

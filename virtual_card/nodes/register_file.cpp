@@ -40,6 +40,11 @@ void DecoderChips::write(unsigned chip, unsigned address, u8 value) {
   if (address == driver::kDecoderStatus) status_written_.at(chip) = true;
 }
 
+std::optional<u8> DecoderChips::written(unsigned chip, unsigned address) const {
+  if (address == driver::kDecoderStatus && !status_written_.at(chip)) return {};
+  return bytes_.at(chip).at(address);
+}
+
 PictureSettings DecoderChips::picture(unsigned channel) const {
   const auto &chip = bytes_.at(channel / driver::kChannelsPerChip);
   const unsigned first =

@@ -3,11 +3,11 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <cstdio>
 #include <new>
 #include <system_error>
 #include <utility>
 
+#include "host/message.h"
 #include "host/threads.h"
 #include "picture/encoded_picture.h"
 
@@ -218,8 +218,7 @@ Picture Runner::look(unsigned channel) {
 
 void Runner::watch(nanoseconds now) {
   const std::lock_guard lock(board_.mutex);
-  if (board_.settings.controller.expired(now))
-    std::fputs("virtual card: the watchdog would have reset the machine\n", stderr);
+  if (board_.settings.controller.expired(now)) print_message("the watchdog would have reset the machine");
 }
 
 void Runner::skip_to(nanoseconds now) {

@@ -45,6 +45,7 @@ void Stream::set_faults(const FaultAmounts &amounts, u32 seed) {
   const std::lock_guard lock(mutex_);
   faults_.set(amounts, seed);
   queue.limit_frames(faults_.queue_limit());
+  queue.count_unread(!faults_.stalled());
   faulty_ = faults_.any() || !held_.empty();
 }
 
@@ -53,6 +54,11 @@ void Stream::clear() {
   queue.clear();
   held_.clear();
   faulty_ = faults_.any();
+}
+
+void Stream::end_session() {
+  clear();
+  queue.end_session();
 }
 
 void Stream::take(bool encoding, std::chrono::nanoseconds now) {

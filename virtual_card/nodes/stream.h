@@ -24,6 +24,8 @@ class Stream {
   void set_faults(const FaultAmounts &amounts, u32 seed);
   /// Drops the frames without counting them as lost.
   void clear();
+  /// Does the same, and ends the waits of reads.
+  void end_session();
 
   /// Sets the supply: `rate` frames a second of card time; 0: one frame for each read.
   void supply(std::vector<ReadyFrame> frames, double rate, std::uint64_t limit);

@@ -178,6 +178,10 @@ void Engine::set_threshold(unsigned channel, u16 level) {
   if (channel < kChannels) parts_->channels[channel]->motion().set_threshold(level);
 }
 
+MotionThresholds Engine::thresholds(unsigned channel) const {
+  return parts_->channels.at(channel)->motion().thresholds();
+}
+
 bool Engine::show_film(unsigned channel, const std::string &path, std::string *error) {
   if (channel >= kChannels) {
     if (error != nullptr) *error = "no channel " + std::to_string(channel);

@@ -13,6 +13,7 @@
 #include "card_state.h"
 #include "field.h"
 #include "frame_queue.h"
+#include "motion_detector.h"
 #include "picture.h"
 
 namespace virtual_card {
@@ -42,6 +43,8 @@ class Engine {
   void set_thresholds(const driver::MotionMap &map);
   /// Sets all thresholds of a channel's map. Any thread.
   void set_threshold(unsigned channel, u16 level);
+  /// Returns a channel's map. Any thread.
+  MotionThresholds thresholds(unsigned channel) const;
   /// Puts a film in front of a camera; an empty path removes it. Returns false, with the reason in `error`,
   /// when the file cannot be read as video. Any thread.
   bool show_film(unsigned channel, const std::string &path, std::string *error);

@@ -42,6 +42,11 @@ void MotionDetector::set_threshold(u16 level) {
   map_.fill(level);
 }
 
+MotionThresholds MotionDetector::thresholds() const {
+  const std::lock_guard lock(mutex_);
+  return map_;
+}
+
 bool MotionDetector::looks_at(std::int64_t field) {
   return field % (2 * kFramesPerLook) == 0;
 }

@@ -28,6 +28,9 @@ struct MovedBlocks {
   }
 };
 
+/// The thresholds of a whole map, row by row.
+using MotionThresholds = std::array<u16, std::size_t{driver::kMotionMapSide} * driver::kMotionMapSide>;
+
 class MotionDetector {
  public:
   MotionDetector();
@@ -36,6 +39,8 @@ class MotionDetector {
   void set_thresholds(const driver::MotionMap &map);
   /// Sets all thresholds of the map. Any thread.
   void set_threshold(u16 level);
+  /// Any thread.
+  MotionThresholds thresholds() const;
 
   /// Returns whether the detector looks at this field: the top field of every third frame.
   static bool looks_at(std::int64_t field);
@@ -49,8 +54,8 @@ class MotionDetector {
   const MovedBlocks &blocks() const { return blocks_; }
 
  private:
-  std::mutex mutex_;  ///< guards map_, which commands may write during a look
-  std::array<u16, std::size_t{driver::kMotionMapSide} * driver::kMotionMapSide> map_{};
+  mutable std::mutex mutex_;  ///< guards map_, which commands may write during a look
+  MotionThresholds map_{};
   Picture seen_;  ///< luma of the previous field looked at; empty: none
   MovedBlocks blocks_;
   std::int64_t moving_until_ = INT64_MIN;
