@@ -25,11 +25,11 @@ inline unsigned long disk_blocks, disk_free;
 inline bool shell_broken;
 }  // namespace fake_system
 
-inline void set_clock(const char *local_time) {
+inline std::time_t at(const char *local_time) {
   std::tm fields{};
   strptime(local_time, "%Y-%m-%d %H:%M:%S", &fields);
   fields.tm_isdst = -1;
-  fake_system::clock_now = mktime(&fields);
+  return mktime(&fields);
 }
 
 inline std::string content_of(const fs::path &path) {
@@ -43,7 +43,7 @@ class RecordingTest : public DialogTest {
     char folder[] = "/tmp/zarvo_recording_XXXXXX";
     fs::current_path(mkdtemp(folder));
     fs::create_directory("Data");
-    set_clock("2009-03-03 14:05:00");
+    fake_system::clock_now = at("2009-03-03 14:05:00");
     fake_system::disk_blocks = 1000;
     fake_system::disk_free = 500;
     fake_system::shell_broken = false;

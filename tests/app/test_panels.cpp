@@ -15,29 +15,27 @@ constexpr struct {
 TEST_F(Panels, WhatIsTypedReachesTheSdkOrIsRefused) {
   dialog->comboMotionArea->setCurrentIndex(4);
   dialog->checkMotionArea->setChecked(true);
+  const auto error = [](bool refused, const std::string &call) {
+    return refused ? "ERROR:zv_" + call + " Error!\n" : "";
+  };
   QLineEdit *const edits[] = {dialog->edtLeft,  dialog->edtRight,      dialog->edtTop,  dialog->edtBottom,
                               dialog->edtMLeft, dialog->edtMRight,     dialog->edtMTop, dialog->edtMBottom,
                               dialog->edtFocus, dialog->edtSensitivity};
   for (const auto &[text, value] : kTyped) {
     SCOPED_TRACE(text);
     for (QLineEdit *edit : edits) edit->setText(text);
-    const std::string number = std::to_string(value);
+    const std::string number = std::to_string(value) + "\n", edge = number + "channel 4 : ";
     const int channel = static_cast<int>(static_cast<unsigned>(value) - 1u);
-    const auto expect = [&, typed = value](QPushButton *button, const std::string &lines, const char *call,
-                                           bool refused) {
-      const std::string error = std::string("ERROR:zv_") + call + " Error!\n";
-      EXPECT_EQ(printed_by([&] { button->click(); }), lines + (refused ? error : "")) << typed;
-    };
-    expect(dialog->btnSetSensitivity, "Channel 0 :Set Sensitivity = " + number + "\n", "SetMotionSensitivity",
-           value < 0);
-    expect(dialog->btnSetFocus, "Set Focus channel = " + std::to_string(channel) + "\n", "SetFocusChannel",
-           channel < 0 || channel > 15);
-    expect(dialog->btnSetShield, "", "SetShieldRect", value < 0);
-    std::string lines = "Mark : 1\n";
-    for (const char *edge : {"Left= ", "Right= ", "Top= ", "Bottom= "}) {
-      lines += std::string("channel 4 : ") + edge + number + "\n";
-    }
-    expect(dialog->btnSetMotionArea, lines, "MarkMotionArea", value < 0);
+    const std::pair<QPushButton *, std::string> rows[] = {
+        {dialog->btnSetSensitivity,
+         "Channel 0 :Set Sensitivity = " + number + error(value < 0, "SetMotionSensitivity")},
+        {dialog->btnSetFocus, "Set Focus channel = " + std::to_string(channel) + "\n" +
+                                  error(channel < 0 || channel > 15, "SetFocusChannel")},
+        {dialog->btnSetShield, error(value < 0, "SetShieldRect")},
+        {dialog->btnSetMotionArea, "Mark : 1\nchannel 4 : Left= " + edge + "Right= " + edge + "Top= " + edge +
+                                       "Bottom= " + number + error(value < 0, "MarkMotionArea")}};
+    for (const auto &[button, printed] : rows)
+      EXPECT_EQ(printed_by([press = button] { press->click(); }), printed);
     for (const QLineEdit *edit : edits) EXPECT_EQ(edit->text(), text);
   }
 }

@@ -16,72 +16,62 @@ class Playback : public RecordingTest {
     fs::permissions(path, fs::perms::owner_all);
   }
 
-  /// Presses Open and chooses a file, or cancels the choice for an empty path.
-  std::string play(const std::string &path) {
-    QTimer::singleShot(0, dialog.get(), [&, path] {
+  /// Presses Open and chooses a file, types its name, or cancels the choice for an empty one.
+  std::string play(const std::string &file, bool typed = false) {
+    QTimer::singleShot(0, dialog.get(), [&] {
       auto *const chooser = qobject_cast<QFileDialog *>(QApplication::activeModalWidget());
       ASSERT_TRUE(chooser);
       EXPECT_EQ(chooser->objectName(), "Playback");
       EXPECT_EQ(chooser->directory().absolutePath().toStdString(), fs::current_path());
       EXPECT_FALSE(dialog->btnRecordStart->isEnabled());
-      if (path.empty()) return chooser->reject();
-      chooser->selectFile(QString::fromStdString(path));
+      if (file.empty()) return chooser->reject();
+      const QString name = QString::fromStdString(file);
+      typed ? chooser->findChild<QLineEdit *>("fileNameEdit")->setText(name) : chooser->selectFile(name);
       static_cast<QDialog *>(chooser)->accept();
     });
+    QTimer give_up;  // a name that is refused leaves a message on the screen
+    give_up.callOnTimeout([] {
+      if (QWidget *const refusal = QApplication::activeModalWidget()) refusal->close();
+    });
+    give_up.start(2000);
     std::string lines = printed_by([&] { dialog->btnPlayback->click(); });
     EXPECT_TRUE(dialog->btnRecordStart->isEnabled());
     return lines;
   }
 };
 
-// The names are what an operator's folders may be called; each must reach its player as one word.
+// The names are what an operator's folders may be called; each must reach its player as one word. A name
+// with a double quote cannot be chosen through Qt's own reading of what is typed, and a link hides by its
+// name what kind of recording it leads to.
 TEST_F(Playback, TheChosenFileReachesItsPlayerAsOneArgument) {
   for (const char *player : {"Videoplayer", "Audioplayer"}) {
     write_program(player, "printf '%s|%s' \"$0\" \"$#|$1\" > played");
   }
+  const fs::path here = fs::current_path();
   const std::string deep = std::string(120, 'l') + "/" + std::string(120, 'm') + "/n.rec";
+  const std::string quoted = "a \"b\".rec";
+  fs::create_symlink(quoted, "link.aud");
+  const auto expect_played = [&](const std::string &chosen, bool typed, const std::string &file) {
+    EXPECT_EQ(play(chosen, typed), "");
+    const std::string player = file.find(".rec") == std::string::npos ? "./Audioplayer" : "./Videoplayer";
+    EXPECT_EQ(content_of("played"), player + "|1|" + file) << chosen;
+    fs::remove("played");
+  };
   for (const std::string name :
        {"a.rec", "a.aud", "x.rec/a.aud", "a.REC", "it's a 'name'.rec", "$(touch gone) `touch gone`.rec",
-        "; touch gone \\ \"*\"/a.aud", "K\xC3\xA4mera.rec", deep.c_str()}) {
-    const fs::path path = fs::current_path() / name;
+        "; touch gone \\ \"*\"/a.aud", "K\xC3\xA4mera.rec", deep.c_str(), quoted.c_str()}) {
+    const fs::path path = here / name;
     fs::create_directories(path.parent_path());
     std::ofstream(path) << "x";
-    EXPECT_EQ(play(path), "");
-    const std::string player = name.find(".rec") == std::string::npos ? "./Audioplayer" : "./Videoplayer";
-    EXPECT_EQ(content_of("played"), player + "|1|" + path.string());
-    fs::remove("played");
+    expect_played(path, false, path);
   }
+  for (const std::string &typed : {quoted, (here / quoted).string(), std::string("link.aud")})
+    expect_played(typed, true, here / quoted);
   EXPECT_FALSE(fs::exists("gone"));
   EXPECT_EQ(play(""), "");
   EXPECT_FALSE(fs::exists("played"));
   fake_system::shell_broken = true;
-  EXPECT_EQ(play(fs::current_path() / "a.rec"), "Playback error!\n");
-}
-
-// A name with a double quote cannot be chosen through Qt's own reading of what is typed, and a link hides by
-// its name what kind of recording it leads to.
-TEST_F(Playback, TypedNamesAndLinksLeadToTheFile) {
-  for (const char *player : {"Videoplayer", "Audioplayer"}) {
-    write_program(player, "printf '%s|%s' \"$0\" \"$1\" > played");
-  }
-  const std::string name = "a \"b\".rec";
-  std::ofstream(name) << "x";
-  fs::create_symlink(name, "link.aud");
-  QTimer give_up;  // a name that is refused leaves a message on the screen
-  give_up.callOnTimeout([] {
-    if (QWidget *const refusal = QApplication::activeModalWidget()) refusal->close();
-  });
-  give_up.start(2000);
-  for (const std::string &typed : {name, (fs::current_path() / name).string(), std::string("link.aud")}) {
-    QTimer::singleShot(0, dialog.get(), [&] {
-      QWidget *const chooser = QApplication::activeModalWidget();
-      chooser->findChild<QLineEdit *>("fileNameEdit")->setText(QString::fromStdString(typed));
-      static_cast<QDialog *>(chooser)->accept();
-    });
-    dialog->btnPlayback->click();
-    EXPECT_EQ(content_of("played"), "./Videoplayer|" + (fs::current_path() / name).string()) << typed;
-    fs::remove("played");
-  }
+  EXPECT_EQ(play(here / "a.rec"), "Playback error!\n");
 }
 
 std::string record_header(const char *tag, int lines, int rate) {
