@@ -1,5 +1,7 @@
 // Tests of the watchdog, the status queries and the raw register access.
 
+#include <stdio_ext.h>
+
 #include "sdk_test.h"
 
 namespace {
@@ -103,6 +105,7 @@ TEST_F(Watchdog, RegistersPrintTheirLine) {
               zv_GetTarnRegisterValue(handle, 0x268, &(word = 0));
               zv_SetTW2815RegisterValue(handle, 2, 0x17, &byte);
               zv_GetTW2815RegisterValue(handle, 2, 0x17, &(byte = 0));
+              EXPECT_EQ(__fpending(stdout), 0u);  // who reads a pipe sees the lines at once
             }),
             "Tarn6400 Register 0x268 = 0xabcd.\nTarn6400 Register 0x268 = 0xabcd.\n"
             "TW2815 2 Register 0x17 = 0x5e.\nTW2815 2 Register 0x17 = 0x5e.\n");
