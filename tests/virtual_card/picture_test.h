@@ -1,7 +1,7 @@
 /**
  * @file picture_test.h
- * The world of the tests of the picture side alone: an engine without nodes or clock, and decoders for what
- * it makes.
+ * The world of the tests of the picture side alone: an engine without nodes or clock, and what a host decodes
+ * of its frames.
  */
 #ifndef PICTURE_TEST_H
 #define PICTURE_TEST_H
@@ -9,10 +9,10 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <cmath>
-#include <cstdlib>
+#include <map>
 #include <optional>
 
+#include "picture/av_ptr.h"
 #include "picture/engine.h"
 #include "picture/frame_mark.h"
 #include "support.h"
@@ -22,42 +22,26 @@ using card::Area, card::Colour, card::FrameMark;
 
 constexpr u32 kHalfD1 = SCALE_ZV_HALF_D1, kCif = SCALE_ZV_CIF, kD1 = driver::kScaleCodeD1;
 
-/// A decoded picture, 4:2:0.
-struct Decoded {
-  u32 width = 0;
-  u32 height = 0;
-  bool intra = false;
-  bool interlaced = false;
-  std::vector<u8> y, cb, cr;
+bool near(Colour a, Colour b, int tolerance = 12);
 
-  std::optional<FrameMark> mark() const { return card::read_frame_mark(y.data(), width, width, height); }
-  /// The colour at a point given in hundredths of the picture's size.
-  Colour at(u32 x, u32 y_percent) const {
-    const std::size_t px = width * x / 100, py = height * y_percent / 100;
-    const std::size_t chroma = py / 2 * (width / 2) + px / 2;
-    return {y[py * width + px], cb[chroma], cr[chroma]};
-  }
-};
-
-inline bool near(Colour a, Colour b, int tolerance = 12) {
-  return std::abs(a.y - b.y) <= tolerance && std::abs(a.cb - b.cb) <= tolerance &&
-         std::abs(a.cr - b.cr) <= tolerance;
-}
-
-/// A frame as the host gets it; its bytes follow the host's header.
-struct Encoded {
+/// A frame of a stream, and the picture that a host decodes, 4:2:0.
+struct Frame {
   unsigned channel = 0;
-  bool intra = false;
-  u32 width = 0;
-  u32 height = 0;
+  bool intra = true;
   std::int64_t microseconds = 0;
-  std::vector<u8> bytes;
+  std::vector<u8> bytes;  ///< without the host's header
+  u32 width = 0, height = 0;
+  bool interlaced = false;
+  std::vector<u8> samples;  ///< Y, Cb, Cr
+
+  std::optional<FrameMark> mark() const {
+    return card::read_frame_mark(samples.data(), width, width, height);
+  }
+  /// The colour at a point given in hundredths of the picture's size.
+  Colour at(u32 x_percent, u32 y_percent) const;
 };
 
-/// Decodes a channel's MPEG-4 stream, with the host's header in front of each intra frame. Any complaint of
-/// the decoder fails the test.
-std::vector<Decoded> decode_mpeg4(const std::vector<Encoded> &frames, u32 width, u32 height, bool interlaced);
-Decoded decode_jpeg(const Encoded &frame);
+/// The samples of one input's sound.
 std::vector<std::int16_t> decode_g726(const std::vector<u8> &bytes);
 
 /// An engine at power-up that encodes, with every window of the preview enabled but without a place.
@@ -69,10 +53,11 @@ class PictureTest : public testing::Test {
   void encode(unsigned channel, u32 scale_code, u32 interval_code = 1, u32 gop = 10, u32 qp = 4);
   /// Draws and encodes the next fields.
   void fields(int count);
-  std::vector<Encoded> take_mpeg4();
-  std::vector<Encoded> take_jpeg();
-  /// Runs to the end of the next frame and returns a channel's newest picture, from the JPEG encoder.
-  Decoded look(unsigned channel);
+  /// Takes the frames of a stream and decodes them behind the host's headers. A frame that the decoder
+  /// complains about fails the test.
+  std::vector<Frame> take(card::FrameQueue &stream);
+  /// Runs to the end of the next frame and returns a channel's newest JPEG picture.
+  Frame look(unsigned channel);
 
   void window(unsigned number, Area area, u32 flags = ZV_WINDOW_ENABLED) {
     state.display.layout.window[number] = {number,       number,     1,          area.x_start,
@@ -93,8 +78,9 @@ class PictureTest : public testing::Test {
   card::FrameQueue mpeg4{kCapacity}, mjpeg{kCapacity}, audio{kCapacity};
   card::Engine engine{mpeg4, mjpeg, audio};
   card::CardState state;
-  std::int64_t next = 0;   ///< number of the next field
-  std::vector<u8> screen;  ///< the preview
+  std::int64_t next = 0;                                     ///< number of the next field
+  std::vector<u8> screen;                                    ///< the preview
+  std::map<unsigned, card::AvPtr<AVCodecContext>> decoders;  ///< of the MPEG-4 stream, by channel
 };
 
 #endif

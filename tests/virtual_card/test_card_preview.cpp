@@ -30,13 +30,14 @@ class NodePreview : public NodeTest {
     EXPECT_GT(size, 0);
     return buffer(index, size);
   }
-  /// Shows a still channel in the first window.
+  /// Shows a still channel in window 2.
   void preview_on(u32 channel = 0, u32 x_end = 720) {
     card::apply("still=1-16");
     EXPECT_EQ(send(display, DISP_IOC_PREVIEW_ON), 0);
-    EXPECT_EQ(send(video_input, VIN_IOC_WRITE_REG, Register{kRegRouting, channel << kRoutingShift}), 0);
+    EXPECT_EQ(send(video_input, VIN_IOC_WRITE_REG, Register{kRegRouting + 4 * 2, channel << kRoutingShift}),
+              0);
     EXPECT_EQ(
-        send(display, DISP_IOC_SET_WINDOW, ZV_DISPLAY_WINDOW{0, 0, 1, 0, 0, x_end, 480, ZV_WINDOW_ENABLED}),
+        send(display, DISP_IOC_SET_WINDOW, ZV_DISPLAY_WINDOW{2, 0, 1, 0, 0, x_end, 480, ZV_WINDOW_ENABLED}),
         0);
   }
 };
