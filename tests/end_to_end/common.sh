@@ -38,8 +38,8 @@ expect_equal() { [ "$2" = "$3" ] || die "$1: expected '$2', got '$3'"; }
 # expect_decodes FILE...: every file must exist and decode without an error line.
 expect_decodes() { report_streams "$@" || die "not all recordings decode"; }
 
-# readme_block LANGUAGE: the code block of the README in that language.
-readme_block() { awk -v begin="\`\`\`$1" '$0 == "```" { inside = 0 } inside; $0 == begin { inside = 1 }' "$ZARVO_ROOT/README.md"; }
+# readme_block LANGUAGE [DOCUMENT]: the code block of the README, or of another document, in that language.
+readme_block() { awk -v begin="\`\`\`$1" '$0 == "```" { inside = 0 } inside; $0 == begin { inside = 1 }' "$ZARVO_ROOT/${2:-README.md}"; }
 
 # open_program: starts the demo application in $FOLDER/work, on an invisible display.
 open_program() {

@@ -54,6 +54,14 @@ with_cmake static-cmake '' "-DCMAKE_PREFIX_PATH=$static"
 with_pkg_config static-pkg-config "$static" --static
 use_card "$CARD"
 
+# The test that docs/virtual-card.md shows, with the installed card.
+mkdir "$FOLDER/card-test"
+readme_block cmake docs/virtual-card.md >"$FOLDER/card-test/CMakeLists.txt"
+readme_block cpp docs/virtual-card.md >"$FOLDER/card-test/main.cpp"
+quietly cmake -G Ninja -S "$FOLDER/card-test" -B "$FOLDER/card-test" "-DCMAKE_PREFIX_PATH=$static"
+quietly cmake --build "$FOLDER/card-test"
+quietly "$FOLDER/card-test/my_test"
+
 options=(-DBUILD_SHARED_LIBS=ON)
 for part in VIRTUAL_CARD APP PROGRAMS TESTS BENCH; do options+=("-DZARVO_BUILD_$part=OFF"); done
 quietly cmake -G Ninja -S "$ZARVO_ROOT" -B "$FOLDER/shared build" "${options[@]}"
@@ -62,6 +70,8 @@ shared="$FOLDER/shared prefix"
 install_moved "$FOLDER/shared build" shared
 rm -r "$FOLDER/shared build"
 with_cmake shared-cmake '' "-DCMAKE_PREFIX_PATH=$shared"
+! cmake -S "$FOLDER/card-test" -B "$FOLDER/no-card" "-DCMAKE_PREFIX_PATH=$shared" >"$FOLDER/log" 2>&1 ||
+  die "the package without the card claims to have it"
 with_pkg_config shared-pkg-config "$shared"
 with_cmake cpp 's/LANGUAGES C/LANGUAGES CXX/; s/main\.c/main.cpp/' "-DCMAKE_PREFIX_PATH=$shared"
 quietly "${ON_CARD[@]}" "$shared/bin/zarvo_record" --seconds 1 --channels 1 --output "$FOLDER/out"
