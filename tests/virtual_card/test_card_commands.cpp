@@ -90,7 +90,7 @@ TEST_F(NodeTest, RegistersPowerUpAndKeepWhatIsWritten) {
 
 TEST_F(NodeTest, MasksAreKeptInUnitsThatCoverThem) {
   const std::pair<Mask, u32> cases[] = {{{5, 80, 240, 40, 160}, 0x0A1E0514},
-                                        {{5, 1, 9, 7, 8}, 0x00020001},
+                                        {{5, 1, 9, 7, 9}, 0x00020002},
                                         {{5, 0, 720, 0, 576}, 0x005A0048},
                                         {{5, 0, 0, 0, 0}, 0},
                                         {{5, 100, 100, 50, 90}, 0x0C0C060B}};

@@ -62,6 +62,10 @@ TEST_F(NodePreview, ThereIsNoneUntilItIsOnAndNoneAfterTheLastClose) {
     EXPECT_EQ(read_preview(index), 0);
   }
   EXPECT_EQ(card::counters().previews, 6u);
+  card::queue_preview(3, 77);
+  EXPECT_EQ(read_preview(index), 77);
+  EXPECT_EQ(index, 3u);
+  EXPECT_EQ(read_preview(index), 0);
 }
 
 // Catches: a card that composes into the buffer the host still draws from.

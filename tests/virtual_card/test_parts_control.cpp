@@ -16,8 +16,7 @@
 
 namespace {
 
-using virtual_card::CallLog;
-using virtual_card::ControlServer;
+using card::CallLog, card::ControlServer;
 
 class ControlTest : public testing::Test {
  protected:

@@ -4,14 +4,12 @@
 #include <gtest/gtest.h>
 
 #include "nodes/script.h"
+#include "support.h"
 
 namespace {
 
-using testing::AllOf;
-using testing::HasSubstr;
-using virtual_card::Conditions;
-using virtual_card::PowerUp;
-using virtual_card::Script;
+using card::PowerUp, card::Script;
+using testing::AllOf, testing::HasSubstr;
 using namespace std::chrono_literals;
 
 TEST(ItemLine, SetsWhatItSays) {
@@ -23,7 +21,7 @@ TEST(ItemLine, SetsWhatItSays) {
           "state=/s;control=/c;slow=20;seed=9",
           0s, &power_up),
       "");
-  const Conditions conditions = script.conditions(0s);
+  const card::Conditions conditions = script.conditions(0s);
   EXPECT_EQ(conditions.lost, 0x01C5u);
   EXPECT_EQ(conditions.silent, 0x2u);
   EXPECT_EQ(conditions.still, 0x8001u);
@@ -43,12 +41,10 @@ TEST(ItemLine, SetsWhatItSays) {
   EXPECT_EQ(script.conditions(0s).silent, 0x2u);
 }
 
-// What was typed and what would have been right, or nobody finds the slip.
+// The error names what was typed and what is possible.
 TEST(ItemLine, WhatIsWrongIsNamedWithWhatIsPossible) {
   const struct {
-    const char *text;
-    const char *named;
-    const char *possible;
+    const char *text, *named, *possible;
   } cases[] = {
       {"sped=4", "\"sped\" is unknown", "cameraN, lost"},
       {"speed=4;;Lost=1", "\"Lost\" is unknown", "vanish"},

@@ -4,6 +4,7 @@
 #include <ctime>
 
 #include "picture/camera.h"
+#include "picture/encoded_picture.h"
 #include "picture_test.h"
 
 namespace {
@@ -25,12 +26,25 @@ TEST_F(PictureTest, PictureIsAFunctionOfTheMoment) {
   EXPECT_EQ(walked.picture().cb, jumped.picture().cb);
 }
 
-TEST_F(PictureTest, ClockShowsLocalTimeOfTheFrame) {
+TEST_F(PictureTest, FiguresShowChannelAndLocalTimeOfTheFrame) {
+  EXPECT_EQ(card::channel_text(0), "01");
   setenv("TZ", "XXX-5:30", 1);
   tzset();
   const std::chrono::microseconds time{(23 * 3600 + 59 * 60 + 58) * 1'000'000LL + 999'000};
   EXPECT_EQ(card::ClockText({1, 0, time}).view(), "05:29:58.24");
   EXPECT_EQ(card::ClockText({0, 1, time + std::chrono::microseconds(16683)}).view(), "05:29:58.29");
+}
+
+// Catches: the colours of one field in the other.
+TEST_F(PictureTest, AFieldKeepsItsOwnColours) {
+  card::Picture fields;
+  fields.resize(720, 480);
+  card::fill(fields, {0, 0, 720, 480}, card::kMaskGrey);
+  card::fill(fields, {0, 0, 720, 480}, card::kLostBlue, card::field_lines(1));
+  card::EncodedPicture encoded;
+  card::scale_picture(fields, 1, {352, 240, false}, encoded);
+  EXPECT_THAT(encoded.cb, testing::Each(card::kLostBlue.cb));
+  EXPECT_THAT(encoded.cr, testing::Each(card::kLostBlue.cr));
 }
 
 // Catches: a property that works the wrong way round, touches another channel, or the blue of a lost camera.

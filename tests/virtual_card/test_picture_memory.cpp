@@ -1,10 +1,11 @@
 // The picture side when memory runs out.
+
 #include "failing_new.h"
 #include "picture_test.h"
 
 namespace {
 
-class Memory : public PictureTest {
+class MemoryTest : public PictureTest {
  protected:
   /// Makes everything allocate again, for a larger picture, while one allocation fails. Then composes the
   /// same preview in each run. Returns false when the work needs fewer allocations.
@@ -48,13 +49,14 @@ class Memory : public PictureTest {
 
 // Catches: a size that is stored before the memory that it describes, which is a crash at the next look; an
 // encoder that stays unusable after a failed allocation; a lost picture that nobody counts.
-TEST_F(Memory, AFailedAllocationLosesAtMostItsPicture) {
+TEST_F(MemoryTest, AFailedAllocationLosesAtMostItsPicture) {
   ASSERT_FALSE(run(1'000'000));
   const std::vector<u8> expected = screen;
   const auto made = mpeg4.counters().made;
   for (long failing = 0; run(failing); ++failing) {
     ASSERT_EQ(screen, expected) << failing;
     ASSERT_EQ(mpeg4.counters().made, made) << failing;
+    ASSERT_EQ(mjpeg.counters().made, made) << failing;
     ASSERT_LE(mpeg4.counters().lost, 1u) << failing;
     ASSERT_LE(mjpeg.counters().lost, 1u) << failing;
   }

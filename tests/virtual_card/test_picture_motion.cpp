@@ -30,6 +30,8 @@ TEST_F(MotionTest, MovingCamerasAreReportedAndNoOthers) {
   state.motion_enable = 0xFFFF & ~8u;
   ASSERT_EQ(motion_after(2 * kLook) & 0xF, 0u);
   for (int look = 0; look < 16; ++look) ASSERT_EQ(motion_after(kLook), 0xFFF0u);
+  state.channel[0].picture.brightness = 255;
+  EXPECT_EQ(motion_after(3 * kLook) & 1, 0u) << "a change of the picture's properties";
 }
 
 // Catches: levels that work the wrong way round, and areas beside the place they were set for.

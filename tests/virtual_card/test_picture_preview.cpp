@@ -96,11 +96,13 @@ TEST_F(PreviewTest, PictureInPictureLiesOnTopInItsFrame) {
   window(7, {0, 0, 720, 480});
   state.display.layout.frame[1] = {
       driver::kPipFrame, kPip.x_start, kPip.y_start, kPip.x_end, kPip.y_end, 1, 0};
+  state.display.layout.frame[0] = {driver::kScreenFrame, 0, 0, 718, 478, 1, 0};
   fields(4);
   compose();
   EXPECT_EQ(channel_in(kPip), 0u);
   const Colour edge = pixel(600, 304);
   EXPECT_TRUE(near(edge, pixel(464, 400), 0) && near(edge, pixel(703, 463), 0));
+  EXPECT_TRUE(near(edge, pixel(719, 100), 0) && near(edge, pixel(100, 479), 0)) << "the screen's frame";
   EXPECT_FALSE(near(edge, pixel(600, 302), 20));
   state.display.layout.window[0].scale = 0;
   state.display.layout.frame[1].enable = 0;
