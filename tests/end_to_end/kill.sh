@@ -13,7 +13,7 @@ readonly STREAM_HEADER_BEGINS='\x00\x00\x01\x20'
 # delivered: frames and bytes of the frames that the log shows as acknowledged.
 delivered() {
   awk -v descriptor=$DESCRIPTOR_BYTES '
-    / read size 1048576 = / { got = $NF }
+    / read size=1048576 = / { got = $NF }
     / ENC_IOC_MPEG4_DONE / && got > 0 { ++frames; bytes += got - descriptor; got = 0 }
     END { print frames + 0, bytes + 0 }' "$FOLDER/card.log"
 }
