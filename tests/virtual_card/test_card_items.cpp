@@ -149,12 +149,14 @@ TEST_F(ItemTest, PreviewFaultsShowInTheRead) {
   card::advance_frames(1);
   read_node(display, &index, sizeof index);
   EXPECT_EQ(index, frozen);
+  // A sanitizer looks at as many bytes as a read says it has written.
+  std::vector<u8> room(static_cast<std::size_t>(kHuge));
   for (const auto &[item, result] : {std::pair{"stall=preview", 0L},
                                      {"stall=;empty=preview", 0L},
                                      {"empty=;negative=preview", long{-EIO}},
                                      {"negative=;oversize=preview", kHuge}}) {
     card::apply(item);
-    EXPECT_EQ(read_node(display, &index, sizeof index), result) << item;
+    EXPECT_EQ(read_node(display, room.data(), sizeof index), result) << item;
   }
 }
 
