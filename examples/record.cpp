@@ -1,6 +1,6 @@
 /**
  * @file record.cpp
- * Records channels of the card without a window. It shows the shortest complete use of the SDK: open the
+ * Records channels of the card without a window. It shows a complete use of the SDK: open the
  * card, set standard and width, configure channels, register a callback for each kind of stream, start, wait,
  * stop, close.
  */

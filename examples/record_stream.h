@@ -22,7 +22,7 @@ struct StreamKind {
 };
 
 /// An SDK thread calls append(), the main thread everything else. While capture runs, the main thread may
-/// read frames(), missing() and silence().
+/// read frames(), bytes(), missing(), incomplete() and silence().
 class Stream {
  public:
   /// Says that this stream is recorded. `name` is the path of its file.

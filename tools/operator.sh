@@ -3,11 +3,11 @@
 # widgets by their object names, waits for lines and windows, and takes screenshots. To be sourced after
 # common.sh, not run. The caller sets PROGRAM, CARD and WIDGET_MAP to the built files.
 
-OPERATOR_FOLDER=   # display number, log, widget positions; removed at the end
+OPERATOR_FOLDER=   # display number and logs; removed at the end
 DIALOG=            # X window of the dialog
 declare -A WIDGET=()  # object name to "x y" in the dialog
 
-# open_display: starts an X server without a screen, and a window manager on it.
+# open_display: starts an X server with an invisible screen, and a window manager on it.
 open_display() {
   OPERATOR_FOLDER=$(mktemp -d)
   trap close_display EXIT

@@ -1,7 +1,7 @@
 /**
  * @file card_state.h
- * The settings that commands and registers have set. The devices write them; the engine draws and encodes
- * from a copy.
+ * The settings that commands, registers and items have set. The devices write them; the engine draws and
+ * encodes from a copy.
  */
 #ifndef VIRTUAL_CARD_CARD_STATE_H
 #define VIRTUAL_CARD_CARD_STATE_H

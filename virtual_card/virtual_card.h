@@ -1,12 +1,13 @@
 /**
  * @file virtual_card.h
- * Control of the virtual card for tests and benchmarks: unplug cameras, move the clock, break it, read
- * counters. Programs that only use the card do not need this header.
+ * Control of the virtual card for tests and benchmarks: unplug cameras, move the clock, break the card,
+ * read counters. Programs that only use the card do not need this header.
  *
  * All functions may be called from any thread. The first use of a device node or of this interface creates
  * the card of this process, with the options of the environment variable ZARVO_VIRTUAL_CARD. Channels count
- * from 0 to 15, audio inputs and decoder chips from 0 to 3; operators, and the environment variable, count
- * from 1. A channel, input or chip that does not exist throws std::out_of_range.
+ * from 0 to 15, audio inputs and decoder chips from 0 to 3; items, here and in the environment variable,
+ * count from 1. A channel, input or chip that does not exist throws std::out_of_range; ready-made frames may
+ * name any channel.
  */
 #ifndef VIRTUAL_CARD_H
 #define VIRTUAL_CARD_H
@@ -26,8 +27,8 @@ namespace virtual_card {
 // --- Power -------------------------------------------------------------------------------------
 
 /// Puts the card into its power-up state: initial registers, all cameras plugged and moving, real-time
-/// clock, empty queues, no faults, no log, counters zero, no options. While a device node is open, prints a
-/// line on standard error and does nothing.
+/// clock, empty queues, no faults, counters zero, no items but log and control, which go on. While a device
+/// node is open, prints a line on standard error and does nothing.
 void reset();
 
 /// Return the number of descriptors of device nodes and the number of mappings of their regions in use.

@@ -27,7 +27,7 @@ started with the option control=SOCKET in ZARVO_VIRTUAL_CARD.
 
   ITEM                      e.g. lost=3; "lost=" undoes it. With a time, counted from now, in one word:
                             "@5-8 lost=3", "@12 lost=3", "@every 10 for 0.5 stall=mpeg4"
-  reset                     undoes all items
+  reset                     undoes all items but those of power-up
   state                     cameras, inputs, encoders, layout and watchdog
   counters                  frames made, delivered and lost; previews; watchdog
   log                       every call on a device node as it comes
@@ -37,7 +37,7 @@ started with the option control=SOCKET in ZARVO_VIRTUAL_CARD.
   -l, --list                lists the items: usage, values, what the host sees
   -j, --json                state and counters as JSON
   -o, --only NODE           log: only encoder, display, audio or video_input
-  -n, --no-reads            log: without the calls of the capture loop
+  -n, --no-reads            log: without reads and the request and release of each frame
   -h, --help                shows this text
   -V, --version             shows the version
 

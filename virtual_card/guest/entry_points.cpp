@@ -1,5 +1,5 @@
-// The libc functions that this library replaces, in every spelling a compiler can emit. Each is one line;
-// guest_calls decides what to do with the call.
+// The libc functions that this library replaces, in every spelling a compiler can emit. Each only passes
+// the call on; guest_calls decides what to do with it.
 
 // With these macros, libc's headers turn the names into inline functions and aliases of each other.
 #undef _FORTIFY_SOURCE

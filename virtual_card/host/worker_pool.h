@@ -19,7 +19,7 @@ namespace virtual_card {
 class WorkerPool {
  public:
   /// At most `threads` threads work on a job list, the caller of run() included. The other threads start with
-  /// the first run(); if some cannot be started, the rest do the work.
+  /// the first run() of more than one job; if some cannot be started, the rest do the work.
   explicit WorkerPool(unsigned threads) : max_threads_(threads) {}
   ~WorkerPool() { stop(); }
   WorkerPool(const WorkerPool &) = delete;

@@ -67,7 +67,7 @@ struct Board {
   /// Drops the queued frames if `session` is no longer the current session: encoding may be stopped while a
   /// field is being encoded, and the frames of that field must not start the next recording.
   void drop_frames_of_other_session(u32 session);
-  /// Stops encoding and preview when the last descriptor of a node is closed, as a driver does.
+  /// Stops encoding and preview: the last descriptor of all nodes is closed.
   void last_close();
   /// Ends the supply of ready-made frames: the card's encoders deliver again.
   void clear_supply();

@@ -22,7 +22,7 @@ class BoardController {
   /// Carries out a command and returns the reply; an unknown command gets 0.
   u32 command(u32 command, nanoseconds now);
   void set_version(u32 reply) { version_ = reply; }
-  /// Sets what is broken: it replies 0, or something else, and does nothing; its watchdog resets the machine
+  /// Sets what is broken: it replies 0, or something else, and does nothing; its watchdog runs out
   /// although it is fed.
   void set_faults(bool mute, bool wrong, bool bites);
   /// Sets the replies to the next commands with this code. If a reply is not the confirming one, the command

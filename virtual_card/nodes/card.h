@@ -1,7 +1,7 @@
 /**
  * @file card.h
  * The card of this process: its four device nodes and the thread that runs it. It handles calls on device
- * nodes and knows nothing of libc. Results below zero are negated error numbers.
+ * nodes and does not depend on how they reach it. Results below zero are negated error numbers.
  */
 #ifndef VIRTUAL_CARD_CARD_H
 #define VIRTUAL_CARD_CARD_H

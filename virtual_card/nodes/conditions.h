@@ -38,7 +38,7 @@ struct Conditions {
   u32 board_version = driver::kBoardVersionReplies[0];
   bool board_mute = false;      ///< the board controller replies 0 and does nothing
   bool board_wrong = false;     ///< it replies something else and does nothing
-  bool watchdog_bites = false;  ///< the watchdog resets the machine although it is fed
+  bool watchdog_bites = false;  ///< the watchdog runs out although it is fed
 };
 
 /// What counts at power-up only.

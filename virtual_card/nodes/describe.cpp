@@ -35,7 +35,7 @@ std::string describe_command(const CommandRow &row, std::span<const u8> record) 
   std::string text = row.name;
   for (std::string_view names = fields.names; !names.empty() && !record.empty();) {
     const auto [name, rest] = split(names, ' ');
-    // Masks, addresses and packed words are read in hexadecimal.
+    // Most values above the limit are masks or packed words, which are read in hexadecimal.
     const u32 value = take_field(record, fields.width);
     text += " " + std::string(name) + "=" + number(value, value > kLastDecimal || fields.hexadecimal);
     names = rest;

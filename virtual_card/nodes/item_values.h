@@ -1,6 +1,6 @@
 /**
  * @file item_values.h
- * Reads the values of items: numbers, lists of channels, names from a list.
+ * Reads the values of items: numbers, lists of channels, register addresses.
  */
 #ifndef VIRTUAL_CARD_ITEM_VALUES_H
 #define VIRTUAL_CARD_ITEM_VALUES_H

@@ -29,7 +29,7 @@ class Runner {
   /// Starts again at card time 0. Call it after Clock::power_up(), while the thread is stopped.
   void power_up();
 
-  /// Draws what a camera shows at the last field.
+  /// Draws what a camera shows in the last complete frame.
   Picture look(unsigned channel);
 
   /// Manual clock only: runs everything that becomes due in the time, on the caller's thread.

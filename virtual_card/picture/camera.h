@@ -26,7 +26,7 @@ class Camera {
   /// Takes the settings of the channel. Returns true when they change the picture.
   bool adjust(const CardState &state);
   void show_film(std::shared_ptr<Film> film);
-  /// Draws a field, unless it is already drawn. The picture depends only on the settings and the field.
+  /// Draws a field, unless it is already drawn. Without a film, it depends only on settings and field.
   void draw(const Field &field);
 
   const Picture &picture() const { return picture_; }

@@ -88,7 +88,7 @@ void Engine::field(const CardState &state, const Field &field) {
   parts.last = field;
   parts.take_films();
 
-  // From here on nothing is allocated, so that each frame for which memory runs out is counted.
+  // From here on, a frame for which memory runs out is counted as lost.
   std::array<Channel::Work, kChannels> work;
   std::array<unsigned, kChannels> busy{};
   std::size_t jobs = 0;

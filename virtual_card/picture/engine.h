@@ -34,7 +34,7 @@ class Engine {
   /// Composes the newest preview picture from the last fields into `uyvy`, width x lines x 2 bytes.
   void compose(const CardState &state, std::span<u8> uyvy);
 
-  /// Draws and returns what a camera shows at the last field.
+  /// Draws and returns what a camera shows in the last complete frame.
   Picture look(const CardState &state, unsigned channel);
 
   /// Returns the mask of channels with motion at the last field. Any thread.

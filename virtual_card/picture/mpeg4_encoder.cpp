@@ -30,7 +30,7 @@ struct Option {
 };
 constexpr std::array<Option, 3> kOptions{{
     {"mpeg_quant", 1},             // as in the host's header
-    {"motion_est", 1},             // no motion search: it costs too much time for sixteen encoders
+    {"motion_est", 1},             // EPZS, the cheapest search that still follows motion
     {"sc_threshold", 1000000000},  // intra frames only by GOP, not at scene cuts
 }};
 
