@@ -47,7 +47,7 @@ void on_audio(u32 input, u8 *data, i32 length, i32 flags) {
 
 // --- Files
 
-/// Moves standard output away for the stream. What is printed, also by the SDK, goes to standard error.
+/// Keeps standard output for the stream. What is printed, also by the SDK, goes to standard error.
 int take_standard_output() {
   const int stream = fcntl(STDOUT_FILENO, F_DUPFD_CLOEXEC, STDERR_FILENO + 1);
   if (stream < 0 || dup2(STDERR_FILENO, STDOUT_FILENO) < 0)

@@ -51,8 +51,8 @@ class Stream {
   /// Returns how many frames are due `seconds` after the begin, and how many of them have not come.
   std::uint64_t expected(double seconds) const;
   std::uint64_t missing(double seconds) const;
-  /// Returns whether more than 1 % is missing. The first and the last frame may be on their way: two frames
-  /// never count.
+  /// Returns whether more than 1 % is missing. Two missing frames never count: the
+  /// first and the last may be on their way.
   bool incomplete(double seconds) const;
 
   /// Prints the whole tally as a line.

@@ -19,7 +19,7 @@ class Watch {
   Watch(const Watch &) = delete;
   Watch &operator=(const Watch &) = delete;
 
-  /// Call it some times a second.
+  /// Call it several times a second.
   void look();
 
  private:
@@ -28,7 +28,7 @@ class Watch {
   void clear_progress() const;
 
   std::span<const Stream> streams_;
-  std::vector<bool> stopped_;  ///< for each stream, whether a line has told so
+  std::vector<bool> stopped_;  ///< for each stream, whether a line has reported it
   bool terminal_;
   Clock::time_point start_, shown_;
   std::uint64_t frames_ = 0, bytes_ = 0;  ///< the sums that the last progress line has counted

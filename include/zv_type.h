@@ -102,7 +102,7 @@ typedef enum ZV_SCALE_VALUE {
   SCALE_ZV_INVALID = 4
 } ZV_SCALE_VALUE;
 
-/** Which fields of a half-height picture are encoded. */
+/** Whether half-height pictures are encoded from one or both fields of a frame. */
 typedef enum ZV_TWOFIELD_MODE { TWOFIELD_DISABLE = 0, TWOFIELD_ENABLE = 1 } ZV_TWOFIELD_MODE;
 
 /** Motion-JPEG quality. The card has one for all channels: the last Motion-JPEG channel sets it. */
@@ -110,7 +110,7 @@ typedef enum ZV_JPEG_QUALITY {
   JPEG_QP_ZV_LOW = 0,
   JPEG_QP_ZV_MEDIUM = 1,
   JPEG_QP_ZV_HIGH = 2,     /**< the same as medium */
-  JPEG_QP_ZV_UNSUPPORT = 3 /**< keeps the quality of the Motion-JPEG channels before, else medium */
+  JPEG_QP_ZV_UNSUPPORT = 3 /**< the quality of the Motion-JPEG channel before, else medium */
 } ZV_JPEG_QUALITY;
 
 /** Frame rate of a channel, in frames a second. NTSC and PAL names share the same numbers. */

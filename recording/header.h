@@ -40,7 +40,7 @@ RECORD_FILE_HEADER make_header(ZV_VIDEO_CODEC codec, PictureSize size, const std
 
 /// Reads a header at the current position of a file. Returns none when the file is too short.
 std::optional<RECORD_FILE_HEADER> read_header(int file);
-/// Returns the codec of a header; none for an unknown tag, in a file that is not a recording.
+/// Returns the codec of a header; none for an unknown tag: the file is then not a recording.
 std::optional<ZV_VIDEO_CODEC> codec_of(const RECORD_FILE_HEADER &header);
 std::string label_of(const RECORD_FILE_HEADER &header);
 

@@ -10,8 +10,8 @@
 
 namespace card {
 
-/// Sends a request and calls `take` with the pieces of the answer as they come. Returns an empty text when
-/// the card has carried the request out, or what is wrong.
+/// Sends a request and calls `take` with the pieces of the answer as they come. Returns an empty text on
+/// success, else what is wrong.
 std::string ask(const std::string &socket, const std::string &request,
                 const std::function<void(const std::string &piece)> &take);
 

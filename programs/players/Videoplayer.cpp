@@ -12,8 +12,8 @@ const char *stream_format(ZV_VIDEO_CODEC codec) {
   return codec == VIDEO_CODEC_ZV_MJPEG ? "mjpeg" : "m4v";
 }
 
-/// Returns the command lines of both players. They show every picture as 4:3, whatever its size in pixels.
-/// The players get the whole file, so that they can seek, and skip the header themselves.
+/// Returns the command lines of ffplay and mpv. They show every picture as 4:3, whatever its size in pixels.
+/// Both get the whole file, so that they can seek, and skip the header themselves.
 std::vector<players::PlayerCommand> player_commands(const RECORD_FILE_HEADER &header,
                                                     const std::string &format, const std::string &file) {
   const std::string title = recording::label_of(header) + " - " + players::base_name(file);

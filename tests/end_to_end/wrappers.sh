@@ -3,7 +3,7 @@
 # Catches: a card that leaves LD_PRELOAD before it is in the program that opens the nodes.
 . "$(dirname "$0")/common.sh"
 
-export ZARVO_VIRTUAL_CARD=speed=0.1 # also for valgrind
+export ZARVO_VIRTUAL_CARD=speed=0.1 # slow enough for valgrind
 # shellcheck disable=SC2016 # the script expands it
 printf '#!/bin/sh\n"$@"\n' >"$FOLDER/script"
 chmod +x "$FOLDER/script"

@@ -15,7 +15,7 @@
 
 namespace virtual_card {
 
-/// Makes the calls that match fail: of those after the first `skip`, every `every`-th, `times` times.
+/// Makes matching calls fail: after the first `skip`, every `every`-th, at most `times` times.
 struct CallFault {
   Device device = Device::none;  ///< none: every node
   Operation operation = Operation::open;
@@ -24,7 +24,7 @@ struct CallFault {
   std::uint64_t skip = 0;
   std::uint64_t every = 1;
   std::uint64_t times = ~std::uint64_t{0};
-  std::uint64_t seen = 0;  ///< calls that matched so far; survives that the fault is off for a time
+  std::uint64_t seen = 0;  ///< calls that matched so far; kept while the fault is off
 };
 
 class CallFaults {

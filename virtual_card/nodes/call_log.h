@@ -26,7 +26,7 @@ inline constexpr long kMaxError = 4095;
 struct LogLine {
   std::string text;
   const char *node;
-  bool of_capture_loop;  ///< a read, or a command of each pass of a capture loop
+  bool of_capture_loop;  ///< a read, or the request or release of a frame
 };
 
 /// The calls on device nodes in the order of their completion: in memory for tests, in a file and at the
@@ -44,7 +44,7 @@ class CallLog {
   /// Returns whether add() records calls.
   bool on() const { return on_.load(std::memory_order_relaxed); }
   /// Adds a call that ended with `result` at the card time `time`. `row` is the row of its command, or null;
-  /// `record` the command's record after it. A call for which memory runs out is missing in the log.
+  /// `record` its record after it has run. A call for which memory runs out is missing in the log.
   void add(Call call, long result, std::chrono::nanoseconds time, const CommandRow *row = nullptr,
            std::span<const std::uint8_t> record = {}) noexcept;
 

@@ -134,7 +134,7 @@ void ControlServer::drop(std::list<Client>::iterator client) {
     clients_.erase(client);
     for (const Client &other : clients_) watched = watched || other.watching;
   }
-  // Not under the lock: the log calls add_log_line() under its own.
+  // Not under mutex_: the log calls add_log_line(), which locks it, under its own mutex.
   if (!watched) log_.listen({});
 }
 

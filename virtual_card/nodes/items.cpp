@@ -11,7 +11,7 @@
 namespace virtual_card {
 namespace {
 
-/// Reads a value. Returns no effect when the value is not possible; `reason` can then say why.
+/// Reads a value. Returns an empty function for an invalid value; `reason` can then say why.
 using Reader = Effect (*)(std::string_view value, std::string &reason);
 
 struct ItemRow {
@@ -152,7 +152,7 @@ constexpr ItemRow kRows[] = {
      "no signal: a blue picture, no motion, the decoder's video bit is clear",
      read_mask<&Conditions::lost, kChannels>},
     {"flicker", "=CHANNELS:FIELDS", "channels 1-16 and a number of fields, e.g. 3:10",
-     "the signal goes and comes back, each for so many fields", read_flicker},
+     "the signal goes and comes back, each time for this number of fields", read_flicker},
     {"black", "=CHANNELS", kChannelList, "a black picture, as from a covered lens",
      read_mask<&Conditions::black, kChannels>},
     {"still", "=CHANNELS", kChannelList, "bars and the number; nothing moves",
@@ -165,7 +165,8 @@ constexpr ItemRow kRows[] = {
      "a command name, an error name, how often (a number, or everyN), and how many calls pass before; e.g. "
      "display/ioctl/DISP_IOC_SET_WINDOW:EIO:3",
      "the call fails with this error, for good unless a number of times is given", read_fail},
-    {"slow", "=MILLISECONDS", "milliseconds 1-10000", "each call on a node takes so much longer", read_slow},
+    {"slow", "=MILLISECONDS", "milliseconds 1-10000", "each call on a node takes longer by this time",
+     read_slow},
     {"vanish", "", kNoValue, "the card is pulled out: opens and reads fail with ENODEV",
      read_flag<&Conditions::vanished>},
     {"absent", "", kNoValue, "opening a node fails with ENOENT, as without a card",
@@ -177,14 +178,14 @@ constexpr ItemRow kRows[] = {
      read_register<&Conditions::garbage>},
     {"noreply", "", kNoValue, "the board controller replies 0 and does nothing",
      read_flag<&Conditions::board_mute>},
-    {"wrongreply", "", kNoValue, "the board controller replies something else and does nothing",
+    {"wrongreply", "", kNoValue, "the board controller sends a wrong reply and does nothing",
      read_flag<&Conditions::board_wrong>},
     {"bite", "", kNoValue, "a running watchdog runs out although it is fed",
      read_flag<&Conditions::watchdog_bites>},
     {"board", "=VERSION", "bb, cc or dd", "the version that the board controller reports", read_board},
     {"seed", "=NUMBER", "a number from 0 to 4294967295", "the start of all random values", read_seed},
-    {"speed", "=FACTOR", "a number from 0.01 to 1000", "card time runs so many times as fast", read_speed,
-     true},
+    {"speed", "=FACTOR", "a number from 0.01 to 1000", "card time runs this many times as fast as real time",
+     read_speed, true},
     {"log", "=FILE", "a regular file, or /dev/stderr", "writes a line for each call on a node",
      read_path<&PowerUp::log_file>, true},
     {"state", "=FILE", "a regular file, or none yet", "keeps registers and settings from program to program",
@@ -286,7 +287,8 @@ std::string parse_item(std::string_view text, Item &item) {
 
 std::vector<ItemText> item_texts() {
   std::vector<ItemText> texts;
-  texts.push_back({"cameraN=FILE", kCameraValues, "shows a video file instead of the drawn picture"});
+  texts.push_back(
+      {"cameraN=FILE", kCameraValues, "the camera shows a video file instead of the drawn picture"});
   for (const ItemRow &row : kRows)
     texts.push_back({std::string(row.name) + row.usage, row.values, row.effect});
   for (const StreamFaultRow &row : stream_fault_rows())

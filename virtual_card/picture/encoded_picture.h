@@ -30,8 +30,8 @@ std::optional<EncodedSize> encoded_size(u32 scale_code, u32 input_width, u32 inp
 /// in drop mode is a top field. An interlaced picture is encoded after its bottom field.
 bool picture_due(u32 interval_code, bool interlaced, std::int64_t field);
 /// Returns pictures a second of an interval code. Keep mode, one-field pictures: code 0 encodes every field,
-/// code n one field of every n-th frame. Keep mode, interlaced: one picture every code + 1 frames. Drop mode:
-/// all frames but one of every skip + 1.
+/// code n one field of every n-th frame. Keep mode, interlaced: one picture every code + 1 frames. Drop mode
+/// leaves out one of every skip + 1 frames.
 double picture_rate(u32 interval_code, bool interlaced, u32 standard);
 
 /// A 4:2:0 picture without padding between rows.

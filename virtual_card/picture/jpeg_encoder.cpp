@@ -13,7 +13,7 @@ namespace virtual_card {
 
 namespace {
 
-/// The quality whose tables are those of the host's header.
+/// The quality at which libjpeg's tables equal those of the host's header.
 constexpr int kQuality = 25;
 /// A coarse picture has only coefficients whose sum of horizontal and vertical frequency is below this.
 constexpr int kCoarseFrequencies = 4;
