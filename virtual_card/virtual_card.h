@@ -27,8 +27,8 @@ namespace virtual_card {
 // --- Power -------------------------------------------------------------------------------------
 
 /// Puts the card into its power-up state: initial registers, all cameras plugged and moving, real-time
-/// clock, empty queues, no faults, counters zero, no items but log and control, which go on. While a device
-/// node is open, prints a line on standard error and does nothing.
+/// clock, empty queues, no faults, no log of calls, counters zero, no items. What the items log and control
+/// started goes on. While a device node is open, prints a line on standard error and does nothing.
 void reset();
 
 /// Return the number of descriptors of device nodes and the number of mappings of their regions in use.
