@@ -27,7 +27,8 @@ constexpr char kContent[] =
     "ELF";
 std::string content(int fd) {
   char text[4] = {};
-  return {text, static_cast<std::size_t>(std::max<ssize_t>(0, pread(fd, text, sizeof text, 0)))};
+  lseek(fd, 0, SEEK_SET);
+  return {text, static_cast<std::size_t>(std::max<ssize_t>(0, read(fd, text, sizeof text)))};
 }
 
 // Catches: a spelling that opens a real node, one that keeps the host from its files.
