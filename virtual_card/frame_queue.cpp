@@ -101,6 +101,7 @@ void FrameQueue::reset_counters() {
   const std::lock_guard lock(mutex_);
   counters_ = {};
   unread_ = session_unread_ = 0;
+  read_ = false;
 }
 
 StreamCounters FrameQueue::counters() const {
