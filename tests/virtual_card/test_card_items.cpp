@@ -135,28 +135,28 @@ TEST_F(ItemTest, RandomDamageRepeatsWithTheSeed) {
 }
 
 TEST_F(ItemTest, PreviewFaultsShowInTheRead) {
+  // A sanitizer looks at as many bytes as a read says it has written.
+  std::vector<u32> indexes(static_cast<std::size_t>(kHuge) / sizeof(u32));
+  const u32 &index = indexes.front();
+  const auto read_preview = [&] { return read_node(display, indexes.data(), sizeof index); };
   EXPECT_EQ(send(display, driver::DISP_IOC_PREVIEW_ON), 0);
   card::advance_frames(2);
-  u32 index = 9;
-  const long size = read_node(display, &index, sizeof index);
-  EXPECT_EQ(size, 720 * 480 * 2);
+  EXPECT_EQ(read_preview(), 720 * 480 * 2);
   card::apply("index=preview:9");
-  read_node(display, &index, sizeof index);
+  read_preview();
   EXPECT_EQ(index, 9u);
   card::apply("index=;frozen=preview");
-  read_node(display, &index, sizeof index);
+  read_preview();
   const u32 frozen = index;
   card::advance_frames(1);
-  read_node(display, &index, sizeof index);
+  read_preview();
   EXPECT_EQ(index, frozen);
-  // A sanitizer looks at as many bytes as a read says it has written.
-  std::vector<u8> room(static_cast<std::size_t>(kHuge));
   for (const auto &[item, result] : {std::pair{"stall=preview", 0L},
                                      {"stall=;empty=preview", 0L},
                                      {"empty=;negative=preview", long{-EIO}},
                                      {"negative=;oversize=preview", kHuge}}) {
     card::apply(item);
-    EXPECT_EQ(read_node(display, room.data(), sizeof index), result) << item;
+    EXPECT_EQ(read_preview(), result) << item;
   }
 }
 
