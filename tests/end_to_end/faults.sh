@@ -81,12 +81,12 @@ check_record() {
   local fault=$1 loses=$2 out=$3 status=$4 file
   case $loses in
     nothing) slow_run || expect "$fault: status $status: $(tail -n 3 "$out.log")" test "$status" -eq 0 ;;
-    frames) expect "$fault: status $status instead of 3 although frames are missing" test "$status" -eq 3 ;;
+    frames) slow_run || expect "$fault: status $status instead of 3 although frames are missing" test "$status" -eq 3 ;;
     *) expect "$fault: status $status: $(tail -n 3 "$out.log")" test "$status" -eq 0 -o "$status" -eq 3 ;;
   esac
   for file in "$out"/ch0[12].*; do
-    if [ "$loses" = nothing ]; then expect_equal "$fault: $file" '' "$(decode_errors "$file")"; fi
-    expect_equal "$fault: the end of $file" '' "$(end_errors "$file")"
+    if [ "$loses" = nothing ] && ! slow_run; then expect_equal "$fault: $file" '' "$(decode_errors "$file")"; fi
+    slow_run || expect_equal "$fault: the end of $file" '' "$(end_errors "$file")"
   done
 }
 
