@@ -58,8 +58,8 @@ void advance_frames(int frames);
 
 /// Applies a line of items, the language of ZARVO_VIRTUAL_CARD and of zarvo_card, e.g.
 /// "lost=3; @5-8 stall=mpeg4". Times count from now in card time. A line replaces what earlier lines said of
-/// the same names: "lost=" only undoes it, and "reset" undoes everything. Throws std::invalid_argument, which
-/// says what is possible, for a wrong line; then nothing has changed.
+/// the same names: "lost=" only undoes it, and "reset" undoes all items but those of power-up. Throws
+/// std::invalid_argument, which says what is possible, for a wrong line; then nothing has changed.
 void apply(const std::string &line);
 
 /// A row of the table of items, for people.

@@ -1,10 +1,10 @@
 // Runs commands: copies the record in, calls the handler, copies the reply out.
 #include "device.h"
 
-#include <algorithm>
 #include <cerrno>
 #include <cstring>
 
+#include "commands.h"
 #include "host/user_memory.h"
 
 namespace virtual_card {
@@ -19,10 +19,7 @@ bool channel_fits(const CommandRow &row, const void *record) {
 }  // namespace
 
 long DeviceNode::ioctl(u32 code, std::uintptr_t argument) {
-  const auto rows = commands();
-  const auto found =
-      std::find_if(rows.begin(), rows.end(), [&](const CommandRow &row) { return row.code == code; });
-  const CommandRow *row = found == rows.end() ? nullptr : &*found;
+  const CommandRow *const row = command_with(device_, code);
   alignas(std::max_align_t) std::array<u8, kMaxRecord> record;
   if (!board_.log.on()) return run(code, row, argument, record, nullptr);
 
@@ -30,7 +27,8 @@ long DeviceNode::ioctl(u32 code, std::uintptr_t argument) {
   logged.code = code;
   logged.value = argument;
   const long result = run(code, row, argument, record, &logged);
-  const std::size_t size = row == nullptr ? 0 : row->size;
+  // A record that never came in has no fields to show.
+  const std::size_t size = logged.argument.empty() ? 0 : row->size;
   board_.log.add(std::move(logged), result, board_.clock.now(), row, std::span(record).first(size));
   return result;
 }

@@ -15,46 +15,45 @@ class DeviceNode;
 /// The names of a record's fields, for people, and how wide each is.
 struct RecordFields {
   const char *names;
-  std::size_t width;
-  bool hexadecimal;
+  std::size_t width = sizeof(u32);
+  bool hexadecimal = false;
 };
 template <typename Record>
-inline constexpr RecordFields kRecordFields{"", 4, false};
+inline constexpr RecordFields kRecordFields{""};
 template <>
-inline constexpr RecordFields kRecordFields<u32>{"value", 4, false};
+inline constexpr RecordFields kRecordFields<u32>{"value"};
 template <>
-inline constexpr RecordFields kRecordFields<driver::ChannelValue>{"channel value", 4, false};
+inline constexpr RecordFields kRecordFields<driver::ChannelValue>{"channel value"};
 template <>
-inline constexpr RecordFields kRecordFields<driver::Interval>{"channel code drop", 4, false};
+inline constexpr RecordFields kRecordFields<driver::Interval>{"channel code drop"};
 template <>
-inline constexpr RecordFields kRecordFields<driver::Cbr>{"channel value enable", 4, false};
+inline constexpr RecordFields kRecordFields<driver::Cbr>{"channel value enable"};
 template <>
-inline constexpr RecordFields kRecordFields<driver::QpRange>{"channel max min enable", 4, false};
+inline constexpr RecordFields kRecordFields<driver::QpRange>{"channel max min enable"};
 template <>
-inline constexpr RecordFields kRecordFields<driver::Register>{"address value", 4, true};
+inline constexpr RecordFields kRecordFields<driver::Register>{"address value", sizeof(u32), true};
 template <>
-inline constexpr RecordFields kRecordFields<driver::Zoom>{"level x y", 4, false};
+inline constexpr RecordFields kRecordFields<driver::Zoom>{"level x y"};
 template <>
 inline constexpr RecordFields kRecordFields<driver::Grid>{
-    "column column column column column row row row row row cells", 4, false};
+    "column column column column column row row row row row cells"};
 template <>
-inline constexpr RecordFields kRecordFields<driver::FrameRect>{"number x_start y_start x_end y_end enable", 4,
-                                                               false};
+inline constexpr RecordFields kRecordFields<driver::FrameRect>{"number x_start y_start x_end y_end enable"};
 template <>
-inline constexpr RecordFields kRecordFields<driver::Mask>{"channel x_start x_end y_start y_end", 4, false};
+inline constexpr RecordFields kRecordFields<driver::Mask>{"channel x_start x_end y_start y_end"};
 template <>
-inline constexpr RecordFields kRecordFields<driver::MotionMap>{"channel column row columns rows", 4, false};
+inline constexpr RecordFields kRecordFields<driver::MotionMap>{"channel column row columns rows"};
 template <>
-inline constexpr RecordFields kRecordFields<driver::DecoderRegister>{"chip address value", 1, true};
+inline constexpr RecordFields kRecordFields<driver::DecoderRegister>{"chip address value", sizeof(u8), true};
 template <>
-inline constexpr RecordFields kRecordFields<driver::BoardCommand>{"command reply", 4, true};
+inline constexpr RecordFields kRecordFields<driver::BoardCommand>{"command reply", sizeof(u32), true};
 template <>
 inline constexpr RecordFields kRecordFields<driver::MotionLevels>{
-    "level level level level level level level level level level level level level level level level", 2,
-    false};
+    "level level level level level level level level level level level level level level level level",
+    sizeof(u16)};
 template <>
 inline constexpr RecordFields kRecordFields<ZV_DISPLAY_WINDOW>{
-    "index channel scale x_start y_start x_end y_end flags", 4, false};
+    "index channel scale x_start y_start x_end y_end flags"};
 
 /// A command that a node has. The node copies the record in, checks the first word if it is a channel, calls
 /// the handler with the board locked, and copies the record back if the command answers.
@@ -85,7 +84,6 @@ class DeviceNode {
   long execute(const CommandRow &row, void *record);
 
  protected:
-  virtual std::span<const CommandRow> commands() const { return {}; }
   /// Appends to the log the data that a record points to.
   virtual void log_pointed_to(u32, const void *, std::vector<u8> &) const {}
 

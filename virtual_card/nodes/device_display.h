@@ -38,9 +38,6 @@ class DisplayDevice : public DeviceNode {
 
   static std::span<const CommandRow> table();
 
- protected:
-  std::span<const CommandRow> commands() const override { return table(); }
-
  private:
   /// Applies the faults of the preview to what a read tells. Returns false when the read finds no picture.
   bool pass_faults(u32 &index, long &result);

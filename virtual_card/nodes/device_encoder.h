@@ -37,9 +37,6 @@ class EncoderDevice : public DeviceNode {
 
   static std::span<const CommandRow> table();
 
- protected:
-  std::span<const CommandRow> commands() const override { return table(); }
-
  private:
   EncoderSettings &settings(u32 channel) { return board_.settings.state.channel[channel].encoder; }
 };

@@ -29,7 +29,6 @@ class VideoInputDevice : public DeviceNode {
   static std::span<const CommandRow> table();
 
  protected:
-  std::span<const CommandRow> commands() const override { return table(); }
   void log_pointed_to(u32 code, const void *record, std::vector<u8> &log) const override;
 };
 

@@ -39,7 +39,7 @@ std::optional<Period> take_period(std::string_view &text, nanoseconds now) {
     const auto length = seconds_in(take_word(text), kShortest);
     if (!every || !has_for || !length || *length >= *every) return {};
     period.every = *every;
-    period.to = *length;
+    period.length = *length;
     return period;
   }
   const auto [from_text, to_text] = split(first, '-');
@@ -58,14 +58,14 @@ std::optional<Period> take_period(std::string_view &text, nanoseconds now) {
 bool Period::contains(nanoseconds time) const {
   if (time < from) return false;
   if (every == nanoseconds{0}) return time < to;
-  return time - from >= every && (time - from) % every < to;
+  return time - from >= every && (time - from) % every < length;
 }
 
 nanoseconds Period::next_change(nanoseconds time) const {
   if (time < from) return from;
   if (every == nanoseconds{0}) return time < to ? to : nanoseconds::max();
   const nanoseconds round = from + (time - from) / every * every;
-  return time < round + to && time - from >= every ? round + to : round + every;
+  return contains(time) ? round + length : round + every;
 }
 
 std::string Script::add(std::string_view line, nanoseconds now, PowerUp *power_up) {

@@ -13,8 +13,8 @@ namespace virtual_card {
 struct Period {
   std::chrono::nanoseconds from{0};
   std::chrono::nanoseconds to = std::chrono::nanoseconds::max();
-  std::chrono::nanoseconds every{0};  ///< above 0: counts from each multiple of this after `from`, until `to`
-                                      ///< after it
+  std::chrono::nanoseconds every{0};   ///< above 0: counts from each multiple of this after `from`
+  std::chrono::nanoseconds length{0};  ///< how long it counts each time
 
   bool contains(std::chrono::nanoseconds time) const;
   /// Returns the first moment after `time` at which contains() can change, or nanoseconds::max().
@@ -26,14 +26,14 @@ class Script {
  public:
   /// Adds a line of items, separated by ';'. An item can stand behind a time, counted from `now`:
   /// "@5-8 lost=3", "@12 lost=3", "@every 10 for 0.5 stall=mpeg4". The line replaces what earlier lines said
-  /// of the same names; "lost=" only undoes it, and "reset" undoes everything. Returns an empty text, or what
-  /// is wrong; then nothing has changed. Items that count at power-up only need `power_up`.
+  /// of the same names; "lost=" only undoes it, and "reset" undoes all items but those of power-up.
+  /// Returns an empty text, or what is wrong; then nothing has changed. Items that count at power-up only
+  /// need `power_up`.
   std::string add(std::string_view line, std::chrono::nanoseconds now, PowerUp *power_up);
 
   Conditions conditions(std::chrono::nanoseconds now) const;
   /// Returns the first moment after `now` at which the conditions can change, or nanoseconds::max().
   std::chrono::nanoseconds next_change(std::chrono::nanoseconds now) const;
-  void clear() { entries_.clear(); }
 
  private:
   struct Entry {
