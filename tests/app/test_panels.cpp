@@ -26,14 +26,21 @@ TEST_F(Panels, WhatIsTypedReachesTheSdkOrIsRefused) {
     for (QLineEdit *edit : edits) edit->setText(text);
     const std::string number = std::to_string(value) + "\n", edge = number + "channel 4 : ";
     const int channel = static_cast<int>(static_cast<unsigned>(value) - 1u);
+    std::string area = "Mark : 1\nchannel 4 : Left= ";
+    area.append(edge)
+        .append("Right= ")
+        .append(edge)
+        .append("Top= ")
+        .append(edge)
+        .append("Bottom= ")
+        .append(number);
     const std::pair<QPushButton *, std::string> rows[] = {
         {dialog->btnSetSensitivity,
          "Channel 0 :Set Sensitivity = " + number + error(value < 0, "SetMotionSensitivity")},
         {dialog->btnSetFocus, "Set Focus channel = " + std::to_string(channel) + "\n" +
                                   error(channel < 0 || channel > 15, "SetFocusChannel")},
         {dialog->btnSetShield, error(value < 0, "SetShieldRect")},
-        {dialog->btnSetMotionArea, "Mark : 1\nchannel 4 : Left= " + edge + "Right= " + edge + "Top= " + edge +
-                                       "Bottom= " + number + error(value < 0, "MarkMotionArea")}};
+        {dialog->btnSetMotionArea, area + error(value < 0, "MarkMotionArea")}};
     for (const auto &[button, printed] : rows)
       EXPECT_EQ(printed_by([press = button] { press->click(); }), printed);
     for (const QLineEdit *edit : edits) EXPECT_EQ(edit->text(), text);

@@ -7,7 +7,6 @@ namespace {
 
 using Recording = RecordingTest;
 using testing::ElementsAre;
-using testing::HasSubstr;
 enum { kNone, kCif, kHalfD1, kD1 };
 
 constexpr char kNoSpace[] = "No enough disk space\n";

@@ -20,7 +20,8 @@ TEST_F(NodeTest, EachNodeTakesItsOwnCommandsAndRefusesBadRecords) {
   for (const auto &node : nodes) {
     int commands = 0, refused = 0;
     for (u32 number = 0; number < 4 * 64 * 256 * 4; ++number) {
-      const u32 direction = number >> 16, size = number >> 10 & 0x3F, letter = "edva"[number >> 8 & 3];
+      constexpr u32 kLetters[] = {'e', 'd', 'v', 'a'};
+      const u32 direction = number >> 16, size = number >> 10 & 0x3F, letter = kLetters[number >> 8 & 3];
       const u32 code = direction << 30 | size << 16 | letter << 8 | (number & 0xFF);
       u32 record[16] = {ZV_CHANNELS};
       const long result = answer(ioctl(node.fd, code, record));

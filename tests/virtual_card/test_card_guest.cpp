@@ -111,7 +111,7 @@ TEST_F(NodeTest, ANumberThatWasReplacedOrClosedIsNoLongerTheCards) {
   close(replaced);
 
   const int closed = fcntl(encoder, F_DUPFD, 500);
-  ASSERT_EQ(close_range(closed, closed, 0), 0);
+  ASSERT_EQ(close_range(static_cast<unsigned>(closed), static_cast<unsigned>(closed), 0), 0);
   ASSERT_EQ(fcntl(file, F_DUPFD, 500), closed);
   EXPECT_EQ(content(closed), kContent);
   closefrom(500);

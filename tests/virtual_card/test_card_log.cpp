@@ -22,6 +22,7 @@ TEST_F(NodeTest, TheLogTellsEveryCallWithItsRecord) {
 
   const auto log = card::log();
   std::vector<std::pair<Operation, Device>> calls;
+  calls.reserve(log.size());
   for (const card::Call &call : log) calls.emplace_back(call.operation, call.device);
   ASSERT_THAT(
       calls,
