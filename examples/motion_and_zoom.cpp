@@ -12,8 +12,8 @@
 #include <fstream>
 #include <thread>
 
-#include "card.h"
-#include "command_line.h"
+#include "programs/common/card.h"
+#include "programs/common/command_line.h"
 #include "zv_display.h"
 
 namespace {

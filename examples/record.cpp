@@ -18,8 +18,9 @@
 #include <span>
 #include <thread>
 
-#include "card.h"
-#include "command_line.h"
+#include "programs/common/card.h"
+#include "programs/common/command_line.h"
+#include "programs/common/stop_signal.h"
 #include "record_options.h"
 #include "record_stream.h"
 #include "record_watch.h"
@@ -28,7 +29,6 @@ namespace {
 
 std::array<Stream, ZV_CHANNELS + ZV_AUDIO_CHANNELS> streams;  // the audio inputs follow the video channels
 std::atomic<int> write_error{0};                              // errno of a write that failed on an SDK thread
-std::atomic<bool> stopping{false};                            // a signal has come, or the time is over
 
 // --- Callbacks: the SDK calls them on its own threads
 
@@ -117,24 +117,6 @@ void configure(HANDLE card, const RecordOptions &options) {
   check(zv_StartMotionDetection(card), "zv_StartMotionDetection");
 }
 
-void on_signal(int) {
-  stopping = true;
-}
-
-/// After this call a SIGHUP, SIGINT or SIGTERM ends the recording; the same signal again ends the program, in
-/// case the card hangs. Before this call, while the card is being opened, the first signal ends the program.
-/// A signal that the caller ignores, as nohup does, stays ignored.
-void catch_signals() {
-  struct sigaction action {};
-  action.sa_handler = on_signal;
-  action.sa_flags = SA_RESTART | static_cast<int>(SA_RESETHAND);
-  for (const int number : {SIGHUP, SIGINT, SIGTERM}) {
-    struct sigaction before {};
-    sigaction(number, nullptr, &before);
-    if (before.sa_handler != SIG_IGN) sigaction(number, &action, nullptr);
-  }
-}
-
 /// Waits until the time is over, a signal has come or a write has failed.
 void wait_for_end(Clock::time_point start, unsigned seconds) {
   Watch watch(streams, start);
@@ -176,7 +158,7 @@ int record(const RecordOptions &options) {
   const bool mpeg4 = options.codec == VIDEO_CODEC_ZV_MPEG4;
   check(zv_RegisterCallBack(card.handle, mpeg4 ? on_video : nullptr, mpeg4 ? nullptr : on_video, on_audio),
         "zv_RegisterCallBack");
-  catch_signals();
+  catch_stop_signals();
   const auto start = Clock::now();
   for (Stream &stream : streams) stream.begin(start);
   check(zv_Start(card.handle), "zv_Start");

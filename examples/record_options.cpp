@@ -4,12 +4,10 @@
 #include <unistd.h>
 
 #include <bit>
-#include <charconv>
-#include <map>
 #include <optional>
 #include <string>
 
-#include "command_line.h"
+#include "programs/common/command_line.h"
 
 namespace {
 
@@ -30,54 +28,6 @@ constexpr char kHelp[] =
     "  -h, --help          this text\n"
     "  --version           the version\n\n"
     "Status: 0 all frames came; 1 failed; 2 wrong option; 3 done, but more than 1 % of a stream is missing\n";
-
-const std::map<std::string, ZV_SCALE_VALUE> kScales = {
-    {"cif", SCALE_ZV_CIF}, {"half-d1", SCALE_ZV_HALF_D1}, {"d1", SCALE_ZV_D1}};
-const std::map<std::string, ZV_VIDEO_CODEC> kCodecs = {{"mpeg4", VIDEO_CODEC_ZV_MPEG4},
-                                                       {"mjpeg", VIDEO_CODEC_ZV_MJPEG}};
-const std::map<std::string, ZV_VIDEO_STANDARD> kStandards = {{"ntsc", VIDEO_STANDARD_ZV_NTSC},
-                                                             {"pal", VIDEO_STANDARD_ZV_PAL}};
-/// By picture size: the mask of the first channels, as many as the frame-rate budget allows at the full rate.
-const std::map<ZV_SCALE_VALUE, u32> kBudget = {
-    {SCALE_ZV_CIF, 0xFFFF}, {SCALE_ZV_HALF_D1, 0xFF}, {SCALE_ZV_D1, 0xF}};
-
-unsigned parse_number(const std::string &option, const std::string &text, unsigned lowest, unsigned highest) {
-  unsigned number = 0;
-  const char *const text_end = text.data() + text.size();
-  const auto [end, error] = std::from_chars(text.data(), text_end, number);
-  if (error != std::errc{} || end != text_end || number < lowest || number > highest) {
-    throw UsageError(option + ": '" + text + "' is not a number from " + std::to_string(lowest) + " to " +
-                     std::to_string(highest));
-  }
-  return number;
-}
-
-/// Converts a list such as "1,3,5-8" to a mask with bit 0 for number 1.
-u32 parse_list(const std::string &option, const std::string &text, unsigned highest) {
-  u32 mask = 0;
-  for (std::size_t at = 0, comma = 0; comma != std::string::npos; at = comma + 1) {
-    comma = text.find(',', at);
-    const std::string item = text.substr(at, comma == std::string::npos ? comma : comma - at);
-    const std::size_t dash = item.find('-');
-    const unsigned first = parse_number(option, item.substr(0, dash), 1, highest);
-    const unsigned last =
-        dash == std::string::npos ? first : parse_number(option, item.substr(dash + 1), 1, highest);
-    if (last < first) {
-      throw UsageError(std::string(option).append(": the range '").append(item).append("' runs backwards"));
-    }
-    for (unsigned number = first; number <= last; ++number) mask |= 1u << (number - 1);
-  }
-  return mask;
-}
-
-template <typename Value>
-Value parse_name(const std::string &option, const std::string &text,
-                 const std::map<std::string, Value> &values) {
-  if (const auto found = values.find(text); found != values.end()) return found->second;
-  std::string possible;
-  for (const auto &[name, value] : values) possible.append(possible.empty() ? "" : ", ").append(name);
-  throw UsageError(option + ": '" + text + "' is unknown; possible are " + possible);
-}
 
 const option kOptions[] = {{"seconds", required_argument, nullptr, 's'},
                            {"channels", required_argument, nullptr, 'c'},
@@ -111,13 +61,13 @@ RecordOptions parse_options(int argc, char **argv) {
         options.channels = parse_list("--channels", text, ZV_CHANNELS);
         break;
       case 'v':
-        options.codec = parse_name("--codec", text, kCodecs);
+        options.codec = parse_name("--codec", text, codec_names);
         break;
       case 'z':
-        options.scale = parse_name("--scale", text, kScales);
+        options.scale = parse_name("--scale", text, scale_names);
         break;
       case 't':
-        options.standard = parse_name("--standard", text, kStandards);
+        options.standard = parse_name("--standard", text, standard_names);
         break;
       case 'a':
         audio = text == "none" ? 0 : parse_list("--audio", text, ZV_AUDIO_CHANNELS);
@@ -134,7 +84,7 @@ RecordOptions parse_options(int argc, char **argv) {
   if (options.output.empty()) throw UsageError("--output: the name of the folder is empty");
   options.to_stdout = options.output == "-";
   options.audio = audio.value_or(options.to_stdout ? 0 : (1u << ZV_AUDIO_CHANNELS) - 1);
-  if (options.channels == 0) options.channels = kBudget.at(options.scale);
+  if (options.channels == 0) options.channels = channels_within_budget(options.scale);
   if (options.to_stdout) check_single_stream(options);
   return options;
 }

@@ -1,6 +1,4 @@
 // zarvo_card: changes, breaks and watches the virtual card of a running program.
-#include <getopt.h>
-
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
@@ -12,6 +10,7 @@
 
 #include "client.h"
 #include "png_file.h"
+#include "programs/common/command_line.h"
 #include "virtual_card.h"
 
 namespace {
@@ -33,13 +32,13 @@ started with the option control=SOCKET in ZARVO_VIRTUAL_CARD.
   log                       every call on a device node as it comes
   snapshot CHANNEL FILE     writes what a camera shows to FILE (.png or .ppm)
 
-  -s, --socket PATH         the card's socket; without it $ZARVO_CARD_SOCKET
-  -l, --list                lists the items: usage, values, what the host sees
-  -j, --json                state and counters as JSON
-  -o, --only NODE           log: only encoder, display, audio or video_input
-  -n, --no-reads            log: without reads and the request and release of each frame
+  --socket PATH             the card's socket; without it $ZARVO_CARD_SOCKET
+  --list                    lists the items: usage, values, what the host sees
+  --json                    state and counters as JSON
+  --only NODE               log: only encoder, display, audio or video_input
+  --no-reads                log: without reads and the request and release of each frame
   -h, --help                shows this text
-  -V, --version             shows the version
+  --version                 shows the version
 
 Exit status: 0 done, 1 the card refused it or cannot be reached, 2 wrong use.
 )";
@@ -130,15 +129,14 @@ int apply_items(const Options &options) {
 
 }  // namespace
 
-int main(int count, char **arguments) {
+int main(int count, char **arguments) try {
   constexpr option kOptions[] = {
       {"socket", required_argument, nullptr, 's'}, {"list", no_argument, nullptr, 'l'},
       {"json", no_argument, nullptr, 'j'},         {"only", required_argument, nullptr, 'o'},
-      {"no-reads", no_argument, nullptr, 'n'},     {"help", no_argument, nullptr, 'h'},
-      {"version", no_argument, nullptr, 'V'},      {}};
+      {"no-reads", no_argument, nullptr, 'n'},     COMMON_OPTIONS};
   Options options;
   if (const char *socket = std::getenv("ZARVO_CARD_SOCKET")) options.socket = socket;
-  for (int letter; (letter = getopt_long(count, arguments, "s:ljo:nhV", kOptions, nullptr)) >= 0;) {
+  for (int letter; (letter = next_option(count, arguments, kOptions, kUsage, &options.words)) >= 0;) {
     switch (letter) {
       case 's':
         options.socket = optarg;
@@ -152,20 +150,10 @@ int main(int count, char **arguments) {
       case 'n':
         options.log += " no-reads";
         break;
-      case 'l':
-        return list_items();
-      case 'h':
-        std::fputs(kUsage, stdout);
-        return 0;
-      case 'V':
-        std::puts("zarvo_card " ZARVO_VERSION);
-        return 0;
       default:
-        std::fputs(kUsage, stderr);
-        return kWrongUse;
+        return list_items();
     }
   }
-  options.words.assign(arguments + optind, arguments + count);
   if (options.words.empty()) return wrong_use("no item given");
   if (options.socket.empty()) return wrong_use("no socket given: use --socket or ZARVO_CARD_SOCKET");
   const std::string &word = options.words[0];
@@ -173,4 +161,6 @@ int main(int count, char **arguments) {
   if (word != "state" && word != "counters" && word != "log") return apply_items(options);
   if (options.words.size() > 1) return wrong_use("\"" + word + "\" takes nothing behind it");
   return word == "log" ? follow_log(options) : show_report(options);
+} catch (const UsageError &error) {
+  return wrong_use(error.what());
 }

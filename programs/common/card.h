@@ -1,6 +1,7 @@
 /**
  * @file card.h
- * Helpers for all examples: an open card that closes itself, and exceptions for failed SDK calls.
+ * Helpers for all programs and examples: an open card that closes itself, and exceptions for failed SDK
+ * calls.
  */
 #ifndef CARD_H
 #define CARD_H
