@@ -65,8 +65,8 @@ void choose(std::span<Stream> channels, u32 mask, const StreamKind &kind, const 
   }
 }
 
-/// Creates all files, or none if one is there and must not be overwritten. A symbolic link never is: the file
-/// that it leads to may be anything.
+/// Creates all files, or none if one is there and must not be overwritten. Never overwrites through a
+/// symbolic link: it may lead to any file.
 void create_files(const RecordOptions &options) {
   std::filesystem::create_directories(options.output);
   for (const Stream &stream : streams) {

@@ -48,7 +48,8 @@ class Stream {
   /// Returns the time since the last frame, or since begin() if there is none.
   Clock::duration silence(Clock::time_point now) const { return now - last_.load(); }
 
-  /// Returns how many frames are due `seconds` after the begin, and how many of them have not come.
+  /// expected() returns how many frames are due `seconds` after begin(), missing() how many of them have not
+  /// come.
   std::uint64_t expected(double seconds) const;
   std::uint64_t missing(double seconds) const;
   /// Returns whether more than 1 % is missing. Two missing frames never count: the

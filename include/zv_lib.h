@@ -7,11 +7,10 @@
  * recording zv_SetVideoEncodeConfig() for each channel, zv_EnableVideoRecordChannels(),
  * zv_EnableAudioChannels(), zv_Start(), zv_Stop(); at the end zv_Close().
  *
- * A process has one card open at a time. A function that returns an int returns ZV_OK or one of the
- * statuses that its comment lists; when it fails, it changes nothing unless its comment says otherwise. A
- * function that returns a status returns ZV_ERR_PARAM for a bad handle (null, closed, or not from
- * zv_Open()), unless its comment says otherwise, and for a null record pointer. Bit n of a channel mask
- * is channel n.
+ * A process has one card open at a time. A function that returns an int returns ZV_OK or one of the statuses
+ * that its comment lists; when it fails, it changes nothing unless its comment says otherwise. A function
+ * that returns a status returns ZV_ERR_PARAM for a null record pointer and, unless its comment says
+ * otherwise, for a bad handle (null, closed, or not from zv_Open()). Bit n of a channel mask is channel n.
  *
  * The "Context" of a function names the threads that may call it, the states it is allowed in, and
  * whether it blocks. docs/threading.md explains the words that it uses (control thread, any thread,

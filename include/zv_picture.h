@@ -74,8 +74,8 @@ int zv_SetPreviewMode(HANDLE handle, u32 mode);
 u32 zv_GetFocusChannel(HANDLE handle);
 
 /**
- * Swaps a channel with the channel in the first display position. The routing changes at once, the
- * window records with the next zv_SetPreviewMode(): the preview shows the swap by then at the latest.
+ * Swaps a channel with the channel in the first display position. The routing changes at once. The card gets
+ * the new window records with the next zv_SetPreviewMode(); the preview shows the swap no later than then.
  *
  * @param handle   the open card
  * @param channel  0-15

@@ -2,8 +2,8 @@
  * @file zv_type.h
  * Types, enumerations, records and status codes of the Zarvo Capture SDK.
  *
- * The header compiles on its own as C11 and as C++20. Every enumerator has an explicit value: lists of
- * items, stored settings and the card itself rely on the numbers.
+ * The header compiles on its own as C11 and as C++20. Every enumerator has an explicit value: combo boxes,
+ * stored settings and the card depend on the numbers.
  */
 #ifndef ZV_TYPE_H
 #define ZV_TYPE_H

@@ -23,7 +23,7 @@ struct RECORD_FILE_HEADER {
 };
 
 static_assert(sizeof(RECORD_FILE_HEADER) == 32 && offsetof(RECORD_FILE_HEADER, channel_label) == 16);
-static_assert(std::endian::native == std::endian::little, "the header goes to the file as it stands");
+static_assert(std::endian::native == std::endian::little, "the header is written without byte swapping");
 
 namespace recording {
 

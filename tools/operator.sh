@@ -120,7 +120,8 @@ close_program() {
 }
 process_gone() { ! kill -0 "$1"; }
 
-# rate_near RATE: whether the caption shows that rate, plus or minus 2. The first second of a layout may be short.
+# rate_near RATE: whether the caption shows that rate, plus or minus 2. The first rate after a change of the
+# layout may be too low.
 rate_near() { local rate; rate=$(preview_rate) && [ "$rate" -ge $(($1 - 2)) ] && [ "$rate" -le $(($1 + 2)) ]; }
 
 # files_closed: whether the program has closed all its recordings.

@@ -11,7 +11,7 @@
 
 namespace {
 
-// A click beside the short text of a radio button or check box that is wider than its text would miss.
+// A click in the middle of a radio button or check box misses it when the widget is wider than its text.
 QPoint clickable_point(const QWidget &widget) {
   const bool box = widget.inherits("QRadioButton") || widget.inherits("QCheckBox");
   return box ? QPoint(9, widget.height() / 2) : widget.rect().center();

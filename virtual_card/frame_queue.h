@@ -53,7 +53,7 @@ class FrameQueue {
   void lost_after_all();
   /// Limits the number of frames as well; none: only `capacity` counts.
   void limit_frames(std::optional<std::int64_t> frames);
-  /// Counts frames as lost that the card could not make, or not in time.
+  /// Counts as lost the frames that the card did not make, or did not make in time.
   void missed(std::uint64_t frames);
   void reset_counters();
   StreamCounters counters() const;

@@ -93,7 +93,7 @@ void queue_mpeg4(ReadyFrame frame);
 void queue_mjpeg(ReadyFrame frame);
 /// Appends audio data, normally four blocks of 48 bytes. The read delivers at most 192 bytes.
 void queue_audio(ReadyFrame blocks);
-/// The next preview read stores `index` and returns `result`. Several calls apply to several reads.
+/// The next preview read stores `index` and returns `result`. Call it n times to set the next n reads.
 void queue_preview(std::uint32_t index, long result);
 
 /// Ready-made frames that replace the card's encoders. From ENC_IOC_START each list is delivered again and

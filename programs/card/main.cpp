@@ -33,7 +33,7 @@ started with the option control=SOCKET in ZARVO_VIRTUAL_CARD.
   snapshot CHANNEL FILE     writes what a camera shows to FILE (.png or .ppm)
 
   --socket PATH             the card's socket; without it $ZARVO_CARD_SOCKET
-  --list                    lists the items: usage, values, what the host sees
+  --list                    lists the items: usage, values, effect on the program
   --json                    state and counters as JSON
   --only NODE               log: only encoder, display, audio or video_input
   --no-reads                log: without reads and the request and release of each frame
@@ -159,7 +159,7 @@ int main(int count, char **arguments) try {
   const std::string &word = options.words[0];
   if (word == "snapshot") return save_snapshot(options);
   if (word != "state" && word != "counters" && word != "log") return apply_items(options);
-  if (options.words.size() > 1) return wrong_use("\"" + word + "\" takes nothing behind it");
+  if (options.words.size() > 1) return wrong_use("\"" + word + "\" takes no arguments");
   return word == "log" ? follow_log(options) : show_report(options);
 } catch (const UsageError &error) {
   return wrong_use(error.what());

@@ -34,7 +34,7 @@ refused 2 'requires an argument' --scale
 refused 1 'frame-rate budget' --scale d1 --channels 1-5
 refused 1 '/dev/null/x' --output /dev/null/x
 
-# A file that is there stays as it is, and so does what a link in the place of a file leads to.
+# The recorder changes neither an existing file nor the target of a link that has the name of a file.
 mkdir "$FOLDER/kept"
 echo precious | tee "$FOLDER/precious" >"$FOLDER/kept/audio1.g726"
 refused 1 'exists; --force overwrites it' --output kept

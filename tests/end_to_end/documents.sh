@@ -1,13 +1,13 @@
 #!/usr/bin/env bash
-# Runs the command lines of all documents as a reader would: the lines of the blocks marked "sh", in order, with the
-# plain shell, in a tree that only shares its build of the SDK with the run before. Lines whose comment begins with
-# "needs" are left out.
+# Runs the command lines of all documents as a reader would: the lines of the blocks marked "sh", in order,
+# with the plain shell, in a new tree that keeps only the built SDK of the run before. Lines whose comment
+# begins with "needs" are left out.
 . "$(dirname "$0")/common.sh"
 
 # commands DOCUMENT
 commands() { awk '/^ *```sh$/ { inside = 1; next } /^ *```$/ { inside = 0 } inside && !/# needs /' "$1"; }
 
-# Where nobody runs it, a line becomes wrong unseen.
+# A line outside of a block marked sh is never tried.
 unmarked=$(cd "$ZARVO_ROOT" && grep -nE '^    +(\./|bench/|cmake|ctest|cc |make|sudo |LD_PRELOAD=|ZARVO_|ff(mpeg|play|probe) |tail )' \
   README.md CONTRIBUTING.md docs/*.md || true)
 expect "command lines outside of a block marked sh: $unmarked" test -z "$unmarked"

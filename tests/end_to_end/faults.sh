@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
-# Breaks the card in every way it knows while a program records, and mends it again. Catches: a program that
-# hangs, crashes, stays broken after the fault, or does not tell what is missing.
-#   faults.sh record    zarvo_record: a run of its own for each fault, second 2 to 4 of 6
+# Applies every fault of the card while a program records, then undoes it. Catches: a program that hangs,
+# crashes, stays broken after the fault, or does not tell what is missing.
+#   faults.sh record    zarvo_record: a run of 6 seconds for each fault, which is in effect from second 2 to 4
 #   faults.sh dialog    the demo application: one session with preview and recording through all faults
 . "$(dirname "$0")/common.sh"
 

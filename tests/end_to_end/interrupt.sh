@@ -2,7 +2,8 @@
 # SIGHUP, SIGINT and SIGTERM end a recording early, with complete files.
 . "$(dirname "$0")/common.sh"
 
-# A background job of a script ignores SIGINT, and all of nohup's ignore SIGHUP; env restores the default.
+# A background job of a script ignores SIGINT, and a program under nohup ignores SIGHUP; env restores the
+# default.
 RECORD=(env --default-signal=INT --default-signal=HUP "${ON_CARD[@]}" "$ZARVO_RECORD")
 
 for signal in HUP INT TERM; do

@@ -38,7 +38,7 @@ for file in "$FOLDER"/out/audio*.g726; do
   expect "$file has $(stat -c %s "$file") bytes instead of about 15000" test "$(stat -c %s "$file")" -ge 14400
 done
 
-# Catches: interlaced pictures without the interlaced flag, which players show with combs on movement.
+# Catches: interlaced pictures without the interlaced flag: players show combs where something moves.
 if [ "$1" = d1 ]; then
   expect "D1 is not marked as interlaced" grep -q 'interlaced_frame=1' \
     <(ffprobe -v error -f m4v -show_frames -read_intervals '%+#30' "${videos[0]}")

@@ -20,7 +20,8 @@ expect_end() {
 expect_lines() { expect_equal "lines with '$2' in: $(cat "$FOLDER/$3")" "$1" "$(grep -cE -- "$2" "$FOLDER/$3")"; }
 
 case $1 in
-  # The recorder is stopped for 7 of 12 seconds. Catches: frames that nobody misses, a gap that nobody sees.
+  # The recorder is stopped for 7 of 12 seconds. Catches: missing frames or a gap that the recorder does not
+  # report.
   gap)
     start --seconds 12
     sleep 2

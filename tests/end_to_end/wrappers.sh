@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# The virtual card in front of a wrapper that starts the program, for each wrapper that is installed.
-# Catches: a card that leaves LD_PRELOAD before it is in the program that opens the nodes.
+# The virtual card in front of a wrapper that starts the program, for each wrapper that is installed. Catches:
+# a card that removes itself from LD_PRELOAD before the program that opens the nodes has loaded it.
 . "$(dirname "$0")/common.sh"
 
 export ZARVO_VIRTUAL_CARD=speed=0.1 # slow enough for valgrind

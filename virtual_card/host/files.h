@@ -12,8 +12,8 @@
 
 namespace virtual_card {
 
-/// While an object of this class exists, growing a file beyond the limit (RLIMIT_FSIZE) on this thread only
-/// fails with EFBIG. Otherwise the kernel also raises SIGXFSZ, which ends the host.
+/// While an object of this class exists, a write beyond RLIMIT_FSIZE on this thread fails with EFBIG and
+/// raises no SIGXFSZ, which would end the host.
 class FileLimitFails {
  public:
   FileLimitFails();

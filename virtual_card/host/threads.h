@@ -10,9 +10,9 @@
 
 namespace virtual_card {
 
-/// Starts a thread that blocks all signals except those of its own faults (SIGSEGV and similar) and runs with
-/// normal scheduling even if the caller is a real-time thread. Throws std::system_error when no thread can be
-/// created.
+/// Starts a thread that blocks all signals except those that its own errors raise (SIGSEGV, SIGBUS, SIGFPE,
+/// SIGILL, SIGTRAP) and runs with normal scheduling even if the caller is a real-time thread. Throws
+/// std::system_error when no thread can be created.
 std::thread start_thread(std::function<void()> work);
 
 }  // namespace virtual_card

@@ -11,7 +11,8 @@
 namespace virtual_card {
 namespace {
 
-/// Makes the system call directly: libc's wrapper may be a sanitizer's, which would check the host's address.
+/// Makes the system call directly: a sanitizer may replace libc's wrapper and would then check the host's
+/// address.
 long transfer(long call, void *here, std::uintptr_t there, std::size_t size) {
   iovec local{here, size};
   iovec remote{reinterpret_cast<void *>(there), size};  // NOLINT(performance-no-int-to-ptr)

@@ -82,7 +82,7 @@ struct Board {
   nanoseconds next_change() const { return nanoseconds{next_change_.load(std::memory_order_relaxed)}; }
   /// Updates which cameras have a signal at a field. The caller holds `mutex`.
   void set_signals(std::int64_t field);
-  /// Returns the value at which a register reads. The caller holds `mutex`.
+  /// Returns what a read of the register gives. The caller holds `mutex`.
   u32 read_register(const RegisterFile &registers, u32 address);
 
   std::mutex mutex;  ///< guards `settings`, `conditions`, `preview` and `preview_faults`

@@ -107,7 +107,7 @@ void Card::power_up() {
     reason = load_state(state_file_, nodes_);
     if (!reason.empty()) error = "item \"state\": " + state_file_ + ": " + reason;
   }
-  // The socket of a forked child's parent stays the parent's.
+  // A forked child does not open the control socket: the parent uses it.
   if (!power_up.control_socket.empty() && error.empty() && left_to_parent == nullptr)
     error = control_.start(power_up.control_socket);
   if (!error.empty()) print_message("ZARVO_VIRTUAL_CARD: %s", error.c_str());

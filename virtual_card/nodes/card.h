@@ -28,9 +28,9 @@ struct MapRequest {
 
 class Card {
  public:
-  /// Returns the card; creates it at the first use. It is never destroyed: the host's threads may run longer
-  /// than its destructors. Throws std::system_error with EBUSY when called while the card is being created on
-  /// this thread.
+  /// Returns the card; creates it at the first use. It is never destroyed: threads of the host may still run
+  /// after the destructors of static objects. Throws std::system_error with EBUSY when called while the card
+  /// is being created on this thread.
   static Card &instance();
   /// Call these around fork(). A forked child has none of the card's threads, so it creates a card of its
   /// own.

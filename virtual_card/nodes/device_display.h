@@ -39,7 +39,8 @@ class DisplayDevice : public DeviceNode {
   static std::span<const CommandRow> table();
 
  private:
-  /// Applies the faults of the preview to what a read tells. Returns false when the read finds no picture.
+  /// Applies the preview faults to the index and the result of a read. Returns false when the read finds no
+  /// picture.
   bool pass_faults(u32 &index, long &result);
   /// Returns the layout that layout commands change: the batch between begin and end of an update, else the
   /// layout that is shown.

@@ -13,7 +13,7 @@
 
 namespace virtual_card {
 
-/// What an item does to the conditions while it counts, or to the power-up settings.
+/// How an item changes the conditions while it is in effect, or the power-up settings.
 using Effect = std::function<void(Conditions &, PowerUp &)>;
 
 struct Item {

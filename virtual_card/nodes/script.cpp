@@ -1,4 +1,4 @@
-// Reads lines of items with their times, and tells what counts at a moment.
+// Reads lines of items with their times, and returns the conditions that are in effect at a time.
 #include "script.h"
 
 #include <algorithm>

@@ -1,6 +1,6 @@
 /**
  * @file script.h
- * The items that count now, and those that count later.
+ * The items that are in effect now, and those that take effect later.
  */
 #ifndef VIRTUAL_CARD_SCRIPT_H
 #define VIRTUAL_CARD_SCRIPT_H

@@ -136,7 +136,7 @@ bool Film::advance() {
     if (next_time_ <= shown_time_) next_time_ = shown_time_ + frame_time_;
     return true;
   }
-  // The end of the file: the first frame follows when the last frame has had its time.
+  // The end of the file: the first frame follows after the last frame has been shown for its duration.
   const double end = shown_time_ + frame_time_;
   round_length_ = end - loop_start_;
   loop_start_ = end;

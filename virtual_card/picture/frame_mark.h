@@ -24,7 +24,8 @@ struct FrameMark {
 
 /// Returns the place of the mark in a picture of this size.
 Area frame_mark_area(u32 width, u32 lines);
-/// Paints the luma of the mark into the given lines. The backdrop holds its chroma.
+/// Paints the luma of the mark into the given lines. Does not paint chroma: the backdrop has filled the area
+/// with grey.
 void draw_frame_mark(Picture &picture, const FrameMark &mark, u8 black, u8 white, Lines lines);
 
 /// Reads the mark from a luma plane of any encoded size. Returns none when there is no valid mark.

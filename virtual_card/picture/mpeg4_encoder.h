@@ -1,7 +1,7 @@
 /**
  * @file mpeg4_encoder.h
- * The MPEG-4 encoder of one channel. Its frames have no header of their own: they decode behind the host's
- * header.
+ * The MPEG-4 encoder of one channel. Its frames have no stream header: a decoder needs the header that the
+ * host puts in front of an intra frame.
  */
 #ifndef VIRTUAL_CARD_MPEG4_ENCODER_H
 #define VIRTUAL_CARD_MPEG4_ENCODER_H
