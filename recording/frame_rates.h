@@ -5,6 +5,8 @@
 #ifndef RECORDING_FRAME_RATES_H
 #define RECORDING_FRAME_RATES_H
 
+#include <cstddef>
+#include <optional>
 #include <string>
 
 #include "recording/header.h"
@@ -22,6 +24,15 @@ const char *const *frame_rate_list(ZV_VIDEO_STANDARD standard);
 /// number itself is no label, returns the first label with that whole part, or the number if there is none.
 /// The picture's height tells the standard.
 std::string frame_rate_label(const RECORD_FILE_HEADER &header);
+
+/// Frames a second as a fraction: the labels are rounded.
+struct FrameRate {
+  int numerator;
+  int denominator;
+};
+/// Returns the exact rate behind the label with this index, of one-field pictures; none behind the end of the
+/// list.
+std::optional<FrameRate> exact_frame_rate(ZV_VIDEO_STANDARD standard, std::size_t index);
 
 }  // namespace recording
 

@@ -51,10 +51,11 @@ std::string channel_folder(const std::string &day_folder, unsigned channel) {
   return day_folder + name;
 }
 
-std::string file_name(Kind kind, const std::tm &time) {
+std::string file_name(Kind kind, const std::tm &time, unsigned part) {
   char hour[16];
   std::snprintf(hour, sizeof hour, "-%02d", time.tm_hour);
-  return day_name(time) + hour + row_of(kind).extension;
+  const std::string number = part == 0 ? "" : "." + std::to_string(part);
+  return day_name(time) + hour + number + row_of(kind).extension;
 }
 
 void make_day_folder(const std::string &root, Kind kind, const std::tm &time) {

@@ -24,8 +24,9 @@ std::tm local_time();
 
 std::string day_folder(const std::string &root, Kind kind, const std::tm &time);
 std::string channel_folder(const std::string &day_folder, unsigned channel);
-/// Returns the name of a file, with the extension of its kind, ".rec" or ".aud".
-std::string file_name(Kind kind, const std::tm &time);
+/// Returns the name of a file, with the extension of its kind, ".rec" or ".aud". The further parts of an hour
+/// have their number in front of the extension: "20090303-14.1.rec".
+std::string file_name(Kind kind, const std::tm &time, unsigned part = 0);
 
 /// Creates the folders of a kind and a day, with all channel folders, if they are missing. The root must
 /// exist. Reports no error: if a folder cannot be created, opening a file in it fails.
