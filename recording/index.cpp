@@ -8,7 +8,7 @@
 namespace recording {
 namespace {
 
-using Json = nlohmann::ordered_json;
+using Json = nlohmann::json;
 using Kind = IndexEntry::Kind;
 
 constexpr const char *kEvents[] = {nullptr, "start", "stop", "gap", "buffer", "disk", "standard"};  // by Kind
@@ -46,13 +46,17 @@ std::optional<Kind> kind_of(const Json &line) {
 }  // namespace
 
 std::string to_line(const IndexEntry &entry) {
-  Json line;
-  if (entry.kind == Kind::intra)
-    line["intra"] = true;
-  else
-    line["event"] = kEvents[static_cast<std::size_t>(entry.kind)];
-  for_each_field(entry, [&](const char *key, const auto &value) { line[key] = value; });
-  return line.dump(-1, ' ', false, Json::error_handler_t::replace) + "\n";
+  std::string line = entry.kind == Kind::intra ? "{\"intra\":true" : "{\"event\":\"";
+  if (entry.kind != Kind::intra) line.append(kEvents[static_cast<std::size_t>(entry.kind)]).append("\"");
+  for_each_field(entry, [&line](const char *key, const auto &value) {
+    line.append(",\"").append(key).append("\":");
+    // A Motion-JPEG recording has a line for each frame, so numbers take the short way.
+    if constexpr (std::is_integral_v<std::decay_t<decltype(value)>>)
+      line += std::to_string(value);
+    else
+      line += Json(value).dump(-1, ' ', false, Json::error_handler_t::replace);
+  });
+  return line + "}\n";
 }
 
 std::optional<IndexEntry> parse_line(std::string_view line) try {

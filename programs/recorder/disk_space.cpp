@@ -1,0 +1,79 @@
+// Looks after the space on the disk.
+#include "disk_space.h"
+
+#include <sys/statvfs.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cctype>
+#include <filesystem>
+#include <map>
+#include <vector>
+
+namespace fs = std::filesystem;
+
+namespace recorder {
+namespace {
+
+constexpr std::size_t kHourLength = 11;  // "20261125-14"
+
+/// Returns the hour in the name of a recording or an index, or an empty text for another name.
+std::string hour_in(const std::string &name) {
+  constexpr const char *kExtensions[] = {".rec", ".idx", ".aud"};
+  const auto is_digit = [](char c) { return std::isdigit(static_cast<unsigned char>(c)) != 0; };
+  std::string shape = name.substr(0, kHourLength);
+  std::replace_if(shape.begin(), shape.end(), is_digit, '0');
+  if (shape != "00000000-00") return "";
+  std::string rest = name.substr(kHourLength);
+  if (rest.size() > 2 && rest[0] == '.' && is_digit(rest[1])) {  // the number of a part
+    const auto end = std::find_if_not(rest.begin() + 1, rest.end(), is_digit);
+    rest.erase(rest.begin(), end);
+  }
+  const bool known = std::find(std::begin(kExtensions), std::end(kExtensions), rest) != std::end(kExtensions);
+  return known ? name.substr(0, kHourLength) : "";
+}
+
+/// Returns the entries of a folder; none if it cannot be read.
+std::vector<fs::path> entries_of(const fs::path &folder) {
+  std::vector<fs::path> entries;
+  std::error_code error;
+  for (fs::directory_iterator at(folder, error), end; !error && at != end; at.increment(error))
+    entries.push_back(at->path());
+  return entries;
+}
+
+}  // namespace
+
+std::optional<double> free_percent(const std::string &folder) {
+  struct statvfs disk {};
+  if (statvfs(folder.c_str(), &disk) != 0 || disk.f_blocks == 0) return std::nullopt;
+  return 100.0 * static_cast<double>(disk.f_bavail) / static_cast<double>(disk.f_blocks);
+}
+
+std::string delete_oldest_hour(const std::string &root, const std::set<std::string> &kept) {
+  std::map<std::string, std::vector<fs::path>> hours;
+  for (const char *kind : {"Video", "Audio"})
+    for (const fs::path &day : entries_of(fs::path(root) / kind))
+      for (const fs::path &channel : entries_of(day))
+        for (const fs::path &file : entries_of(channel))
+          if (const std::string hour = hour_in(file.filename()); !hour.empty() && kept.count(hour) == 0)
+            hours[hour].push_back(file);
+  std::error_code ignored;
+  for (const auto &[hour, files] : hours) {
+    bool any = false;
+    std::set<fs::path> days;
+    for (const fs::path &file : files) {
+      any = fs::remove(file, ignored) || any;
+      days.insert(file.parent_path().parent_path());
+    }
+    if (!any) continue;
+    for (const fs::path &day : days) {
+      for (const fs::path &channel : entries_of(day)) rmdir(channel.c_str());
+      rmdir(day.c_str());
+    }
+    return hour;
+  }
+  return "";
+}
+
+}  // namespace recorder

@@ -1,0 +1,50 @@
+/**
+ * @file index_writer.h
+ * Writes the index beside a video file while the file grows.
+ */
+#ifndef RECORDER_INDEX_WRITER_H
+#define RECORDER_INDEX_WRITER_H
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+#include "frame.h"
+#include "recording/index.h"
+
+namespace recorder {
+
+class IndexWriter {
+ public:
+  /// `start` describes the recording.
+  explicit IndexWriter(recording::IndexEntry start) : start_(std::move(start)) {}
+
+  /// Begins the index of a new file with the frame that it begins with. Takes the descriptor over.
+  void begin(int file, std::int64_t time, std::int64_t offset);
+  /// Adds what a frame tells. `offset` is the place of the frame in its file, `lost` how many frames are
+  /// missing in front of it because the buffer was full.
+  void add_frame(const Frame &frame, std::int64_t offset, std::uint32_t lost);
+  /// Without an index the event goes into the next.
+  void add_disk_error(std::int64_t time, std::int64_t offset, const std::string &error);
+  /// Adds the last line, and writes. Returns the descriptor, which is the caller's again.
+  int end(std::int64_t time, std::int64_t offset);
+
+  /// Writes the lines that are not yet in the file. What the disk does not take is written by a later call.
+  void write();
+  /// Returns the descriptor, or -1.
+  int file() const { return file_; }
+
+ private:
+  void add(recording::IndexEntry::Kind kind, std::int64_t time, std::int64_t offset);
+  void add(const recording::IndexEntry &entry);
+
+  recording::IndexEntry start_;
+  int file_ = -1;
+  std::string text_;                          ///< lines that are not yet in the file
+  std::vector<recording::IndexEntry> early_;  ///< events that came while there was no index
+  recording::IndexEntry group_;               ///< the counts since the last intra frame
+};
+
+}  // namespace recorder
+
+#endif

@@ -1,0 +1,52 @@
+/**
+ * @file recorder.h
+ * The whole recorder: card, intake, writer.
+ */
+#ifndef RECORDER_RECORDER_H
+#define RECORDER_RECORDER_H
+
+#include "intake.h"
+#include "messages.h"
+#include "options.h"
+#include "programs/common/card.h"
+#include "writer.h"
+
+namespace recorder {
+
+/// One at a time, because the SDK's callbacks carry no argument.
+class Recorder {
+ public:
+  /// Opens and configures the card. Throws std::runtime_error.
+  explicit Recorder(const Options &options);
+  ~Recorder() { stop(); }
+  Recorder(const Recorder &) = delete;
+  Recorder &operator=(const Recorder &) = delete;
+
+  void start();
+  /// Ends the recording with complete files.
+  void stop();
+
+  const Options &options() const { return options_; }
+  const Intake &intake() const { return intake_; }
+  const Writer &writer() const { return writer_; }
+  Messages &messages() { return messages_; }
+  Clock::time_point start_time() const { return start_; }
+  /// Returns how many frames and audio blocks have come.
+  std::uint64_t frames() const;
+
+ private:
+  const Options options_;
+  Messages messages_;
+  Intake intake_;
+  Writer writer_;
+  Card card_;
+  Clock::time_point start_{};
+};
+
+/// The callbacks, for tests that come between. They pass frames to the recorder that has started.
+void on_video(u32 channel, u8 *data, i32 length, i32 flags);
+void on_audio(u32 input, u8 *data, i32 length, i32 flags);
+
+}  // namespace recorder
+
+#endif

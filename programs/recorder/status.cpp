@@ -1,0 +1,113 @@
+// Watches the streams and tells their state.
+#include "status.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <ctime>
+
+namespace recorder {
+namespace {
+
+constexpr double kMiB = 1 << 20;
+constexpr std::uint64_t kOnTheirWay = 2;  ///< the first and the last frame of a minute
+
+double seconds_of(Clock::duration time) {
+  return std::chrono::duration<double>(time).count();
+}
+
+std::uint64_t short_of(std::uint64_t expected, std::uint64_t frames) {
+  return expected - std::min(expected, frames);
+}
+
+template <typename... Values>
+std::string format(const char *pattern, Values... values) {
+  char text[256];
+  std::snprintf(text, sizeof text, pattern, values...);
+  return text;
+}
+
+std::string wall_time() {
+  const std::time_t now = std::time(nullptr);
+  std::tm local{};
+  localtime_r(&now, &local);
+  char text[32];
+  std::strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &local);
+  return text;
+}
+
+}  // namespace
+
+void Status::look_for_silence(Messages &messages) {
+  constexpr auto kLong = std::chrono::seconds(5);
+  const Clock::time_point now = Clock::now();
+  for (unsigned stream = 0; stream < kStreams; ++stream) {
+    if (!recorder_.intake().records(stream)) continue;
+    const Clock::rep last = recorder_.intake().arrivals(stream).last;
+    const Clock::time_point since =
+        last == 0 ? recorder_.start_time() : Clock::time_point(Clock::duration(last));
+    const bool silent = now - since > std::max<Clock::duration>(kLong, recorder_.intake().gap_limit(stream));
+    if (silent && !silent_[stream])
+      messages.add(stream_name(stream) + format(": nothing has come for %.0f s", seconds_of(now - since)));
+    silent_[stream] = silent;
+  }
+}
+
+void Status::compare_with_expected(Messages &messages) {
+  const Clock::time_point now = Clock::now();
+  for (unsigned stream = 0; stream < kStreams; ++stream) {
+    if (!recorder_.intake().records(stream)) continue;
+    const Minute before = minute_[stream];
+    Minute &at_end = minute_[stream];
+    at_end = {recorder_.intake().arrivals(stream).frames, recorder_.intake().expected(stream, now)};
+    const std::uint64_t expected = at_end.expected - before.expected;
+    const std::uint64_t missing = short_of(expected, at_end.frames - before.frames);
+    if (missing > kOnTheirWay && missing * 100 > expected)
+      messages.add(stream_name(stream) + format(": %ju of %ju were missing in the last minute",
+                                                std::uintmax_t{missing}, std::uintmax_t{expected}));
+  }
+}
+
+std::string Status::line() const {
+  const Intake &intake = recorder_.intake();
+  std::uint64_t frames = 0, bytes = 0, lost = 0, gaps = 0;
+  unsigned streams = 0, silent = 0;
+  for (unsigned stream = 0; stream < kStreams; ++stream) {
+    if (!intake.records(stream)) continue;
+    const Arrivals &arrivals = intake.arrivals(stream);
+    ++streams;
+    silent += silent_[stream] ? 1 : 0;
+    if (is_video(stream)) frames += arrivals.frames;
+    bytes += arrivals.bytes;
+    lost += arrivals.lost + recorder_.writer().dropped(stream);
+    gaps += arrivals.gaps;
+  }
+  const double used =
+      100.0 * static_cast<double>(intake.video().used()) / static_cast<double>(intake.video().capacity());
+  return format(
+      "%s: %u of %u streams, %ju frames, %.0f MiB, %ju lost, %ju gaps, buffer %.0f %%, disk %.1f %% free",
+      wall_time().c_str(), streams - silent, streams, std::uintmax_t{frames},
+      static_cast<double>(bytes) / kMiB, std::uintmax_t{lost}, std::uintmax_t{gaps}, used,
+      recorder_.writer().free_percent());
+}
+
+std::string Status::table() const {
+  const Clock::time_point now = Clock::now();
+  std::string text = format("%-14s %12s %12s %9s %9s %6s %10s %8s %9s %9s\n", "stream", "frames", "expected",
+                            "missing", "lost", "gaps", "longest ms", "kbit/s", "motion", "no signal");
+  for (unsigned stream = 0; stream < kStreams; ++stream) {
+    if (!recorder_.intake().records(stream)) continue;
+    const Arrivals &arrivals = recorder_.intake().arrivals(stream);
+    const std::uintmax_t frames = arrivals.frames, expected = recorder_.intake().expected(stream, now);
+    const std::uintmax_t missing = short_of(expected, frames);
+    const std::uintmax_t lost = arrivals.lost + recorder_.writer().dropped(stream);
+    const double kilobits =
+        static_cast<double>(arrivals.bytes) * 8 / 1000 / seconds_of(now - recorder_.start_time());
+    text += format("%-14s %12ju %12ju %9ju %9ju %6ju %10ju %8.0f %9ju %9ju\n", stream_name(stream).c_str(),
+                   frames, expected, missing > kOnTheirWay ? missing : 0, lost, std::uintmax_t{arrivals.gaps},
+                   std::uintmax_t{arrivals.longest_gap_ms}, kilobits, std::uintmax_t{arrivals.motion},
+                   std::uintmax_t{arrivals.no_signal});
+  }
+  return text;
+}
+
+}  // namespace recorder

@@ -1,0 +1,42 @@
+/**
+ * @file status.h
+ * What the recorder tells about itself while it records.
+ */
+#ifndef RECORDER_STATUS_H
+#define RECORDER_STATUS_H
+
+#include <array>
+#include <string>
+
+#include "recorder.h"
+
+namespace recorder {
+
+class Status {
+ public:
+  explicit Status(const Recorder &recorder) : recorder_(recorder) {}
+
+  /// Call it once a second. Says when a stream brings nothing for some seconds.
+  void look_for_silence(Messages &messages);
+  /// Call it once a minute. Says how many frames a stream is short of in this minute.
+  void compare_with_expected(Messages &messages);
+
+  /// Returns the state in a line.
+  std::string line() const;
+  /// Returns a table of all streams.
+  std::string table() const;
+
+ private:
+  struct Minute {
+    std::uint64_t frames = 0;
+    std::uint64_t expected = 0;
+  };
+
+  const Recorder &recorder_;
+  std::array<bool, kStreams> silent_{};
+  std::array<Minute, kStreams> minute_{};  ///< the counts when the last minute ended
+};
+
+}  // namespace recorder
+
+#endif

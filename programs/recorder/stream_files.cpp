@@ -1,0 +1,265 @@
+// Creates, writes and ends the files of a stream.
+#include "stream_files.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/uio.h>
+#include <unistd.h>
+
+#include <array>
+#include <cerrno>
+#include <cstring>
+#include <span>
+
+#include "recording/frame_rates.h"
+#include "recording/header.h"
+#include "recording/index.h"
+#include "recording/tree.h"
+
+namespace recorder {
+namespace {
+
+using recording::Kind;
+
+Kind kind_of(unsigned stream) {
+  return is_video(stream) ? Kind::video : Kind::audio;
+}
+
+/// Returns the number of a channel or an input, from 0.
+unsigned number_of(unsigned stream) {
+  return is_video(stream) ? stream : stream - ZV_CHANNELS;
+}
+
+const char *rate_label(const Options &options) {
+  return recording::frame_rate_list(options.standard)[options.rate];
+}
+
+recording::IndexEntry start_entry(const Options &options) {
+  recording::IndexEntry start;
+  start.standard = options.standard == VIDEO_STANDARD_ZV_NTSC ? "ntsc" : "pal";
+  start.rate = rate_label(options);
+  for (unsigned input = 0; input < ZV_AUDIO_CHANNELS; ++input)
+    if (options.audio >> input & 1u) start.audio.push_back(input + 1);
+  return start;
+}
+
+/// Writes all pieces. Returns 0 or an errno, and how many bytes were written.
+int write_all(int file, std::span<iovec> pieces, std::size_t &written) {
+  while (!pieces.empty()) {
+    const ssize_t result = writev(file, pieces.data(), static_cast<int>(pieces.size()));
+    if (result < 0 && errno == EINTR) continue;
+    if (result < 0) return errno;
+    auto rest = static_cast<std::size_t>(result);
+    written += rest;
+    while (!pieces.empty() && rest >= pieces.front().iov_len) {
+      rest -= pieces.front().iov_len;
+      pieces = pieces.subspan(1);
+    }
+    if (pieces.empty()) break;
+    pieces.front().iov_base = static_cast<char *>(pieces.front().iov_base) + rest;
+    pieces.front().iov_len -= rest;
+  }
+  return 0;
+}
+
+int create_new(const std::string &path) {
+  return open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_APPEND | O_CLOEXEC, 0666);
+}
+
+bool has_space_error(int error) {
+  return error == ENOSPC || error == EDQUOT;
+}
+
+}  // namespace
+
+Hour hour_of(std::int64_t time) {
+  constexpr std::int64_t kHour = 3600000;
+  Hour hour;
+  const std::time_t seconds = time / 1000;
+  localtime_r(&seconds, &hour.local);
+  hour.begin = (seconds - hour.local.tm_min * 60 - hour.local.tm_sec) * 1000;
+  hour.end = hour.begin + kHour;
+  return hour;
+}
+
+StreamFiles::StreamFiles(const Options &options, unsigned stream)
+    : options_(options), stream_(stream), index_(start_entry(options)) {}
+
+StreamFiles::~StreamFiles() {
+  retire(0);
+  for (const int file : retired_) close(file);
+}
+
+void StreamFiles::queue(const Ring::Taken &taken) {
+  if (needs_intra_ && !taken.frame->intra) {
+    ++dropped_;
+    return;
+  }
+  needs_intra_ = false;
+  queue_.push_back(taken);
+}
+
+int StreamFiles::write() {
+  while (!queue_.empty()) {
+    const Frame &first = *queue_.front().frame;
+    if (!belongs_here(first))
+      if (const int error = change_file(first)) return error;
+    if (const int error = write_batch()) return error;
+  }
+  index_.write();
+  return 0;
+}
+
+bool StreamFiles::belongs_here(const Frame &frame) const {
+  return is_open() && (!frame.intra || (!replace_ && hour_.contains(frame.time)));
+}
+
+int StreamFiles::change_file(const Frame &first) {
+  retire(first.time);
+  hour_ = hour_of(first.time);
+  if (const int error = create_part()) return error;
+  replace_ = false;
+  offset_ = 0;
+  if (!is_video(stream_)) return 0;
+  const auto header = recording::make_header(
+      options_.codec, recording::picture_size(options_.scale, options_.standard, options_.width),
+      rate_label(options_), stream_);
+  offset_ = sizeof header;
+  errno = ENOSPC;
+  const bool whole = ::write(file_, &header, sizeof header) == sizeof header;
+  const int error = whole ? create_index(first.time) : errno;
+  if (error == 0) return 0;
+  unlink(path_.c_str());
+  close(file_);
+  file_ = -1;
+  return error;
+}
+
+/// Creates the first part of the hour that does not exist. Never opens a file that exists.
+int StreamFiles::create_part() {
+  const Kind kind = kind_of(stream_);
+  const std::string folder =
+      recording::channel_folder(recording::day_folder(options_.root, kind, hour_.local), number_of(stream_));
+  bool folders_made = false;
+  for (unsigned part = 0;;) {
+    path_ = folder + "/" + recording::file_name(kind, hour_.local, part);
+    const bool has_index = is_video(stream_) && access(recording::index_path(path_).c_str(), F_OK) == 0;
+    file_ = has_index ? -1 : create_new(path_);
+    if (file_ >= 0) break;
+    if (has_index || errno == EEXIST) {
+      ++part;
+    } else if (errno == ENOENT && !folders_made) {
+      recording::make_day_folder(options_.root, kind, hour_.local);
+      folders_made = true;
+    } else {
+      return errno;
+    }
+  }
+  folder_changed_ = true;
+  return 0;
+}
+
+int StreamFiles::create_index(std::int64_t time) {
+  const int file = create_new(recording::index_path(path_));
+  if (file < 0) return errno;
+  index_.begin(file, time, offset_);
+  return 0;
+}
+
+/// Writes the frames of the open file, as many as a call takes.
+int StreamFiles::write_batch() {
+  std::array<iovec, 256> pieces;
+  std::size_t count = 0;
+  for (const Ring::Taken &taken : queue_) {
+    if (count == pieces.size() || (count > 0 && !belongs_here(*taken.frame))) break;
+    pieces[count++] = {const_cast<u8 *>(taken.frame->data()), taken.frame->length};
+  }
+  std::size_t written = 0;
+  const int error = write_all(file_, std::span(pieces).first(count), written);
+  for (; count > 0 && queue_.front().frame->length <= written; --count) {
+    const Frame &frame = *queue_.front().frame;
+    index_.add_frame(frame, offset_, frame.lost + static_cast<std::uint32_t>(dropped_ - told_));
+    told_ = dropped_;
+    offset_ += frame.length;
+    written -= frame.length;
+    queue_.pop_front();
+  }
+  if (error == 0) return 0;
+  // A part of a frame is in the file. If it cannot be taken off, or the file takes nothing any more, the file
+  // ends.
+  const bool whole = written == 0 || ftruncate(file_, offset_) == 0;
+  if (!whole || !has_space_error(error)) skip_group();
+  return error;
+}
+
+/// Ends the file, and drops what belongs to the group that it ends with: the next file begins with an intra
+/// frame.
+void StreamFiles::skip_group() {
+  retire(queue_.front().frame->time);
+  drop_until(oldest());
+}
+
+void StreamFiles::drop_until(std::uint64_t position) {
+  bool any = file_ < 0;
+  while (!queue_.empty() && (queue_.front().position < position || (any && !queue_.front().frame->intra))) {
+    any = true;
+    ++dropped_;
+    queue_.pop_front();
+  }
+  if (any) needs_intra_ = queue_.empty();
+}
+
+void StreamFiles::note_disk_error(std::int64_t time, int error) {
+  index_.add_disk_error(time, offset_, std::strerror(error));
+}
+
+/// Ends the open file. sync() closes it, so that the writer does not wait for the disk at the change of the
+/// hour.
+void StreamFiles::retire(std::int64_t time) {
+  if (file_ < 0) return;
+  retired_.push_back(file_);
+  file_ = -1;
+  if (const int index = index_.end(time, offset_); index >= 0) retired_.push_back(index);
+}
+
+int StreamFiles::sync() {
+  int error = 0;
+  const auto sync_file = [&error](int file) {
+    if (file >= 0 && fdatasync(file) != 0) error = errno;
+  };
+  for (const int file : retired_) {
+    sync_file(file);
+    close(file);
+  }
+  retired_.clear();
+  sync_file(file_);
+  sync_file(index_.file());
+  if (folder_changed_) sync_folders();
+  folder_changed_ = false;
+  struct stat at_path {
+  }, opened{};
+  const bool vanished = file_ >= 0 && !replace_ && fstat(file_, &opened) == 0 &&
+                        (stat(path_.c_str(), &at_path) != 0 || at_path.st_ino != opened.st_ino ||
+                         at_path.st_dev != opened.st_dev);
+  if (vanished) error = ENOENT;
+  if (error != 0) replace_ = true;
+  return error;
+}
+
+/// Writes the names of new files and folders through to the disk.
+void StreamFiles::sync_folders() const {
+  for (std::string folder = path_; folder.size() > options_.root.size();) {
+    folder.resize(folder.rfind('/'));
+    const int file = open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    if (file < 0) return;
+    fsync(file);
+    close(file);
+  }
+}
+
+int StreamFiles::finish(std::int64_t time) {
+  retire(time);
+  return sync();
+}
+
+}  // namespace recorder

@@ -1,0 +1,94 @@
+/**
+ * @file stream_files.h
+ * The files of a stream: one an hour, with its index if it is video. Belongs to the writer's thread.
+ */
+#ifndef RECORDER_STREAM_FILES_H
+#define RECORDER_STREAM_FILES_H
+
+#include <cstdint>
+#include <ctime>
+#include <deque>
+#include <string>
+#include <vector>
+
+#include "frame.h"
+#include "index_writer.h"
+#include "options.h"
+#include "ring.h"
+
+namespace recorder {
+
+/// An hour of the wall clock. In autumn, when the local time repeats an hour, these are two.
+struct Hour {
+  std::int64_t begin = 0, end = 0;  ///< milliseconds since 1970
+  std::tm local{};
+
+  bool contains(std::int64_t time) const { return time >= begin && time < end; }
+};
+Hour hour_of(std::int64_t time);
+
+class StreamFiles {
+ public:
+  StreamFiles(const Options &options, unsigned stream);
+  ~StreamFiles();
+  StreamFiles(const StreamFiles &) = delete;
+  StreamFiles &operator=(const StreamFiles &) = delete;
+
+  /// Adds a frame to those that are to be written. Its memory must stay valid until it is written or dropped.
+  void queue(const Ring::Taken &taken);
+  bool all_written() const { return queue_.empty(); }
+  /// Returns the position of the oldest frame that is not written.
+  std::uint64_t oldest() const { return queue_.front().position; }
+
+  /// Writes the frames, also into new files when the hour changes. Returns 0 or an errno: frames that are not
+  /// written then stay for the next call, and the file ends with a whole frame.
+  int write();
+  /// Drops the frames in front of a position, and all that follow up to the next intra frame.
+  void drop_until(std::uint64_t position);
+  /// Returns how many frames have been dropped.
+  std::uint64_t dropped() const { return dropped_; }
+
+  /// Writes what has been written through to the disk. Returns 0 or an errno; if the file has vanished from
+  /// its folder, ENOENT. After an error the next intra frame begins a new file.
+  int sync();
+  /// Ends the file. Returns 0 or the errno of the sync.
+  int finish(std::int64_t time);
+  /// Adds an event to the index.
+  void note_disk_error(std::int64_t time, int error);
+
+  /// Returns the path of the file, or of the one that could not be created.
+  const std::string &path() const { return path_; }
+  bool is_open() const { return file_ >= 0; }
+  /// Returns the hour of the open file.
+  const Hour &hour() const { return hour_; }
+
+ private:
+  bool belongs_here(const Frame &frame) const;
+  int change_file(const Frame &first);
+  int create_part();
+  int create_index(std::int64_t time);
+  int write_batch();
+  void skip_group();
+  void retire(std::int64_t time);
+  void sync_folders() const;
+
+  const Options &options_;
+  const unsigned stream_;
+  std::deque<Ring::Taken> queue_;
+  bool needs_intra_ = false;  ///< frames were dropped: queue() drops all up to the next intra frame
+  std::uint64_t dropped_ = 0;
+  std::uint64_t told_ = 0;  ///< how many of them are in an index
+
+  std::string path_;
+  int file_ = -1;
+  IndexWriter index_;
+  Hour hour_;
+  std::int64_t offset_ = 0;      ///< bytes of the file, whole frames only
+  bool replace_ = false;         ///< the next intra frame begins a new file
+  bool folder_changed_ = false;  ///< the name of the file is not yet on the disk
+  std::vector<int> retired_;     ///< files that have ended, to be synced and closed
+};
+
+}  // namespace recorder
+
+#endif

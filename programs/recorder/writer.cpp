@@ -1,0 +1,179 @@
+// Takes frames from the buffer to the files, in large writes.
+#include "writer.h"
+
+#include <signal.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <set>
+
+#include "disk_space.h"
+#include "recording/tree.h"
+
+namespace recorder {
+namespace {
+
+/// How long the writer sleeps between two passes. A kill loses the frames of at most one such pause. Longer
+/// pauses make larger writes.
+constexpr auto kPause = std::chrono::milliseconds(40);
+constexpr auto kRetry = std::chrono::seconds(10);
+constexpr auto kSpaceCheck = std::chrono::seconds(1);
+
+/// Returns an hour as the names of its files begin.
+std::string name_of(const Hour &hour) {
+  const std::string name = recording::file_name(recording::Kind::video, hour.local);
+  return name.substr(0, name.find('.'));
+}
+
+}  // namespace
+
+Writer::Writer(const Options &options, Intake &intake, Messages &messages)
+    : options_(options), intake_(intake), messages_(messages) {
+  for (unsigned stream = 0; stream < kStreams; ++stream) {
+    if (!intake.records(stream)) continue;
+    outputs_.push_back(std::make_unique<Output>(options, stream));
+    by_stream_[stream] = outputs_.back().get();
+  }
+}
+
+void Writer::start() {
+  // The files take turns, so that the writer never waits long for the disk.
+  const auto now = Clock::now();
+  const Clock::duration turn =
+      options_.sync / static_cast<Clock::rep>(std::max<std::size_t>(1, outputs_.size()));
+  for (std::size_t n = 0; n < outputs_.size(); ++n)
+    outputs_[n]->next_sync = now + turn * static_cast<Clock::rep>(n + 1);
+  // Signals are for the main thread.
+  sigset_t all, before;
+  sigfillset(&all);
+  pthread_sigmask(SIG_SETMASK, &all, &before);
+  thread_ = std::thread([this] { run(); });
+  pthread_sigmask(SIG_SETMASK, &before, nullptr);
+}
+
+void Writer::finish() {
+  ending_ = true;
+  if (thread_.joinable()) thread_.join();
+}
+
+void Writer::run() {
+  while (!ending_) {
+    pass(Clock::now());
+    std::this_thread::sleep_for(kPause);
+  }
+  for (auto &output : outputs_) output->next_try = {};  // the last try
+  full_ = false;
+  pass(Clock::now());
+  end_files();
+}
+
+void Writer::pass(Clock::time_point now) {
+  if (now >= next_space_check_) check_space(now);
+  take_frames(intake_.video());
+  take_frames(intake_.audio());
+  for (auto &output : outputs_) write(*output, now);
+  make_room(intake_.video(), true);
+  make_room(intake_.audio(), false);
+  for (auto &output : outputs_) {
+    dropped_[output->stream] = output->files.dropped();
+    if (now >= output->next_sync) sync(*output, now);
+  }
+}
+
+void Writer::take_frames(Ring &ring) {
+  for (Ring::Taken taken = ring.take(); taken.frame != nullptr; taken = ring.take()) {
+    const Frame &frame = *taken.frame;
+    if (frame.gap_ms > 0) {
+      char text[64];
+      std::snprintf(text, sizeof text, ": gap of %.2f s", frame.gap_ms / 1000.0);
+      messages_.add(stream_name(frame.stream) + text);
+    }
+    if (frame.lost > 0)
+      messages_.add(stream_name(frame.stream) + ": the buffer was full: " + std::to_string(frame.lost) +
+                    (is_video(frame.stream) ? " frames" : " blocks") + " are lost");
+    by_stream_[frame.stream]->files.queue(taken);
+  }
+}
+
+void Writer::write(Output &output, Clock::time_point now) {
+  if (full_ || now < output.next_try) return;
+  const int error = output.files.write();
+  if (error != 0) {
+    report_error(output, error);
+    output.next_try = now + kRetry;
+  } else if (output.error != 0) {
+    messages_.add(stream_name(output.stream) + ": goes on in " + output.files.path());
+  }
+  output.error = error;
+  const std::uint64_t lost = output.files.dropped() - output.told;
+  if (error != 0 || lost == 0) return;
+  messages_.add(stream_name(output.stream) + ": " + std::to_string(lost) +
+                " could not be written and are lost");
+  output.told += lost;
+}
+
+/// Says the same only once.
+void Writer::report_error(Output &output, int error) {
+  if (error == output.error) return;
+  output.files.note_disk_error(wall_ms(), error);
+  messages_.add(stream_name(output.stream) + ": " + output.files.path() + ": " + std::strerror(error));
+}
+
+/// Frames that cannot be written wait in the buffer for the next try, but only in its newer half: the other
+/// half is for the streams that can be written. Then gives the space of all frames back that are written or
+/// dropped.
+void Writer::make_room(Ring &ring, bool video) {
+  const std::uint64_t taken = ring.taken();
+  const std::uint64_t half = ring.capacity() / 2;
+  std::uint64_t oldest = taken;
+  for (auto &output : outputs_) {
+    if (is_video(output->stream) != video || output->files.all_written()) continue;
+    if (taken > half) output->files.drop_until(taken - half);
+    if (!output->files.all_written()) oldest = std::min(oldest, output->files.oldest());
+  }
+  ring.release(oldest);
+}
+
+void Writer::sync(Output &output, Clock::time_point now) {
+  output.next_sync = now + options_.sync;
+  if (const int error = output.files.sync()) report_error(output, error);
+}
+
+void Writer::check_space(Clock::time_point now) {
+  next_space_check_ = now + kSpaceCheck;
+  free_ = recorder::free_percent(options_.root).value_or(-1);
+  const bool low = free_ >= 0 && free_ < options_.min_free;
+  const bool full = low && !(options_.delete_oldest && delete_oldest());
+  if (full == full_) return;
+  full_ = full;
+  if (full)
+    for (auto &output : outputs_) output->files.note_disk_error(wall_ms(), ENOSPC);
+  char text[128];
+  std::snprintf(text, sizeof text, "%s: %.1f %% of the disk is free, --min-free is %.0f",
+                full ? "recording pauses" : "recording goes on", free_.load(), options_.min_free);
+  messages_.add(text);
+}
+
+/// Deletes the recordings of an hour. Returns false if there is none that may be deleted.
+bool Writer::delete_oldest() {
+  std::set<std::string> kept{name_of(hour_of(wall_ms()))};
+  for (const auto &output : outputs_)
+    if (output->files.is_open()) kept.insert(name_of(output->files.hour()));
+  const std::string hour = delete_oldest_hour(options_.root, kept);
+  if (hour.empty()) return false;
+  messages_.add("deleted the recordings of hour " + hour + " to make room");
+  return true;
+}
+
+void Writer::end_files() {
+  const std::int64_t time = wall_ms();
+  for (auto &output : outputs_) {
+    output->files.drop_until(~std::uint64_t{0});
+    dropped_[output->stream] = output->files.dropped();
+    if (const int error = output->files.finish(time)) report_error(*output, error);
+  }
+}
+
+}  // namespace recorder

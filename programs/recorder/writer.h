@@ -1,0 +1,78 @@
+/**
+ * @file writer.h
+ * The thread that takes frames from the buffer to the files.
+ */
+#ifndef RECORDER_WRITER_H
+#define RECORDER_WRITER_H
+
+#include <array>
+#include <atomic>
+#include <memory>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "intake.h"
+#include "messages.h"
+#include "options.h"
+#include "stream_files.h"
+
+namespace recorder {
+
+class Writer {
+ public:
+  Writer(const Options &options, Intake &intake, Messages &messages);
+  ~Writer() { finish(); }
+  Writer(const Writer &) = delete;
+  Writer &operator=(const Writer &) = delete;
+
+  void start();
+  /// Writes all that is in the buffer, ends the files and joins the thread. Call it when no callback runs any
+  /// more.
+  void finish();
+
+  /// Any thread: frames that were dropped because their files could not be written.
+  std::uint64_t dropped(unsigned stream) const { return dropped_[stream]; }
+  /// Any thread: how much of the disk was free lately, in percent; negative if that is not known.
+  double free_percent() const { return free_; }
+
+ private:
+  /// A stream that is recorded.
+  struct Output {
+    Output(const Options &options, unsigned number) : stream(number), files(options, number) {}
+
+    unsigned stream;
+    StreamFiles files;
+    Clock::time_point next_sync;
+    int error = 0;               ///< of the last write, or 0
+    Clock::time_point next_try;  ///< after an error
+    std::uint64_t told = 0;      ///< how many dropped frames a line has told
+  };
+
+  void run();
+  void pass(Clock::time_point now);
+  void take_frames(Ring &ring);
+  void write(Output &output, Clock::time_point now);
+  void make_room(Ring &ring, bool video);
+  void sync(Output &output, Clock::time_point now);
+  void report_error(Output &output, int error);
+  void check_space(Clock::time_point now);
+  bool delete_oldest();
+  void end_files();
+
+  const Options &options_;
+  Intake &intake_;
+  Messages &messages_;
+  std::vector<std::unique_ptr<Output>> outputs_;
+  std::array<Output *, kStreams> by_stream_{};
+  Clock::time_point next_space_check_;
+  bool full_ = false;  ///< less is free than must stay free
+  std::array<std::atomic<std::uint64_t>, kStreams> dropped_{};
+  std::atomic<double> free_{-1};
+  std::atomic<bool> ending_{false};
+  std::thread thread_;
+};
+
+}  // namespace recorder
+
+#endif
