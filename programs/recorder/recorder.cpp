@@ -6,6 +6,14 @@ namespace {
 
 Intake *active = nullptr;  // of the recorder that has started; set while no callback runs
 
+void on_video(u32 channel, u8 *data, i32 length, i32 flags) {
+  active->take(channel, data, length, flags);
+}
+
+void on_audio(u32 input, u8 *data, i32 length, i32 flags) {
+  active->take(ZV_CHANNELS + input, data, length, flags);
+}
+
 /// The card keeps what an earlier program has set: sets everything that the recording depends on.
 void configure(HANDLE card, const Options &options) {
   check(zv_SetVideoStandard(card, options.standard), "zv_SetVideoStandard");
@@ -28,14 +36,6 @@ void configure(HANDLE card, const Options &options) {
 }
 
 }  // namespace
-
-void on_video(u32 channel, u8 *data, i32 length, i32 flags) {
-  active->take(channel, data, length, flags);
-}
-
-void on_audio(u32 input, u8 *data, i32 length, i32 flags) {
-  active->take(ZV_CHANNELS + input, data, length, flags);
-}
 
 Recorder::Recorder(const Options &options)
     : options_(options), intake_(options_), writer_(options_, intake_, messages_) {

@@ -43,10 +43,6 @@ class Recorder {
   Clock::time_point start_{};
 };
 
-/// The callbacks, for tests that come between. They pass frames to the recorder that has started.
-void on_video(u32 channel, u8 *data, i32 length, i32 flags);
-void on_audio(u32 input, u8 *data, i32 length, i32 flags);
-
 }  // namespace recorder
 
 #endif
