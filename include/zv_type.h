@@ -14,10 +14,10 @@
 extern "C" {
 #endif
 
-typedef uint8_t u8;
-typedef uint16_t u16;
-typedef uint32_t u32;
-typedef int32_t i32;
+typedef uint8_t u8;   /**< unsigned, 8 bits */
+typedef uint16_t u16; /**< unsigned, 16 bits */
+typedef uint32_t u32; /**< unsigned, 32 bits */
+typedef int32_t i32;  /**< signed, 32 bits */
 
 /** An open card. Opaque; zv_Open() creates it, zv_Close() makes it invalid. */
 typedef void *HANDLE;
