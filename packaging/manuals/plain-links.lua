@@ -1,0 +1,2 @@
+-- Replaces links by their text.
+function Link(link) return link.content end
