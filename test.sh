@@ -2,6 +2,7 @@
 # The one command that tests everything: ./test.sh
 #   ./test.sh quick    the release build and its tests only
 #   ./test.sh gates    the checks that need no build only
+#   ./test.sh packages the Debian packages only: builds them and uses them in a fresh Debian 12
 # Stops at the first step that fails, so that its last line is ctest's summary of the release build
 # only when all steps before it have passed.
 [ -n "${BASH_VERSION:-}" ] || exec bash "$0" "$@" # started as "sh test.sh"
@@ -66,13 +67,14 @@ smoke_demo() {
 
 mode=${1:-all}
 case $mode in
-  all | quick | gates) ;;
-  *) die "'$mode' is unknown; possible are quick and gates, or nothing for everything" ;;
+  all | quick | gates) install_missing "Building and testing take most of an hour on two cores." demo tests ;;
+  packages) install_missing "Building and testing take half an hour on two cores." demo tests packaging ;;
+  *) die "'$mode' is unknown; possible are quick, gates and packages, or nothing for everything" ;;
 esac
-install_missing "Building and testing take most of an hour on two cores." demo tests
 case $mode in
   gates) run_gates ;;
   quick) build_and_test release ;;
+  packages) tools/test-packages ;;
   all)
     run_gates
     build_and_test asan -LE real_time
