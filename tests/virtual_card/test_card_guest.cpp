@@ -111,7 +111,10 @@ TEST_F(NodeTest, ANumberThatWasReplacedOrClosedIsNoLongerTheCards) {
   close(replaced);
 
   const int closed = fcntl(encoder, F_DUPFD, 500);
-  ASSERT_EQ(close_range(static_cast<unsigned>(closed), static_cast<unsigned>(closed), 0), 0);
+  const auto number = static_cast<unsigned>(closed);
+  ASSERT_EQ(close_range(number, number, CLOSE_RANGE_CLOEXEC), 0);
+  EXPECT_EQ(card::open_descriptors(), 5) << "a number that is only marked is closed";
+  ASSERT_EQ(close_range(number, number, 0), 0);
   ASSERT_EQ(fcntl(file, F_DUPFD, 500), closed);
   EXPECT_EQ(content(closed), kContent);
   closefrom(500);
