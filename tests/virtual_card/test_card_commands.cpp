@@ -74,6 +74,18 @@ TEST_F(NodeTest, ACommandWhoseReplyCannotBeDeliveredIsNotCarriedOut) {
   EXPECT_EQ(answer(ioctl(video_input, VIN_IOC_SET_STANDARD, &kReadOnly.reply)), 0);
 }
 
+// Catches: a record that is carried out although only its beginning can be read.
+TEST_F(NodeTest, ARecordThatEndsInNoMemoryIsRefused) {
+  const auto page = static_cast<std::size_t>(sysconf(_SC_PAGESIZE));
+  void *const pages = mmap64(nullptr, 2 * page, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+  ASSERT_NE(pages, MAP_FAILED);
+  ASSERT_EQ(munmap(static_cast<u8 *>(pages) + page, page), 0);
+  u8 *const end = static_cast<u8 *>(pages) + page;
+  EXPECT_EQ(answer(ioctl(display, DISP_IOC_WRITE_REG, end - sizeof(Register) / 2)), -EFAULT);
+  EXPECT_EQ(answer(ioctl(display, DISP_IOC_WRITE_REG, end - sizeof(Register))), 0);
+  munmap(pages, page);
+}
+
 TEST_F(NodeTest, RegistersPowerUpAndKeepWhatIsWritten) {
   EXPECT_EQ(codec_register(kRegDisplayState) >> 31, 1u);
   EXPECT_EQ(codec_register(0xFFFFFFFC), 0u);

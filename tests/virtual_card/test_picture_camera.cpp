@@ -1,5 +1,6 @@
 // What a camera shows: picture properties, clock, privacy mask.
 
+#include <algorithm>
 #include <cstdlib>
 #include <ctime>
 
@@ -71,6 +72,28 @@ TEST_F(PictureTest, APropertyIsSeenInItsChannelOnly) {
     EXPECT_TRUE(near(pixel(720 * kBarX / 100, 480 * kBarY / 100), yellow, 4));
     EXPECT_TRUE(near(pixel(600, 400), card::kLostBlue, 2));
   }
+}
+
+// Catches: a burnt-in number that keeps its height when the size of the picture changes, or stays when it is
+// off.
+TEST_F(PictureTest, TheNumberFitsItsPicture) {
+  state.channel[2].scene = card::Scene::black;
+  const auto bright_lines = [&](u32 scale, bool shown) {
+    encode(2, scale, 0);
+    state.channel[2].encoder.number_overlay = shown;
+    const Frame frame = look(2);
+    int lines = 0;
+    for (u32 y = 0; y < frame.height / 2; ++y) {
+      const u8 *const line = frame.samples.data() + std::size_t{y} * frame.width;
+      lines += std::any_of(line, line + frame.width / 2, [](u8 luma) { return luma > 150; });
+    }
+    return lines;
+  };
+  const int cif = bright_lines(kCif, true);
+  EXPECT_GT(cif, 8);
+  EXPECT_NEAR(bright_lines(kD1, true), 2 * cif, 2);
+  EXPECT_EQ(bright_lines(kCif, true), cif);
+  EXPECT_EQ(bright_lines(kCif, false), 0);
 }
 
 // Catches: a mask that what moves paints over, that is off at one scale, or lies in the wrong place.
