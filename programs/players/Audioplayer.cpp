@@ -1,11 +1,27 @@
 // Audioplayer FILE: plays an audio recording (".aud") with ffplay, or with mpv if ffplay is not installed.
 // The file has no header: G.726, 8000 samples a second, mono, 3 bits a sample.
+#include <algorithm>
+#include <string>
+
 #include "launch.h"
+
+namespace {
+
+/// Returns "Audio 2 - 20090303-14.aud" for a file in a folder "CH02", and the file's name elsewhere.
+std::string title_of(const std::string &file) {
+  const std::string name = players::base_name(file);
+  const std::string folder =
+      players::base_name(file.substr(0, file.size() - std::min(file.size(), name.size() + 1)));
+  const bool input = folder.size() == 4 && folder.starts_with("CH0") && folder[3] >= '1' && folder[3] <= '4';
+  return input ? std::string("Audio ") + folder[3] + " - " + name : name;
+}
+
+}  // namespace
 
 int main(int argc, char **argv) {
   if (players::open_argument(argc, argv, 0) < 0) return 1;
   const std::string file = argv[1];
-  const std::string title = players::base_name(file);
+  const std::string title = title_of(file);
   return players::run_first_installed(
       {{"ffplay",
         {"-hide_banner", "-loglevel", "error", "-autoexit", "-window_title", title, "-f", "g726",

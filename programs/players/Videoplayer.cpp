@@ -1,15 +1,27 @@
 // Videoplayer FILE: plays a video recording (".rec") with ffplay, or with mpv if ffplay is not installed.
 #include <cstdio>
+#include <cstdlib>
 
 #include "launch.h"
 #include "recording/frame_rates.h"
 #include "recording/header.h"
+#include "recording/index.h"
 
 namespace {
 
 /// Returns the name of the demuxer that splits the stream behind the header into frames.
 const char *stream_format(ZV_VIDEO_CODEC codec) {
   return codec == VIDEO_CODEC_ZV_MJPEG ? "mjpeg" : "m4v";
+}
+
+/// Returns the pictures a second, as ffplay reads them; empty when unknown. The index beside a recording
+/// tells the rate without doubt, and whether both fields of a frame are a picture each.
+std::string picture_rate(const RECORD_FILE_HEADER &header, const std::string &file) {
+  for (const recording::IndexEntry &entry : recording::read_index(recording::index_path(file))) {
+    if (entry.kind != recording::IndexEntry::Kind::start) continue;
+    return entry.fields == 2 ? std::to_string(2 * std::atoi(entry.rate.c_str())) : entry.rate;
+  }
+  return header.frame_rate > 0 ? recording::frame_rate_label(header) : "";
 }
 
 /// Returns the command lines of ffplay and mpv. They show every picture as 4:3, whatever its size in pixels.
@@ -22,8 +34,7 @@ std::vector<players::PlayerCommand> player_commands(const RECORD_FILE_HEADER &he
                                 {"-hide_banner", "-loglevel", "error", "-autoexit", "-window_title", title,
                                  "-vf", "setdar=4/3", "-f", format, "-skip_initial_bytes", skip}};
   std::string options = "skip_initial_bytes=" + skip;
-  if (header.frame_rate > 0) {
-    const std::string rate = recording::frame_rate_label(header);
+  if (const std::string rate = picture_rate(header, file); !rate.empty()) {
     ffplay.arguments.insert(ffplay.arguments.end(), {"-framerate", rate});
     options += ",framerate=" + rate;
   }

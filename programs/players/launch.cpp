@@ -10,6 +10,8 @@
 #include <cstdlib>
 #include <cstring>
 
+#include "programs/common/command_line.h"
+
 namespace players {
 namespace {
 
@@ -21,29 +23,28 @@ void run(const PlayerCommand &command) {
   execvp(argv[0], argv.data());
 }
 
-constexpr char kHelp[] =
-    "Usage: %s FILE\n"
-    "Plays a recording with ffplay, or with mpv if ffplay is not installed.\n\n"
-    "  -h, --help   this text\n"
-    "  --version    the version\n";
-
-/// Ends the program as an option says; with status 2 for an option that it does not have.
-[[noreturn]] void end_with_option(const std::string &option) {
-  const char *const program = program_invocation_short_name;
-  if (option == "--version") {
-    std::printf("%s %s\n", program, ZARVO_VERSION);
-    std::exit(0);
+/// Ends the program as the option in front says; with status 2 for an option that it does not have.
+[[noreturn]] void end_with_option(int argc, char **argv) {
+  const std::string program = program_invocation_short_name;
+  const std::string help = "Usage: " + program +
+                           " FILE\n"
+                           "Plays a recording with ffplay, or with mpv if ffplay is not installed.\n\n"
+                           "  -h, --help   this text\n"
+                           "  --version    the version\n";
+  constexpr option kOptions[] = {COMMON_OPTIONS};
+  try {
+    next_option(argc, argv, kOptions, help.c_str());
+  } catch (const UsageError &) {
   }
-  const bool help = option == "-h" || option == "--help";
-  if (!help) std::fprintf(stderr, "%s: '%s' is neither an option nor a file\n", program, option.c_str());
-  std::fprintf(help ? stdout : stderr, kHelp, program);
-  std::exit(help ? 0 : 2);
+  std::fprintf(stderr, "%s: '%s' is neither an option nor a file\n%s", program.c_str(), argv[1],
+               help.c_str());
+  std::exit(2);
 }
 
 }  // namespace
 
 int open_argument(int argc, char **argv, off_t header) {
-  if (argc > 1 && *argv[1] == '-' && access(argv[1], F_OK) != 0) end_with_option(argv[1]);
+  if (argc > 1 && *argv[1] == '-' && access(argv[1], F_OK) != 0) end_with_option(argc, argv);
   if (argc != 2) {
     std::fprintf(stderr, "Usage: %s FILE\n", argc > 0 ? argv[0] : "player");
     return -1;

@@ -91,24 +91,33 @@ TEST_F(Playback, PlayersHandTheFileOver) {
   write("header.rec", record_header("MPG4", 240, 30));
   write("bad.rec", "RIFF" + record_header("MPG4", 240, 30));
   write("a.aud", "blocks");
+  write("fields.rec", record_header("MPG4", 240, 30) + "stream");
+  write("fields.idx",
+        R"({"event":"start","time":1,"offset":32,"standard":"ntsc","rate":"30","fields":2,"audio":[]})");
+  fs::create_directory("CH02");
+  fs::copy("a.aud", "CH02/a.aud");
   ASSERT_EQ(mkfifo("pipe.rec", 0600), 0);
   const std::string video = " -skip_initial_bytes 32 -framerate ";
   const struct {
     const char *command;
     std::string output;
     int status;
-  } rows[] = {{VIDEOPLAYER " \"it's.rec\"", " -f m4v" + video + "7.5 -i file:it's.rec ", 0},
-              {VIDEOPLAYER " pal.rec",
-               "Channel 12 - pal.rec -vf setdar=4/3 -f mjpeg" + video + "16.67 -i file:pal.rec ", 0},
-              {VIDEOPLAYER " whole.rec", video + "20 -i file:whole.rec ", 0},
-              {AUDIOPLAYER " a.aud", "-f g726 -code_size 3 -sample_rate 8000 -i file:a.aud ", 0},
-              {VIDEOPLAYER " bad.rec", "bad.rec: no recording header\n", 1},
-              {VIDEOPLAYER " header.rec", "header.rec: nothing is recorded in this file\n", 1},
-              {VIDEOPLAYER " missing.rec", "missing.rec: No such file or directory\n", 1},
-              {VIDEOPLAYER " pipe.rec", "pipe.rec: not a recording\n", 1},
-              {AUDIOPLAYER " bin", "bin: not a recording\n", 1},
-              {AUDIOPLAYER " a b", " FILE\n", 1},
-              {"PATH=/nowhere; " AUDIOPLAYER " a.aud", "Install ffplay (package ffmpeg) or mpv.\n", 1}};
+  } rows[] = {
+      {VIDEOPLAYER " \"it's.rec\"", " -f m4v" + video + "7.5 -i file:it's.rec ", 0},
+      {VIDEOPLAYER " pal.rec",
+       "Channel 12 - pal.rec -vf setdar=4/3 -f mjpeg" + video + "16.67 -i file:pal.rec ", 0},
+      {VIDEOPLAYER " whole.rec", video + "20 -i file:whole.rec ", 0},
+      {VIDEOPLAYER " fields.rec", video + "60 -i file:fields.rec ", 0},
+      {AUDIOPLAYER " CH02/a.aud",
+       "-window_title Audio 2 - a.aud -f g726 -code_size 3 -sample_rate 8000 -i file:CH02/a.aud ", 0},
+      {AUDIOPLAYER " a.aud", "-window_title a.aud -f g726 -code_size 3 -sample_rate 8000 -i file:a.aud ", 0},
+      {VIDEOPLAYER " bad.rec", "bad.rec: no recording header\n", 1},
+      {VIDEOPLAYER " header.rec", "header.rec: nothing is recorded in this file\n", 1},
+      {VIDEOPLAYER " missing.rec", "missing.rec: No such file or directory\n", 1},
+      {VIDEOPLAYER " pipe.rec", "pipe.rec: not a recording\n", 1},
+      {AUDIOPLAYER " bin", "bin: not a recording\n", 1},
+      {AUDIOPLAYER " a b", " FILE\n", 1},
+      {"PATH=/nowhere; " AUDIOPLAYER " a.aud", "Install ffplay (package ffmpeg) or mpv.\n", 1}};
   for (const auto &row : rows) {
     const int status =
         std::system((std::string("{ PATH=$PWD/bin; ") + row.command + "; } > out 2>&1").c_str());
