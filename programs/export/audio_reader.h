@@ -1,0 +1,49 @@
+/**
+ * @file audio_reader.h
+ * Reads the blocks of an audio input by the time of the wall clock.
+ */
+#ifndef EXPORT_AUDIO_READER_H
+#define EXPORT_AUDIO_READER_H
+
+#include <array>
+#include <fstream>
+#include <vector>
+
+#include "aac_encoder.h"
+#include "catalogue.h"
+#include "report.h"
+
+namespace clips {
+
+struct AudioBlock {
+  Milliseconds time = 0;
+  std::array<char, kBlockBytes> data{};
+};
+
+class AudioReader {
+ public:
+  /// Audio files have no index: the video files beside them tell when each began.
+  AudioReader(const std::vector<Recording> &audio, const std::vector<Recording> &video, Report &report);
+
+  /// Goes on at the first block that begins at a time or behind it.
+  void seek(Milliseconds time);
+  /// Reads the next block if it begins before `until`.
+  bool next(AudioBlock &block, Milliseconds until);
+
+ private:
+  struct File {
+    std::string path;
+    Milliseconds start;
+    std::int64_t blocks;
+    Milliseconds end() const;
+  };
+
+  std::vector<File> files_;
+  std::size_t file_ = 0;    ///< the file of the next block
+  std::int64_t block_ = 0;  ///< its number in the file
+  std::ifstream stream_;    ///< the file, open behind its first block that was read
+};
+
+}  // namespace clips
+
+#endif

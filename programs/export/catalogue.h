@@ -1,0 +1,50 @@
+/**
+ * @file catalogue.h
+ * Finds recordings, and tells from their indexes what they hold.
+ */
+#ifndef EXPORT_CATALOGUE_H
+#define EXPORT_CATALOGUE_H
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "recording/index.h"
+#include "recording/tree.h"
+#include "wall_time.h"
+
+namespace clips {
+
+/// A recording: a part of a clock hour of a channel or of an audio input.
+struct Recording {
+  std::string path;
+  unsigned number = 0;                       ///< channel or input, from 1
+  std::optional<Milliseconds> hour;          ///< the clock hour of its name; none for another name
+  unsigned part = 0;                         ///< 0 for the first file of the hour
+  std::vector<recording::IndexEntry> index;  ///< empty if there is none
+
+  /// Returns when the first frame was recorded: by the index, else the hour's start for the first part.
+  std::optional<Milliseconds> start() const;
+};
+
+/// Returns a recording with its index; of its path, the last two names may tell channel and hour.
+Recording recording_at(const std::string &path);
+
+/// Returns the recordings below a root in the order of channel, hour and part: those of one channel, or of
+/// all for 0, whose hour overlaps a stretch. Throws std::runtime_error if the root cannot be read.
+std::vector<Recording> find_recordings(const std::string &root, recording::Kind kind, unsigned number,
+                                       const Stretch &stretch);
+
+/// What an index tells.
+struct Contents {
+  Stretch recorded;
+  std::vector<Stretch> motion;
+  std::vector<Stretch> gaps;
+  std::int64_t lost_frames = 0;  ///< because the buffer was full
+};
+/// The index must not be empty.
+Contents contents_of(const std::vector<recording::IndexEntry> &index);
+
+}  // namespace clips
+
+#endif

@@ -1,0 +1,205 @@
+// Makes a clip of recordings.
+#include "clip.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <utility>
+
+#include "programs/common/stop_signal.h"
+
+namespace clips {
+namespace {
+
+/// Bytes of the MPEG-4 stream header in front of each intra frame.
+constexpr std::size_t kStreamHeader = 20;
+
+recording::FrameRate rate_of(const RECORD_FILE_HEADER &header, const Recording &recording, bool two_fields) {
+  const auto standard = header.record_height % 240 == 0 ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL;
+  std::string label = recording::frame_rate_label(header);
+  if (!recording.index.empty() && recording.index.front().kind == recording::IndexEntry::Kind::start) {
+    label = recording.index.front().rate;
+    two_fields = recording.index.front().fields == 2;
+  }
+  recording::FrameRate rate = recording::exact_frame_rate(standard, 0).value();
+  const char *const *const labels = recording::frame_rate_list(standard);
+  for (std::size_t row = 0; labels[row] != nullptr; ++row)
+    if (labels[row] == label) rate = recording::exact_frame_rate(standard, row).value();
+  if (two_fields) rate.numerator *= 2;
+  return rate;
+}
+
+bool same(const VideoFormat &a, const VideoFormat &b) {
+  return a.codec == b.codec && a.width == b.width && a.height == b.height &&
+         a.rate.numerator == b.rate.numerator && a.rate.denominator == b.rate.denominator;
+}
+
+/// Returns the offset of the last intra frame at or before a time; 0 without an index.
+std::int64_t intra_before(const Recording &recording, Milliseconds time) {
+  std::int64_t offset = 0;
+  for (const recording::IndexEntry &entry : recording.index)
+    if (entry.kind == recording::IndexEntry::Kind::intra && entry.time <= time) offset = entry.offset;
+  return offset;
+}
+
+}  // namespace
+
+Clip::Clip(const Options &options, std::vector<Stretch> stretches, AudioReader *audio, Report &report)
+    : options_(options),
+      stretches_(std::move(stretches)),
+      audio_(audio),
+      report_(report),
+      output_(options.output, options.force) {}
+
+void Clip::add(const Recording &recording) try {
+  StreamReader reader(recording.path);
+  if (!accept(recording, reader)) return;
+  timeline_->begin_file(recording.index, recording.start());
+  Group group;
+  bool seek = true;
+  while (!stopping && stretch_ < stretches_.size()) {
+    // Between two stretches, and in front of the first, the index tells where to go on.
+    const std::int64_t target = seek ? intra_before(recording, stretches_[stretch_].from) : 0;
+    if (target > group.end()) reader.seek(target);
+    if (!reader.next(group)) break;
+    const std::size_t before = stretch_;
+    add_group(recording, group);
+    seek = stretch_ != before;
+  }
+} catch (const RecordingError &error) {
+  report_.skipped(error.what());
+}
+
+/// Returns whether a recording has the format of the clip.
+bool Clip::accept(const Recording &recording, const StreamReader &reader) {
+  const RECORD_FILE_HEADER &header = reader.header();
+  const VideoFormat format{reader.codec(), header.record_width, header.record_height,
+                           rate_of(header, recording, options_.two_fields)};
+  if (format_ && !same(*format_, format)) {
+    report_.skipped(recording.path +
+                    ": skipped, its size, codec or rate is not that of the recordings before");
+    return false;
+  }
+  if (format_) return true;
+  format_ = format;
+  label_ = recording::label_of(header);
+  timeline_.emplace(format.rate);
+  checker_.emplace(format.codec);
+  return true;
+}
+
+void Clip::add_group(const Recording &recording, Group &group) {
+  if (group.sizes.empty() && group.lost == 0) {
+    stray_ = recording.path + ": bytes " + std::to_string(group.offset) + " to " +
+             std::to_string(group.end()) + " belong to no intra frame: skipped";
+    return;
+  }
+  const std::string stray = std::exchange(stray_, "");
+  place_frames(group);
+  const Milliseconds begin = timeline_->time_of(periods_.front());
+  const Milliseconds end = timeline_->time_of(periods_.back() + 1);
+  while (stretch_ < stretches_.size() && stretches_[stretch_].to <= begin) {
+    ++stretch_;
+    writing_ = false;
+  }
+  if (stretch_ == stretches_.size() || end <= stretches_[stretch_].from) return;
+  // Stretches that meet in this group become one.
+  Stretch &stretch = stretches_[stretch_];
+  const auto later = stretches_.begin() + static_cast<std::ptrdiff_t>(stretch_) + 1;
+  while (later != stretches_.end() && later->from < end) {
+    stretch.to = later->to;
+    stretches_.erase(later);
+  }
+  if (!stray.empty()) report_.skipped(stray);
+  check_frames(recording, group);
+  if (group.sizes.empty()) return;
+  if (!writing_) begin_stretch(recording, group);
+  std::size_t at = 0;
+  for (std::size_t frame = 0; frame < group.sizes.size(); at += group.sizes[frame++]) {
+    const Milliseconds time = timeline_->time_of(periods_[frame]);
+    if (time >= stretch.to) break;
+    write_audio(time);
+    next_ = periods_[frame] - shift_;
+    muxer_->write_video(group.data.subspan(at, group.sizes[frame]), next_++, frame == 0);
+  }
+  show_progress();
+}
+
+void Clip::place_frames(const Group &group) {
+  periods_.clear();
+  std::int64_t offset = group.offset;
+  for (const std::size_t size : group.sizes) {
+    periods_.push_back(timeline_->place(offset));
+    offset += static_cast<std::int64_t>(size);
+  }
+  std::size_t lost = group.lost;
+  if (periods_.empty()) {
+    periods_.push_back(timeline_->place(group.offset));
+    --lost;
+  }
+  timeline_->skip(lost);
+}
+
+/// Takes damaged frames off a group, and says so.
+void Clip::check_frames(const Recording &recording, Group &group) {
+  const bool mpeg4 = format_->codec == VIDEO_CODEC_ZV_MPEG4;
+  if (options_.check || (mpeg4 && group.last)) group.keep(checker_->whole_frames(group));
+  if (mpeg4 && !group.sizes.empty() && muxer_ &&
+      !std::ranges::equal(stream_header_, group.data.first(std::min(kStreamHeader, group.sizes[0]))))
+    group.keep(0);
+  std::int64_t offset = group.offset;
+  for (const std::size_t size : group.sizes) offset += static_cast<std::int64_t>(size);
+  if (offset == group.end()) return;
+  const std::string place = recording.path + ": the frame at byte " + std::to_string(offset);
+  if (group.last && group.lost == 1)
+    report_.skipped(place + ", the last one, is torn: skipped");
+  else
+    report_.skipped(place + " is damaged: " + std::to_string(group.lost) + " frames skipped");
+}
+
+/// The stretch begins with the intra frame of a group; it follows the stretch before without a gap.
+void Clip::begin_stretch(const Recording &recording, const Group &group) {
+  const Milliseconds begin = timeline_->time_of(periods_.front());
+  if (audio_ != nullptr && muxer_ != nullptr) write_audio(timeline_->time_of(next_ + shift_));
+  shift_ = periods_.front() - next_;
+  audio_shift_ = begin - timeline_->length_of(next_);
+  if (audio_ != nullptr) audio_->seek(begin);
+  writing_ = true;
+  if (muxer_ != nullptr) return;
+  if (format_->codec == VIDEO_CODEC_ZV_MPEG4) {
+    const auto header = group.data.first(std::min(kStreamHeader, group.sizes[0]));
+    stream_header_.assign(header.begin(), header.end());
+  }
+  const bool dated = recording.start().has_value();
+  ClipFormat format{*format_, stream_header_, options_.output.ends_with(".mp4"), audio_ != nullptr, "", {}};
+  if (dated) format.created = begin;
+  format.title = label_ + (dated ? ", " + local_text(begin) : "");
+  muxer_ = std::make_unique<Muxer>(output_.path(), format);
+}
+
+/// Writes the audio in front of a time.
+void Clip::write_audio(Milliseconds until) {
+  AudioBlock block;
+  while (audio_ != nullptr && audio_->next(block, until))
+    muxer_->write_audio({reinterpret_cast<const std::uint8_t *>(block.data.data()), block.data.size()},
+                        (block.time - audio_shift_) * kSampleRate / 1000);
+}
+
+void Clip::finish() {
+  if (stopping) throw std::runtime_error("stopped; no clip is written");
+  if (muxer_ == nullptr) throw std::runtime_error("nothing is recorded there; no clip is written");
+  write_audio(timeline_->time_of(next_ + shift_));
+  muxer_->finish();
+  output_.commit();
+  if (shown_ >= 0) std::fprintf(stderr, "\r%s  done\n", length_text(timeline_->length_of(next_)).c_str());
+}
+
+/// Shows the length of the clip so far on a terminal, every minute of it.
+void Clip::show_progress() {
+  const Milliseconds length = timeline_->length_of(next_);
+  if (length < shown_ + 60000 || isatty(STDERR_FILENO) == 0) return;
+  shown_ = length;
+  std::fprintf(stderr, "\r%s", length_text(length).c_str());
+}
+
+}  // namespace clips

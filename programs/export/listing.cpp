@@ -1,0 +1,97 @@
+// Prints what is recorded as a table or as JSON.
+#include "listing.h"
+
+#include <cstdio>
+#include <filesystem>
+#include <iostream>
+#include <nlohmann/json.hpp>
+
+#include "aac_encoder.h"
+
+namespace clips {
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+std::string name_of(const ListedRecording &row) {
+  return (row.video ? "channel " : "audio ") + std::to_string(row.recording.number);
+}
+
+Json as_json(const std::vector<Stretch> &stretches) {
+  Json list = Json::array();
+  for (const Stretch &stretch : stretches)
+    list.push_back({{"from", local_text(stretch.from)},
+                    {"to", local_text(stretch.to)},
+                    {"seconds", static_cast<double>(stretch.to - stretch.from) / 1000}});
+  return list;
+}
+
+ListedRecording listed(Recording recording, bool video) {
+  ListedRecording row{std::move(recording), video, {}};
+  if (!row.recording.index.empty()) {
+    row.contents = contents_of(row.recording.index);
+    return row;
+  }
+  const Milliseconds hour = *row.recording.hour;
+  row.contents.recorded = {hour, hour + kHour};
+  return row;
+}
+
+}  // namespace
+
+Milliseconds total(const std::vector<Stretch> &stretches) {
+  Milliseconds sum = 0;
+  for (const Stretch &stretch : stretches) sum += stretch.to - stretch.from;
+  return sum;
+}
+
+std::vector<ListedRecording> list_recordings(const Options &options) {
+  std::vector<ListedRecording> rows;
+  for (const bool video : {true, false}) {
+    if (!video && (options.channel != 0 || !std::filesystem::is_directory(options.root + "/Audio"))) continue;
+    const auto kind = video ? recording::Kind::video : recording::Kind::audio;
+    for (Recording &recording : find_recordings(options.root, kind, options.channel, options.range)) {
+      ListedRecording row = listed(std::move(recording), video);
+      if (row.contents.recorded.overlaps(options.range)) rows.push_back(std::move(row));
+    }
+  }
+  return rows;
+}
+
+void print_table(const std::vector<ListedRecording> &rows) {
+  std::printf("%-11s %-19s  %-19s %9s %9s %6s %9s  %s\n", "", "from", "to", "length", "motion", "gaps",
+              "gaps", "file");
+  for (const ListedRecording &row : rows) {
+    const auto &[recorded, motion, gaps, lost] = row.contents;
+    std::printf("%-11s %-19s  %-19s ", name_of(row).c_str(), local_text(recorded.from).c_str(),
+                local_text(recorded.to).c_str());
+    if (row.recording.index.empty())
+      std::printf("%9s %9s %6s %9s", row.video ? "no index" : "", "", "", "");
+    else
+      std::printf("%9s %9s %6zu %9s", length_text(recorded.to - recorded.from).c_str(),
+                  length_text(total(motion)).c_str(), gaps.size(), length_text(total(gaps)).c_str());
+    std::printf("  %s%s\n", row.recording.path.c_str(),
+                lost > 0 ? (", " + std::to_string(lost) + " frames lost").c_str() : "");
+  }
+}
+
+void print_json(const std::vector<ListedRecording> &rows) {
+  Json list = Json::array();
+  for (const ListedRecording &row : rows) {
+    Json item;
+    item[row.video ? "channel" : "audio"] = row.recording.number;
+    item["file"] = row.recording.path;
+    item["index"] = !row.recording.index.empty();
+    item["from"] = local_text(row.contents.recorded.from);
+    item["to"] = local_text(row.contents.recorded.to);
+    if (!row.recording.index.empty()) {
+      item["motion"] = as_json(row.contents.motion);
+      item["gaps"] = as_json(row.contents.gaps);
+      item["lost_frames"] = row.contents.lost_frames;
+    }
+    list.push_back(item);
+  }
+  std::cout << list.dump(2, ' ', false, Json::error_handler_t::replace) << "\n";
+}
+
+}  // namespace clips

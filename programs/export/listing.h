@@ -1,0 +1,35 @@
+/**
+ * @file listing.h
+ * Shows what is recorded: as a table, as JSON, as a picture.
+ */
+#ifndef EXPORT_LISTING_H
+#define EXPORT_LISTING_H
+
+#include <string>
+#include <vector>
+
+#include "catalogue.h"
+#include "options.h"
+
+namespace clips {
+
+/// A row of the list.
+struct ListedRecording {
+  Recording recording;
+  bool video;
+  Contents contents;  ///< without an index the whole clock hour
+};
+
+std::vector<ListedRecording> list_recordings(const Options &options);
+
+void print_table(const std::vector<ListedRecording> &rows);
+void print_json(const std::vector<ListedRecording> &rows);
+/// Draws an SVG. Throws std::runtime_error if the file cannot be written or exists and `force` is false.
+void draw(const std::vector<ListedRecording> &rows, const std::string &file, bool force);
+
+/// Returns the length of all stretches together.
+Milliseconds total(const std::vector<Stretch> &stretches);
+
+}  // namespace clips
+
+#endif

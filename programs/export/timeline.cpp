@@ -1,0 +1,49 @@
+// Places frames in time, by the index of their file or by the frame rate alone.
+#include "timeline.h"
+
+#include <algorithm>
+#include <cmath>
+
+namespace clips {
+namespace {
+
+/// A time in the index is when a frame reached the recorder. It may be late by this much without a gap.
+constexpr Milliseconds kJitter = 200;
+
+}  // namespace
+
+void Timeline::begin_file(const std::vector<recording::IndexEntry> &index,
+                          std::optional<Milliseconds> start) {
+  index_ = &index;
+  entry_ = 0;
+  start_ = index.empty() ? start : std::nullopt;
+}
+
+Milliseconds Timeline::length_of(std::int64_t periods) const {
+  return std::llround(static_cast<double>(periods) * 1000 * rate_.denominator / rate_.numerator);
+}
+
+/// Moves the next period to a time if it is further behind it than the tolerance. Never moves it back: the
+/// clock may have been set, and frames must stay in order.
+void Timeline::meet(Milliseconds time, Milliseconds tolerance) {
+  if (!epoch_) epoch_ = time - length_of(next_);
+  const Milliseconds late = time - time_of(next_);
+  if (late > tolerance)
+    next_ += std::llround(static_cast<double>(late) * rate_.numerator / rate_.denominator / 1000);
+}
+
+std::int64_t Timeline::place(std::int64_t offset) {
+  using Kind = recording::IndexEntry::Kind;
+  std::optional<Milliseconds> time = start_;
+  start_.reset();
+  bool gap = false;
+  for (; entry_ < index_->size() && (*index_)[entry_].offset <= offset; ++entry_) {
+    const recording::IndexEntry &entry = (*index_)[entry_];
+    gap = gap || entry.kind == Kind::gap || entry.kind == Kind::buffer;
+    if (gap || (entry.kind == Kind::intra && entry.offset == offset)) time = entry.time;
+  }
+  if (time) meet(*time, gap ? length_of(1) / 2 : std::max(kJitter, length_of(2)));
+  return next_++;
+}
+
+}  // namespace clips

@@ -1,0 +1,48 @@
+/**
+ * @file timeline.h
+ * Places frames in time. Time is counted in periods of the frame rate: in an uninterrupted recording frames
+ * follow each other by one period; gaps take whole periods.
+ */
+#ifndef EXPORT_TIMELINE_H
+#define EXPORT_TIMELINE_H
+
+#include <optional>
+#include <vector>
+
+#include "recording/frame_rates.h"
+#include "recording/index.h"
+#include "wall_time.h"
+
+namespace clips {
+
+class Timeline {
+ public:
+  explicit Timeline(recording::FrameRate rate) : rate_(rate) {}
+
+  /// The next frames come from another file. `index` must stay valid; `start` is when its first frame was
+  /// recorded, if known.
+  void begin_file(const std::vector<recording::IndexEntry> &index, std::optional<Milliseconds> start);
+
+  /// Returns the number of the period that shows the next frame, which is at an offset of the file.
+  std::int64_t place(std::int64_t offset);
+  /// Leaves out the periods of frames that are lost.
+  void skip(std::size_t frames) { next_ += static_cast<std::int64_t>(frames); }
+
+  /// Returns when a period begins.
+  Milliseconds time_of(std::int64_t period) const { return epoch_.value_or(0) + length_of(period); }
+  Milliseconds length_of(std::int64_t periods) const;
+
+ private:
+  void meet(Milliseconds time, Milliseconds tolerance);
+
+  recording::FrameRate rate_;
+  const std::vector<recording::IndexEntry> *index_ = nullptr;
+  std::size_t entry_ = 0;              ///< the first entry that is not used yet
+  std::optional<Milliseconds> start_;  ///< of a file without an index, until its first frame is placed
+  std::optional<Milliseconds> epoch_;  ///< when period 0 begins
+  std::int64_t next_ = 0;
+};
+
+}  // namespace clips
+
+#endif
