@@ -6,15 +6,15 @@
 ROOT=$FOLDER/Data
 VIDEO=$ROOT/Video/20261125/CH03
 AUDIO=$ROOT/Audio/20261125/CH02
-STREAM=$FOLDER/stream
+RECORDED=$FOLDER/stream
 mkdir -p "$VIDEO" "$AUDIO"
 
 # record OPTION...: a stream of channel 3, and where its groups begin in it.
 record() {
-  rm -rf "$STREAM" && "${ON_CARD[@]}" "$ZARVO_RECORD" --channels 3 --audio 2 --output "$STREAM" "$@" >/dev/null 2>&1 || true
-  mv "$STREAM"/ch03.* "$STREAM/video"
-  mapfile -t GROUPS_AT < <(LC_ALL=C grep -obUaP '\x00\x00\x01\x00\x00\x00\x01\x20|\xff\xd8\xff\xdb' "$STREAM/video" | cut -d : -f 1)
-  GROUPS_AT+=("$(stat -c %s "$STREAM/video")")
+  rm -rf "$RECORDED" && "${ON_CARD[@]}" "$ZARVO_RECORD" --channels 3 --audio 2 --output "$RECORDED" "$@" >/dev/null 2>&1 || true
+  mv "$RECORDED"/ch03.* "$RECORDED/video"
+  mapfile -t GROUPS_AT < <(LC_ALL=C grep -obUaP '\x00\x00\x01\x00\x00\x00\x01\x20|\xff\xd8\xff\xdb' "$RECORDED/video" | cut -d : -f 1)
+  GROUPS_AT+=("$(stat -c %s "$RECORDED/video")")
 }
 
 # header CODEC WIDTH HEIGHT RATE: the header of a recording.
@@ -28,7 +28,7 @@ header() {
   printf 'Channel 3\0\0\0\0\0\0\0'
 }
 
-bytes() { head -c "${GROUPS_AT[$2]}" "$STREAM/video" | tail -c +$((GROUPS_AT[$1] + 1)); }
+bytes() { head -c "${GROUPS_AT[$2]}" "$RECORDED/video" | tail -c +$((GROUPS_AT[$1] + 1)); }
 
 # part NAME FIRST END: a recording of the groups from FIRST up to END, which is not in it.
 HEADER=(MPG4 352 240 30)
@@ -84,7 +84,7 @@ case $1 in
   range)
     record --seconds 9
     hour_tree
-    for hour in 13 14 14.1 15; do head -c 6000 "$STREAM/audio2.g726" >"$AUDIO/20261125-$hour.aud"; done
+    for hour in 13 14 14.1 15; do head -c 6000 "$RECORDED/audio2.g726" >"$AUDIO/20261125-$hour.aud"; done
     for type in mkv mp4; do
       clip=$FOLDER/clip.$type
       export_clip 0 "${RANGE[@]}" 15:30 --audio 2 "$clip"
@@ -104,7 +104,7 @@ case $1 in
       "$(entry a packet=pts_time "$FOLDER/clip.mkv" | sed -n '250p;251p;375p;376p' | paste -s -d ' ')"
     expect_equal "codec of the samples in mp4" aac "$(entry a stream=codec_name "$FOLDER/clip.mp4")"
     while read -r second expected; do
-      peak=$(ffmpeg -nostdin -i "$FOLDER/clip.mp4" -ss "$second" -t 0.5 -map 0:a -af volumedetect -f null - 2>&1 |
+      peak=$(ffmpeg -nostdin -i "$FOLDER/clip.mp4" -map 0:a -af "atrim=start=$second:duration=0.5,volumedetect" -f null - 2>&1 |
         sed -n 's/.*max_volume: \(.*\)\.. dB/\1/p')
       expect_equal "sound at $second s, $peak dB" "$expected" "$([ "$peak" -lt -60 ] && echo silent || echo loud)"
     done <<<$'9 loud\n100 silent\n3603 loud'
@@ -235,7 +235,7 @@ TABLE
 1|no recording header|"$0" "$FOLDER/clip.mkv"
 1|No such file or directory|"$file" "$FOLDER/missing/clip.mkv"
 TABLE
-    expect_equal "files left behind" "Data errors out stream" "$(ls "$FOLDER" | paste -s -d ' ')"
+    expect_equal "files left behind" "Data errors out stream" "$(cd "$FOLDER" && echo *)"
 
     export_clip 0 "$file" "$FOLDER/clip.mkv"
     export_clip 1 "$file" "$FOLDER/clip.mkv"
@@ -251,6 +251,6 @@ TABLE
     # shellcheck disable=SC2046 # words
     (ulimit -f 100 && trap '' XFSZ && export_clip 1 $(yes "$file" | head -n 5) "$FOLDER/long.mkv")
     says 'File too large'
-    expect_equal "files left behind" "Data clip.mkv errors out stream" "$(ls "$FOLDER" | paste -s -d ' ')"
+    expect_equal "files left behind" "Data clip.mkv errors out stream" "$(cd "$FOLDER" && echo *)"
     ;;
 esac
