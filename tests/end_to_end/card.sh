@@ -21,6 +21,9 @@ show_log() {
   expect "no state" grep -qx 'standard NTSC' <(card state)
   expect "a wrong item is not refused" grep -q 'expected: channels 1-16' <(card lost=17 2>&1 || true)
   expect_equal "kicks in the counters" 0 "$(card --json counters | sed -n 's/.*"kicks": \([0-9]*\).*/\1/p')"
+  card snapshot 3 "$FOLDER/three.png"
+  expect_equal "size of the snapshot" 720x480 "$(identify -format %wx%h "$FOLDER/three.png")"
+  ! card snapshot 3 "$FOLDER/none/three.png" 2>/dev/null || die "a snapshot that cannot be written counts as done"
   wait # the log ends with the card
   expect "the socket is left over" test ! -e "$FOLDER/card"
   expected='SET_SCALE channel=2 value=2|SET_GOP channel=2 value=30|ENC_IOC_START = 0|SET_SCALE channel=2 value=0|ENC_IOC_STOP = 0|encoder close = 0'
