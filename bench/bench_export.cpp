@@ -68,6 +68,7 @@ struct Cost {
 
 Cost run(std::vector<std::string> words) {
   std::vector<char *> arguments;
+  arguments.reserve(words.size() + 1);
   for (std::string &word : words) arguments.push_back(word.data());
   arguments.push_back(nullptr);
   const auto start = std::chrono::steady_clock::now();

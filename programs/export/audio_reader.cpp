@@ -19,29 +19,42 @@ Milliseconds start_of(const Recording &audio, const std::vector<Recording> &vide
   return *audio.hour;
 }
 
+std::int64_t blocks_of(const Recording &audio) {
+  return static_cast<std::int64_t>(std::filesystem::file_size(audio.path) / kBlockBytes);
+}
+
 }  // namespace
 
-Milliseconds AudioReader::File::end() const {
-  return start + blocks * kBlockLength;
+std::vector<Stretch> audio_stretches(const std::vector<Recording> &audio,
+                                     const std::vector<Recording> &video) {
+  std::vector<Stretch> stretches;
+  const Recording *before = nullptr;
+  for (const Recording &recording : audio) {
+    // A video file begins with an intra frame, so the audio of a new hour is there first.
+    const bool goes_on = recording.part == 0 && before != nullptr && before->number == recording.number &&
+                         std::abs(stretches.back().to - *recording.hour) <= kSameRun;
+    const Milliseconds start = goes_on ? *recording.hour : start_of(recording, video);
+    stretches.push_back({start, start + blocks_of(recording) * kBlockLength});
+    before = &recording;
+  }
+  return stretches;
 }
 
 AudioReader::AudioReader(const std::vector<Recording> &audio, const std::vector<Recording> &video,
                          Report &report) {
-  for (const Recording &recording : audio) {
-    const auto bytes = static_cast<std::size_t>(std::filesystem::file_size(recording.path));
-    if (bytes % kBlockBytes != 0) report.skipped(recording.path + ": the last block is torn");
-    // A video file begins with an intra frame, so the audio of a new hour is there first.
-    const bool goes_on =
-        recording.part == 0 && !files_.empty() && std::abs(files_.back().end() - *recording.hour) <= kSameRun;
-    files_.push_back({recording.path, goes_on ? *recording.hour : start_of(recording, video),
-                      static_cast<std::int64_t>(bytes / kBlockBytes)});
+  const std::vector<Stretch> stretches = audio_stretches(audio, video);
+  for (std::size_t i = 0; i < audio.size(); ++i) {
+    files_.push_back({audio[i].path, stretches[i], blocks_of(audio[i])});
+    if (std::filesystem::file_size(audio[i].path) % kBlockBytes != 0)
+      report.skipped(audio[i].path + ": the last block is torn: skipped");
   }
 }
 
 void AudioReader::seek(Milliseconds time) {
   file_ = 0;
-  while (file_ < files_.size() && files_[file_].end() <= time) ++file_;
-  const Milliseconds into = file_ < files_.size() ? std::max<Milliseconds>(time - files_[file_].start, 0) : 0;
+  while (file_ < files_.size() && files_[file_].recorded.to <= time) ++file_;
+  const Milliseconds into =
+      file_ < files_.size() ? std::max<Milliseconds>(time - files_[file_].recorded.from, 0) : 0;
   block_ = (into + kBlockLength - 1) / kBlockLength;
   stream_.close();
 }
@@ -54,7 +67,7 @@ bool AudioReader::next(AudioBlock &block, Milliseconds until) {
   }
   if (file_ == files_.size()) return false;
   const File &file = files_[file_];
-  block.time = file.start + block_ * kBlockLength;
+  block.time = file.recorded.from + block_ * kBlockLength;
   if (block.time >= until) return false;
   if (!stream_.is_open()) {
     stream_.open(file.path, std::ios::binary);

@@ -15,6 +15,11 @@
 
 namespace clips {
 
+/// Returns when each audio file was recorded. They have no index: the video files of the same hour tell when
+/// one begins, its length when it ends. The audio files are in order.
+std::vector<Stretch> audio_stretches(const std::vector<Recording> &audio,
+                                     const std::vector<Recording> &video);
+
 struct AudioBlock {
   Milliseconds time = 0;
   std::array<char, kBlockBytes> data{};
@@ -22,7 +27,7 @@ struct AudioBlock {
 
 class AudioReader {
  public:
-  /// Audio files have no index: the video files beside them tell when each began.
+  /// See audio_stretches(). Reports blocks that are torn.
   AudioReader(const std::vector<Recording> &audio, const std::vector<Recording> &video, Report &report);
 
   /// Goes on at the first block that begins at a time or behind it.
@@ -33,9 +38,8 @@ class AudioReader {
  private:
   struct File {
     std::string path;
-    Milliseconds start;
+    Stretch recorded;
     std::int64_t blocks;
-    Milliseconds end() const;
   };
 
   std::vector<File> files_;

@@ -69,7 +69,7 @@ void draw_axis(Drawing &drawing, const Stretch &span, double bottom) {
 
 void draw_row(Drawing &drawing, const ListedRecording &row, double y) {
   const Contents &contents = row.contents;
-  const bool known = !row.recording.index.empty();
+  const bool known = row.is_known();
   drawing.bar(contents.recorded, y, kBar, known ? kRecorded : kNoIndex,
               title_of(contents.recorded) + (known ? "" : ", no index"));
   for (const Stretch &motion : contents.motion)
@@ -122,7 +122,8 @@ void draw(const std::vector<ListedRecording> &rows, const std::string &file, boo
   std::ofstream stream(output.path());
   stream << "<svg xmlns='http://www.w3.org/2000/svg' width='" << kLeft + kWidth + 40 << "' height='"
          << bottom + 10
-         << "' font-family='sans-serif' font-size='12'>\n<rect width='100%' height='100%' fill='white'/>\n"
+         << "' stroke='none' font-family='sans-serif' font-size='12'>\n<rect width='100%' height='100%' "
+            "fill='white'/>\n"
          << drawing.content() << "</svg>\n";
   if (!stream.flush()) throw std::runtime_error(file + ": cannot be written");
   output.commit();

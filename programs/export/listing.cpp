@@ -6,7 +6,7 @@
 #include <iostream>
 #include <nlohmann/json.hpp>
 
-#include "aac_encoder.h"
+#include "audio_reader.h"
 
 namespace clips {
 namespace {
@@ -26,15 +26,9 @@ Json as_json(const std::vector<Stretch> &stretches) {
   return list;
 }
 
-ListedRecording listed(Recording recording, bool video) {
-  ListedRecording row{std::move(recording), video, {}};
-  if (!row.recording.index.empty()) {
-    row.contents = contents_of(row.recording.index);
-    return row;
-  }
-  const Milliseconds hour = *row.recording.hour;
-  row.contents.recorded = {hour, hour + kHour};
-  return row;
+ListedRecording listed(const Recording &recording) {
+  if (!recording.index.empty()) return {recording, true, contents_of(recording.index)};
+  return {recording, true, {{*recording.hour, *recording.hour + kHour}, {}, {}}};
 }
 
 }  // namespace
@@ -46,15 +40,16 @@ Milliseconds total(const std::vector<Stretch> &stretches) {
 }
 
 std::vector<ListedRecording> list_recordings(const Options &options) {
+  using recording::Kind;
+  const auto video = find_recordings(options.root, Kind::video, options.channel, options.range);
   std::vector<ListedRecording> rows;
-  for (const bool video : {true, false}) {
-    if (!video && (options.channel != 0 || !std::filesystem::is_directory(options.root + "/Audio"))) continue;
-    const auto kind = video ? recording::Kind::video : recording::Kind::audio;
-    for (Recording &recording : find_recordings(options.root, kind, options.channel, options.range)) {
-      ListedRecording row = listed(std::move(recording), video);
-      if (row.contents.recorded.overlaps(options.range)) rows.push_back(std::move(row));
-    }
+  for (const Recording &recording : video) rows.push_back(listed(recording));
+  if (options.channel == 0 && std::filesystem::is_directory(options.root + "/Audio")) {
+    const auto audio = find_recordings(options.root, Kind::audio, 0, options.range);
+    const auto stretches = audio_stretches(audio, video);
+    for (std::size_t i = 0; i < audio.size(); ++i) rows.push_back({audio[i], false, {stretches[i], {}, {}}});
   }
+  std::erase_if(rows, [&](const auto &row) { return !row.contents.recorded.overlaps(options.range); });
   return rows;
 }
 
@@ -65,11 +60,13 @@ void print_table(const std::vector<ListedRecording> &rows) {
     const auto &[recorded, motion, gaps, lost] = row.contents;
     std::printf("%-11s %-19s  %-19s ", name_of(row).c_str(), local_text(recorded.from).c_str(),
                 local_text(recorded.to).c_str());
+    const std::string length = row.is_known() ? length_text(recorded.to - recorded.from) : "no index";
+    std::printf("%9s ", length.c_str());
     if (row.recording.index.empty())
-      std::printf("%9s %9s %6s %9s", row.video ? "no index" : "", "", "", "");
+      std::printf("%9s %6s %9s", "", "", "");
     else
-      std::printf("%9s %9s %6zu %9s", length_text(recorded.to - recorded.from).c_str(),
-                  length_text(total(motion)).c_str(), gaps.size(), length_text(total(gaps)).c_str());
+      std::printf("%9s %6zu %9s", length_text(total(motion)).c_str(), gaps.size(),
+                  length_text(total(gaps)).c_str());
     std::printf("  %s%s\n", row.recording.path.c_str(),
                 lost > 0 ? (", " + std::to_string(lost) + " frames lost").c_str() : "");
   }
@@ -81,7 +78,7 @@ void print_json(const std::vector<ListedRecording> &rows) {
     Json item;
     item[row.video ? "channel" : "audio"] = row.recording.number;
     item["file"] = row.recording.path;
-    item["index"] = !row.recording.index.empty();
+    if (row.video) item["index"] = !row.recording.index.empty();
     item["from"] = local_text(row.contents.recorded.from);
     item["to"] = local_text(row.contents.recorded.to);
     if (!row.recording.index.empty()) {

@@ -17,7 +17,10 @@ namespace clips {
 struct ListedRecording {
   Recording recording;
   bool video;
-  Contents contents;  ///< without an index the whole clock hour
+  Contents contents;  ///< of video without an index the whole clock hour
+
+  /// Whether the times are those of the recording.
+  bool is_known() const { return !video || !recording.index.empty(); }
 };
 
 std::vector<ListedRecording> list_recordings(const Options &options);

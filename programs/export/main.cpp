@@ -33,10 +33,15 @@ int list(const Options &options) {
 /// Names the clock hours of a stretch that have no recording.
 void report_missing_hours(const std::vector<Recording> &found, const Stretch &range, const std::string &what,
                           Report &report) {
+  const auto is_missing = [&](Milliseconds hour) {
+    return hour < range.to &&
+           std::ranges::none_of(found, [hour](const Recording &r) { return r.hour == hour; });
+  };
   for (Milliseconds hour = hour_of(range.from); hour < range.to; hour += kHour) {
-    const auto holds = [&](const Recording &recording) { return recording.hour == hour; };
-    if (std::ranges::none_of(found, holds))
-      report.skipped("no recording of " + what + " in the hour of " + local_text(hour));
+    const Milliseconds first = hour;
+    while (is_missing(hour)) hour += kHour;
+    if (hour > first)
+      report.skipped("no recording of " + what + " from " + local_text(first) + " to " + local_text(hour));
   }
 }
 
