@@ -1,0 +1,107 @@
+// Theme load: nothing is lost with all channels, audio and preview, nor when the host pauses.
+#include <cmath>
+#include <map>
+
+#include "bench.h"
+#include "check.h"
+#include "streams.h"
+
+namespace contract {
+namespace {
+
+constexpr double kFrames = 30000.0 / 1001;
+constexpr double kBlocks = 62.5;
+
+u32 channel_of(const Mpeg4Read &frame) {
+  return frame.head.channel;
+}
+u32 channel_of(const MjpegRead &picture) {
+  return picture.descriptor.channel;
+}
+u32 channel_of(const OtherRead &) {
+  return 0;
+}
+
+/// Expects as many reads on each channel as its rate gives from the first read to the end, but a few that may
+/// still be on their way.
+template <typename Read>
+Result complete(const DriverCapture &capture, const std::vector<Read> &reads, double rate, double allowed) {
+  std::map<u32, std::size_t> counts;
+  for (const Read &each : reads) ++counts[channel_of(each)];
+  if (reads.empty()) return broken("data", "none");
+  const double least = (capture.end - reads.front().time) * rate - allowed;
+  for (const auto &[channel, count] : counts)
+    if (static_cast<double>(count) < least)
+      return broken(words("at least ", std::floor(least), " of each channel"),
+                    words(count, " of channel ", channel + 1));
+  return held();
+}
+
+/// The time stamps tell lost frames from frames that the host has read late.
+Result no_lost_frame(const DriverCapture &capture) {
+  constexpr double kTwoPeriods = 2 / kFrames + 0.002;
+  std::map<u32, double> last;
+  for (const Mpeg4Read &frame : capture.mpeg4) {
+    const auto [before, first] = last.try_emplace(frame.head.channel, frame.stamp);
+    const double gap = frame.stamp - before->second;
+    if (!first && gap > kTwoPeriods)
+      return broken(words("at most ", kTwoPeriods, " s between frames"),
+                    words(gap, " s on channel ", frame.head.channel + 1));
+    before->second = frame.stamp;
+  }
+  return last.empty() ? broken("frames", "none") : held();
+}
+
+constexpr double kOnTheWay = 6;
+
+Result preview_rate(Bench &bench) {
+  const auto &reads = bench.full_load().preview;
+  std::size_t pictures = 0;
+  for (std::size_t n = 1; n < reads.size(); ++n) pictures += reads[n].index != reads[n - 1].index ? 1 : 0;
+  const double expected = (bench.full_load().end - bench.full_load().start) * kFrames;
+  return expect(static_cast<double>(pictures) > expected * 0.9 - kOnTheWay,
+                words("about ", expected, " pictures"), pictures);
+}
+
+struct Row {
+  const char *name;
+  const char *proves;
+  const char *meaning;
+  Result (*run)(Bench &bench);
+};
+constexpr const char *kLost = "Recordings of all cameras have gaps.";
+constexpr const char *kPaused = "A busy machine loses frames sooner than it should.";
+constexpr Row kRows[] = {
+    {"channels", "All sixteen channels deliver frames at the same time.", kLost,
+     [](Bench &bench) {
+       return channels_seen(bench.full_load(), bench.full_load().mpeg4,
+                            [](const Mpeg4Read &frame) { return channel_of(frame); });
+     }},
+    {"mpeg4.gap", "No gap between the time stamps of a channel is longer than two periods.", kLost,
+     [](Bench &bench) { return no_lost_frame(bench.full_load()); }},
+    {"mpeg4.complete", "No MPEG-4 frame is missing.", kLost,
+     [](Bench &bench) { return complete(bench.full_load(), bench.full_load().mpeg4, kFrames, kOnTheWay); }},
+    {"mjpeg.complete", "No Motion-JPEG picture is missing.", kLost,
+     [](Bench &bench) { return complete(bench.full_load(), bench.full_load().mjpeg, kFrames, kOnTheWay); }},
+    {"audio.complete", "No audio block is missing.", "Sound and picture drift apart.",
+     [](Bench &bench) {
+       return complete(bench.full_load(), bench.full_load().audio, kBlocks, 2 * kOnTheWay);
+     }},
+    {"preview.rate", "The preview keeps its rate.", "The preview stutters while all cameras are recorded.",
+     preview_rate},
+    {"pause.mpeg4", "No frame is lost when the host does not read for 0.2 seconds.", kPaused,
+     [](Bench &bench) { return no_lost_frame(bench.after_pause()); }},
+    {"pause.mjpeg", "No picture is lost when the host does not read for 0.2 seconds.", kPaused,
+     [](Bench &bench) { return complete(bench.after_pause(), bench.after_pause().mjpeg, kFrames, 3); }},
+    {"pause.audio", "No audio block is lost when the host does not read for 0.2 seconds.", kPaused,
+     [](Bench &bench) { return complete(bench.after_pause(), bench.after_pause().audio, kBlocks, 5); }},
+};
+
+}  // namespace
+
+void add_load(Checks &checks) {
+  for (const Row &row : kRows)
+    checks.push_back({words("load.", row.name), row.proves, row.meaning, true, row.run});
+}
+
+}  // namespace contract

@@ -1,0 +1,146 @@
+// Records with the SDK.
+#include "recording.h"
+
+#include <algorithm>
+#include <chrono>
+
+#include "bench.h"
+#include "check.h"
+#include "programs/common/card.h"
+
+namespace contract {
+namespace {
+
+Recording *running;  ///< the callbacks have no argument for it
+
+void keep(Track &track, const u8 *data, i32 length, i32 flags) {
+  track.push_back({monotonic_seconds(), static_cast<u32>(flags), {data, data + length}});
+}
+void on_mpeg4(u32 channel, u8 *data, i32 length, i32 flags) {
+  keep(running->mpeg4.at(channel), data, length, flags);
+}
+void on_mjpeg(u32 channel, u8 *data, i32 length, i32 flags) {
+  keep(running->mjpeg.at(channel), data, length, flags);
+}
+void on_audio(u32 channel, u8 *data, i32 length, i32 flags) {
+  keep(running->audio.at(channel), data, length, flags);
+}
+
+constexpr ZV_VIDEO_CONFIG cif() {
+  ZV_VIDEO_CONFIG config{};
+  config.scale = SCALE_ZV_CIF;
+  config.gop = 30;
+  config.qp = 8;
+  return config;
+}
+
+Setup rates(u32 standard, bool quick) {
+  Setup setup;
+  setup.standard = standard;
+  setup.seconds = quick ? 4 : 12;
+  const u32 count = standard == VIDEO_STANDARD_ZV_NTSC ? 16 : 15;
+  for (u32 n = 0; n < count; ++n) {
+    setup.config[n] = cif();
+    setup.config[n].interval = static_cast<ZV_INTERVAL_VALUE>(n);
+  }
+  return setup;
+}
+
+Setup settings() {
+  Setup setup;
+  setup.seconds = 5;
+  for (u32 n = 0; n <= kTwoFieldChannel; ++n) setup.config[n] = cif();
+  for (u32 n = 0; n < kGroupLengths.size(); ++n) setup.config[n].gop = kGroupLengths[n];
+  for (u32 n = 0; n < kBitRates.size(); ++n) {
+    setup.config[kFirstBitRate + n].CBRValue = kBitRates[n];
+    setup.config[kFirstBitRate + n].CBREnable = 1;
+  }
+  setup.config[kTwoFieldChannel].twofield = TWOFIELD_ENABLE;
+  return setup;
+}
+
+Setup quality(u32 step) {
+  Setup setup;
+  setup.seconds = 1.5;
+  for (u32 n = 0; n < kQualityChannels; ++n) {
+    setup.config[n] = cif();
+    setup.config[n].mjpeg = VIDEO_CODEC_ZV_MJPEG;  // only these channels set the quality
+    setup.config[n].qp = kQuantisers.at(step);
+    setup.config[n].jpeg_qp = static_cast<ZV_JPEG_QUALITY>(step);
+  }
+  return setup;
+}
+
+Setup sizes(u32 standard, u32 resolution) {
+  Setup setup{standard, resolution, 1.5, {}};
+  for (u32 n = 0; n < SCALE_ZV_D1; ++n) {
+    setup.config[n] = cif();
+    setup.config[n].scale = static_cast<ZV_SCALE_VALUE>(n + 1);
+  }
+  return setup;
+}
+
+/// Stops capture, whatever happens while it exists.
+struct Capture {
+  HANDLE card;
+
+  ~Capture() {
+    zv_Stop(card);
+    running = nullptr;
+  }
+};
+
+}  // namespace
+
+double monotonic_seconds() {
+  return std::chrono::duration<double>(std::chrono::steady_clock::now().time_since_epoch()).count();
+}
+
+double rate_of(const Track &track) {
+  if (track.size() < 3) return 0;
+  return static_cast<double>(track.size() - 1) / (track.back().time - track.front().time);
+}
+
+double bytes_of(const Track &track) {
+  double bytes = 0;
+  for (const Frame &frame : track) bytes += static_cast<double>(frame.data.size());
+  return bytes;
+}
+
+double longest_gap(const Track &track) {
+  double gap = 0;
+  for (std::size_t n = 1; n < track.size(); ++n) gap = std::max(gap, track[n].time - track[n - 1].time);
+  return gap;
+}
+
+Setup setup_named(const std::string &name, bool quick) {
+  if (name == "rates-ntsc") return rates(VIDEO_STANDARD_ZV_NTSC, quick);
+  if (name == "rates-pal") return rates(VIDEO_STANDARD_ZV_PAL, quick);
+  if (name == "settings") return settings();
+  if (name.starts_with("quality-")) return quality(static_cast<u32>(name.back() - '0'));
+  return sizes(name.starts_with("size-pal") ? VIDEO_STANDARD_ZV_PAL : VIDEO_STANDARD_ZV_NTSC,
+               name.ends_with("704") ? RESOLUTION_ZV_704 : RESOLUTION_ZV_720);
+}
+
+Recording record(HANDLE card, const Setup &setup) {
+  Recording recording;
+  u32 mask = 0;
+  for (u32 n = 0; n < ZV_CHANNELS; ++n) {
+    if (setup.config[n].scale == SCALE_ZV_NO_ENCODE) continue;
+    mask |= 1u << n;
+    check(zv_SetVideoEncodeConfig(card, n, &setup.config[n]), "zv_SetVideoEncodeConfig");
+  }
+  const Capture capture{card};
+  running = &recording;
+  check(zv_EnableVideoRecordChannels(card, mask), "zv_EnableVideoRecordChannels");
+  check(zv_EnableAudioChannels(card, 0xF), "zv_EnableAudioChannels");
+  check(zv_RegisterCallBack(card, on_mpeg4, on_mjpeg, on_audio), "zv_RegisterCallBack");
+  check(zv_Start(card), "zv_Start");
+  recording.start = monotonic_seconds();
+  pause_for(setup.seconds);
+  check(zv_Stop(card), "zv_Stop");
+  recording.seconds = monotonic_seconds() - recording.start;
+  return recording;
+}
+
+}  // namespace contract

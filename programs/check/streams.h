@@ -1,0 +1,70 @@
+/**
+ * @file streams.h
+ * What the checks of all streams have in common.
+ */
+#ifndef CONTRACT_STREAMS_H
+#define CONTRACT_STREAMS_H
+
+#include <algorithm>
+#include <map>
+
+#include "check.h"
+#include "driver_capture.h"
+
+namespace contract {
+
+/// An encoded size: a channel of a recording, and what its pictures must be like.
+struct SizeCase {
+  std::string name;  ///< e.g. pal.704.d1
+  std::string recording;
+  u32 channel;
+  u32 width, height;
+  bool interlaced;
+  bool quick;
+  std::string meaning;
+};
+std::vector<SizeCase> size_cases();
+
+/// Expects that no read of a stream has failed. The number is the index in DriverCapture::errors.
+Result no_read_error(const DriverCapture &capture, std::size_t stream);
+
+/// Expects the first read with data within half a second.
+template <typename Read>
+Result starts_soon(const DriverCapture &capture, const std::vector<Read> &reads) {
+  constexpr double kSoon = 0.5;
+  if (reads.empty()) return broken("data", "none");
+  const double delay = reads.front().time - capture.start;
+  return expect(delay < kSoon, words("less than ", kSoon, " s"), delay, " s");
+}
+
+/// Expects reads from all encoded channels and from no others.
+template <typename Read, typename ChannelOf>
+Result channels_seen(const DriverCapture &capture, const std::vector<Read> &reads, ChannelOf channel_of) {
+  u32 seen = 0;
+  for (const Read &each : reads) {
+    const u32 channel = channel_of(each);
+    if (channel >= ZV_CHANNELS) return broken("a channel from 0 to 15", words(channel));
+    seen |= 1u << channel;
+  }
+  return expect(seen == capture.channels, words("channel mask 0x", std::hex, capture.channels), "0x",
+                std::hex, seen);
+}
+
+/// Expects no long pause between the reads of a channel.
+template <typename Read, typename ChannelOf>
+Result no_gap(const std::vector<Read> &reads, ChannelOf channel_of) {
+  constexpr double kLongest = 0.4;
+  std::map<u32, double> last;
+  double longest = 0;
+  for (const Read &each : reads) {
+    const auto [before, first] = last.try_emplace(channel_of(each), each.time);
+    if (!first) longest = std::max(longest, each.time - before->second);
+    before->second = each.time;
+  }
+  if (last.empty()) return broken("data", "none");
+  return expect(longest < kLongest, words("less than ", kLongest, " s"), longest, " s");
+}
+
+}  // namespace contract
+
+#endif
