@@ -197,7 +197,7 @@ void add_regions(Checks &checks) {
   for (const Refused &row : kRefused)
     checks.push_back(
         {words("boundary.region.", row.name, "-is-refused"), row.proves, kUnsafe, true,
-         [&row = row](Bench &bench) { return refuses_mapping(bench, row.node, row.size, row.protection); }});
+         [row](Bench &bench) { return refuses_mapping(bench, row.node, row.size, row.protection); }});
 }
 
 }  // namespace
