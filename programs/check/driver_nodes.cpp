@@ -23,7 +23,7 @@ std::string advice(int error) {
       return "the driver has no card: plug the card in";
     case EACCES:
     case EPERM:
-      return "no permission: run as root, or become a member of the group of the node";
+      return "no permission: run as root, or become a member of the group that the node belongs to (ls -l)";
     case EBUSY:
       return "another program uses the card: end it first";
     default:

@@ -135,7 +135,7 @@ std::FILE *report_stream() {
 int run(const Options &options) {
   const Checks checks = selected(options);
   catch_stop_signals();
-  Bench bench(options.quick, options.quick ? std::min(options.seconds, 4u) : options.seconds);
+  Bench bench(options.quick, options.quick ? std::min(options.seconds, 3u) : options.seconds);
   const std::unique_ptr<std::FILE, int (*)(std::FILE *)> out(report_stream(), std::fclose);
   Report report(out.get(), options.json, checks.size());
   const std::string bail_out = run_all(checks, bench, report);

@@ -25,7 +25,7 @@ bool scene_moves(const Image &one, const Image &other) {
 }
 
 Series take_series(Bench &bench) {
-  constexpr double kSettle = 0.7, kLook = 0.7;
+  constexpr double kSettle = 0.5, kLook = 0.4;
   constexpr ZV_RECT kWhole{0, 0, 720, 480};
   HANDLE card = bench.sdk(VIDEO_STANDARD_ZV_NTSC, RESOLUTION_ZV_720);
   const u32 cameras = bench.cameras();

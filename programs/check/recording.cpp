@@ -37,7 +37,7 @@ constexpr ZV_VIDEO_CONFIG cif() {
 Setup rates(u32 standard, bool quick) {
   Setup setup;
   setup.standard = standard;
-  setup.seconds = quick ? 4 : 12;
+  setup.seconds = quick ? 3 : 12;
   const u32 count = standard == VIDEO_STANDARD_ZV_NTSC ? 16 : 15;
   for (u32 n = 0; n < count; ++n) {
     setup.config[n] = cif();
@@ -48,7 +48,7 @@ Setup rates(u32 standard, bool quick) {
 
 Setup settings() {
   Setup setup;
-  setup.seconds = 5;
+  setup.seconds = 4;
   for (u32 n = 0; n <= kTwoFieldChannel; ++n) setup.config[n] = cif();
   for (u32 n = 0; n < kGroupLengths.size(); ++n) setup.config[n].gop = kGroupLengths[n];
   for (u32 n = 0; n < kBitRates.size(); ++n) {

@@ -46,8 +46,8 @@ struct Setup {
 };
 
 // What the channels of the recording "settings" are for.
-inline constexpr std::array<u32, 3> kGroupLengths{1, 5, 30};             // channels 0-2
-inline constexpr std::array<i32, 3> kBitRates{256000, 512000, 1000000};  // channels 3-5
+inline constexpr std::array<u32, 3> kGroupLengths{1, 5, 30};            // channels 0-2
+inline constexpr std::array<i32, 3> kBitRates{128000, 192000, 256000};  // channels 3-5
 inline constexpr u32 kFirstBitRate = 3;
 inline constexpr u32 kTwoFieldChannel = 6;
 // What the recordings "quality-0" to "quality-2" are for.

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <cstdlib>
 #include <nlohmann/json.hpp>
 
 namespace contract {
@@ -31,7 +32,9 @@ Report::Report(std::FILE *out, bool json, std::size_t checks)
       terminal_(isatty(STDERR_FILENO) != 0),
       checks_(checks),
       document_(std::make_unique<nlohmann::json>(nlohmann::json{{"checks", nlohmann::json::array()}})) {
-  if (!json_) std::fprintf(out_, "TAP version 14\n1..%zu\n", checks);
+  // The prove of Debian 12 refuses version 14. The report uses nothing that version 13 lacks.
+  const int version = std::getenv("HARNESS_ACTIVE") != nullptr ? 13 : 14;
+  if (!json_) std::fprintf(out_, "TAP version %d\n1..%zu\n", version, checks);
 }
 
 Report::~Report() = default;

@@ -81,7 +81,7 @@ torn=mjpeg:5|mjpeg.size.ntsc.720.*|mjpeg
 torn=audio:5|STREAMS|audio
 bits=mpeg4:40|mpeg4.size.ntsc.720.*|mpeg4
 bits=mjpeg:40|mjpeg.size.ntsc.720.*|mjpeg
-silent=2;bits=audio:40|audio.silence|audio
+silent=2;bits=audio:400|audio.silence|audio
 nointra=mpeg4|STREAMS|mpeg4
 noeoi=mjpeg|STREAMS|mjpeg
 type=mpeg4:3|STREAMS|mpeg4

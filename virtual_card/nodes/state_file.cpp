@@ -66,10 +66,13 @@ void add_encoder(Lines &lines, u32 channel, const EncoderSettings &encoder) {
 }
 
 void add_registers(Lines &lines, const BoardSettings &settings) {
-  for (const auto &[address, value] : settings.codec.words())
-    lines.add(driver::DISP_IOC_WRITE_REG, driver::Register{address, value});
-  for (const auto &[address, value] : settings.video_input.words())
-    lines.add(driver::VIN_IOC_WRITE_REG, driver::Register{address, value});
+  // A register that was never written and one that holds its power-up value again are the same state.
+  const auto add_changed = [&](u32 code, const RegisterFile &chip, const RegisterFile &at_power_up) {
+    for (const auto &[address, value] : chip.words())
+      if (value != at_power_up.read(address)) lines.add(code, driver::Register{address, value});
+  };
+  add_changed(driver::DISP_IOC_WRITE_REG, settings.codec, codec_at_power_up());
+  add_changed(driver::VIN_IOC_WRITE_REG, settings.video_input, video_input_at_power_up());
   for (u8 chip = 0; chip < driver::kDecoderChips; ++chip)
     for (unsigned address = 0; address < DecoderChips::kRegisters; ++address)
       if (const auto value = settings.decoders.written(chip, address))
