@@ -2,6 +2,7 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstring>
 
 #include "bench.h"
 #include "check.h"
@@ -89,7 +90,9 @@ void add_addresses(Checks &checks) {
           {words("boundary.", null ? "null" : "bad", "-address.", row.name, "-is-EFAULT"),
            words("A record at ", null ? "the null address" : "an address without memory", " is refused."),
            "A wrong program stops the machine instead of itself.", true, [&row, null](Bench &bench) {
-             void *const nowhere = reinterpret_cast<void *>(std::uintptr_t{null ? 0u : 64u});
+             void *nowhere = nullptr;
+             const std::uintptr_t bad = 64;
+             if (!null) std::memcpy(&nowhere, &bad, sizeof nowhere);
              return refuses(bench.nodes(), row.node, row.code, nowhere, EFAULT);
            }});
   checks.push_back({"boundary.motion-map.null-thresholds-are-EFAULT",

@@ -26,7 +26,7 @@ run_all() {
   cannot_run 'zarvo_g723_0.*no such node' 'fail=audio/open:ENOENT'
   cannot_run 'another program uses the card' 'fail=display/open:EBUSY'
 
-  prove --exec "${ON_CARD[*]}" "$ZARVO_CHECK" :: --quick || die "prove does not accept the output, or a check fails"
+  prove --verbose --exec "${ON_CARD[*]}" "$ZARVO_CHECK" :: --quick || die "prove does not accept the output, or a check fails"
   check --json --only 'nodes.*' >"$FOLDER/json"
   expect_equal "broken checks in the JSON" 0 "$(grep -c '"outcome": "broken"' "$FOLDER/json")"
   expect_equal "themes in the JSON" 1 "$(grep -c '"themes"' "$FOLDER/json")"
