@@ -15,7 +15,7 @@ constexpr Milliseconds kSameRun = 2000;
 
 Milliseconds start_of(const Recording &audio, const std::vector<Recording> &video) {
   for (const Recording &beside : video)
-    if (beside.hour == audio.hour && beside.part == audio.part) return beside.start().value_or(*audio.hour);
+    if (beside.hour == audio.hour && beside.part == audio.part) return beside.start.value_or(*audio.hour);
   return *audio.hour;
 }
 

@@ -13,9 +13,6 @@ namespace fs = std::filesystem;
 using recording::IndexEntry;
 using Kind = IndexEntry::Kind;
 
-/// The dialog puts the first seconds of an hour at the end of the file before.
-constexpr Milliseconds kLateChange = 60000;
-
 /// Reads a whole number of decimal digits.
 std::optional<int> number_in(std::string_view digits) {
   int number = 0;
@@ -62,6 +59,8 @@ void read_index_of(Recording &recording) {
   if (std::ranges::none_of(recording.index,
                            [](const IndexEntry &entry) { return entry.kind == Kind::intra; }))
     recording.index.clear();
+  else
+    recording.start = recording.index.front().time;
 }
 
 std::vector<fs::path> entries_of(const fs::path &folder) {
@@ -80,11 +79,6 @@ void append(std::vector<Stretch> &stretches, const Stretch &stretch) {
 }
 
 }  // namespace
-
-std::optional<Milliseconds> Recording::start() const {
-  if (!index.empty()) return index.front().time;
-  return part == 0 ? hour : std::nullopt;
-}
 
 Recording recording_at(const std::string &path) {
   Recording recording = named(fs::absolute(path));

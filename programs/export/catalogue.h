@@ -15,6 +15,9 @@
 
 namespace clips {
 
+/// The dialog puts the first seconds of an hour at the end of the file before.
+inline constexpr Milliseconds kLateChange = 60000;
+
 /// A recording: a part of a clock hour of a channel or of an audio input.
 struct Recording {
   std::string path;
@@ -22,9 +25,7 @@ struct Recording {
   std::optional<Milliseconds> hour;          ///< the clock hour of its name; none for another name
   unsigned part = 0;                         ///< 0 for the first file of the hour
   std::vector<recording::IndexEntry> index;  ///< empty if there is none
-
-  /// Returns when the first frame was recorded: by the index, else the hour's start for the first part.
-  std::optional<Milliseconds> start() const;
+  std::optional<Milliseconds> start;         ///< when the first frame was recorded, by the index
 };
 
 /// Returns a recording with its index; of its path, the last two names may tell channel and hour.

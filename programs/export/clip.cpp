@@ -14,26 +14,6 @@ namespace {
 /// Bytes of the MPEG-4 stream header in front of each intra frame.
 constexpr std::size_t kStreamHeader = 20;
 
-recording::FrameRate rate_of(const RECORD_FILE_HEADER &header, const Recording &recording, bool two_fields) {
-  const auto standard = header.record_height % 240 == 0 ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL;
-  std::string label = recording::frame_rate_label(header);
-  if (!recording.index.empty() && recording.index.front().kind == recording::IndexEntry::Kind::start) {
-    label = recording.index.front().rate;
-    two_fields = recording.index.front().fields == 2;
-  }
-  recording::FrameRate rate = recording::exact_frame_rate(standard, 0).value();
-  const char *const *const labels = recording::frame_rate_list(standard);
-  for (std::size_t row = 0; labels[row] != nullptr; ++row)
-    if (labels[row] == label) rate = recording::exact_frame_rate(standard, row).value();
-  if (two_fields) rate.numerator *= 2;
-  return rate;
-}
-
-bool same(const VideoFormat &a, const VideoFormat &b) {
-  return a.codec == b.codec && a.width == b.width && a.height == b.height &&
-         a.rate.numerator == b.rate.numerator && a.rate.denominator == b.rate.denominator;
-}
-
 /// Returns the offset of the last intra frame at or before a time; 0 without an index.
 std::int64_t intra_before(const Recording &recording, Milliseconds time) {
   std::int64_t offset = 0;
@@ -54,7 +34,7 @@ Clip::Clip(const Options &options, std::vector<Stretch> stretches, AudioReader *
 void Clip::add(const Recording &recording) try {
   StreamReader reader(recording.path);
   if (!accept(recording, reader)) return;
-  timeline_->begin_file(recording.index, recording.start());
+  timeline_->begin_file(recording.index, recording.start);
   Group group;
   bool seek = true;
   while (!stopping && stretch_ < stretches_.size()) {
@@ -72,9 +52,7 @@ void Clip::add(const Recording &recording) try {
 
 /// Returns whether a recording has the format of the clip.
 bool Clip::accept(const Recording &recording, const StreamReader &reader) {
-  const RECORD_FILE_HEADER &header = reader.header();
-  const VideoFormat format{reader.codec(), header.record_width, header.record_height,
-                           rate_of(header, recording, options_.two_fields)};
+  const VideoFormat format = format_of(reader, recording, options_.two_fields);
   if (format_ && !same(*format_, format)) {
     report_.skipped(recording.path +
                     ": skipped, its size, codec or rate is not that of the recordings before");
@@ -82,7 +60,7 @@ bool Clip::accept(const Recording &recording, const StreamReader &reader) {
   }
   if (format_) return true;
   format_ = format;
-  label_ = recording::label_of(header);
+  label_ = recording::label_of(reader.header());
   timeline_.emplace(format.rate);
   checker_.emplace(format.codec);
   return true;
@@ -170,7 +148,7 @@ void Clip::begin_stretch(const Recording &recording, const Group &group) {
     const auto header = group.data.first(std::min(kStreamHeader, group.sizes[0]));
     stream_header_.assign(header.begin(), header.end());
   }
-  const bool dated = recording.start().has_value();
+  const bool dated = recording.start.has_value();
   ClipFormat format{*format_, stream_header_, options_.output.ends_with(".mp4"), audio_ != nullptr, "", {}};
   if (dated) format.created = begin;
   format.title = label_ + (dated ? ", " + local_text(begin) : "");

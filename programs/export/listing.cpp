@@ -43,6 +43,7 @@ std::vector<ListedRecording> list_recordings(const Options &options) {
   using recording::Kind;
   const auto video = find_recordings(options.root, Kind::video, options.channel, options.range);
   std::vector<ListedRecording> rows;
+  rows.reserve(video.size());
   for (const Recording &recording : video) rows.push_back(listed(recording));
   if (options.channel == 0 && std::filesystem::is_directory(options.root + "/Audio")) {
     const auto audio = find_recordings(options.root, Kind::audio, 0, options.range);

@@ -67,12 +67,32 @@ std::vector<Stretch> motion_in(std::vector<Recording> &recordings, const Stretch
   return stretches;
 }
 
+/// Tells when recordings without an index began, as well as that can be known.
+void estimate_starts(std::vector<Recording> &recordings, const Options &options, Report &report) {
+  for (Recording &recording : recordings) {
+    if (recording.start) continue;
+    const char *by = "by the time of the file";
+    recording.start = start_by_file_time(recording, options.two_fields);
+    // Files that the user names follow each other.
+    const bool follows = recording.part > 0 || (!options.files.empty() && &recording != recordings.data());
+    if (!recording.start && !follows) {
+      recording.start = recording.hour;
+      by = "the start of its hour";
+    }
+    if (recording.start)
+      report.note(recording.path + " has no index: its times count from " + local_text(*recording.start) +
+                  ", " + by);
+  }
+}
+
 std::vector<Recording> recordings_of(const Options &options, Report &report) {
   std::vector<Recording> found;
   for (const std::string &file : options.files) found.push_back(recording_at(file));
-  if (!options.files.empty()) return found;
-  found = find_recordings(options.root, recording::Kind::video, options.channel, options.range);
-  report_missing_hours(found, options.range, "channel " + std::to_string(options.channel), report);
+  if (options.files.empty()) {
+    found = find_recordings(options.root, recording::Kind::video, options.channel, options.range);
+    report_missing_hours(found, options.range, "channel " + std::to_string(options.channel), report);
+  }
+  estimate_starts(found, options, report);
   return found;
 }
 
@@ -88,11 +108,7 @@ int make_clip(const Options &options) {
   std::vector<Stretch> stretches{options.range};
   if (options.motion) stretches = motion_in(recordings, options.range, report);
   Clip clip(options, stretches, audio.get(), report);
-  for (const Recording &recording : recordings) {
-    if (recording.index.empty() && recording.start())
-      report.note(recording.path + " has no index: its times count from " + local_text(*recording.start()));
-    clip.add(recording);
-  }
+  for (const Recording &recording : recordings) clip.add(recording);
   clip.finish();
   return report.complete() ? 0 : kIncomplete;
 }

@@ -13,17 +13,10 @@
 
 #include "aac_encoder.h"
 #include "libav.h"
-#include "recording/frame_rates.h"
-#include "recording/header.h"
+#include "video_format.h"
 #include "wall_time.h"
 
 namespace clips {
-
-struct VideoFormat {
-  ZV_VIDEO_CODEC codec;
-  int width, height;
-  recording::FrameRate rate;
-};
 
 struct ClipFormat {
   VideoFormat video;

@@ -116,8 +116,13 @@ case $1 in
     # Recordings by name, without indexes: one after the other.
     rm "$VIDEO"/*.idx
     export_clip 0 "$VIDEO"/20261125-14.rec "$VIDEO"/20261125-14.1.rec "$FOLDER/files.mp4"
-    says '14.rec has no index: its times count from 2026-11-25 14:00:00'
+    says '14.rec has no index: its times count from 2026-11-25 14:00:00, the start of its hour'
     expect_equal "frames of two files" "$(source_hashes 2 6)" "$(hashes -i "$FOLDER/files.mp4")"
+    # The dialog was started at 15:29:58 and stopped two seconds later.
+    touch -d '2026-11-25 15:30:00' "$VIDEO/20261125-15.rec"
+    export_clip 0 --root "$ROOT" --channel 3 --from '2026-11-25 15:29:59' --to 15:35 "$FOLDER/dialog.mkv"
+    expect_equal "frames of the last second" "$(source_hashes 7 8)" "$(hashes -i "$FOLDER/dialog.mkv")"
+    expect_equal "date of the dialog's" 2026-11-25T15:29:58.999000Z "$(entry v format_tags=creation_time "$FOLDER/dialog.mkv")"
     expect_equal "rate of two files" 30000/1001 "$(entry v stream=avg_frame_rate "$FOLDER/files.mp4")"
     ;;
 
