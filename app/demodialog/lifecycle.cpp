@@ -9,13 +9,14 @@
 #include <utility>
 
 #include "app_state.h"
+#include "control_texts.h"
 #include "demodialog.h"
+#include "manners.h"
 #include "preview_thread.h"
 #include "zv_lib.h"
 
 namespace {
 
-constexpr QSize kLeastSize(728, 780);
 constexpr int kTestPasses = 10;
 
 // Opens and closes the card several times before it is used: a card that can be opened only once is of no
@@ -53,9 +54,11 @@ DemoDialog::DemoDialog(QWidget *parent, const char *name, bool modal, unsigned i
   setModal(modal);
   setupUi(this);
   form_fit.emplace(*this);
+  new Manners(*this);
   if (name != nullptr) setObjectName(QString::fromUtf8(name));  // also an empty name
   languageChange();
-  resize(kLeastSize.expandedTo(minimumSizeHint()));
+  form_fit->shrink_into(FormFit::room_on(*screen()));
+  resize(form_fit->least_size());
   init();
 }
 
@@ -70,6 +73,7 @@ void DemoDialog::languageChange() {
     if (combo != comboFrameRate) chosen.emplace_back(combo, combo->currentIndex());
   for (const auto &[combo, index] : chosen) refill(combo);
   retranslateUi(this);
+  set_control_texts(*this);
   for (const auto &[combo, index] : chosen) combo->setCurrentIndex(index);
   form_fit->fit();
 }

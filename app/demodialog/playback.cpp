@@ -8,6 +8,7 @@
 #include <string>
 
 #include "demodialog.h"
+#include "manners.h"
 
 namespace {
 
@@ -70,7 +71,9 @@ void DemoDialog::Playback() {
   const QByteArray path = choose_recording(this);
   if (!path.isEmpty()) {
     const char *const player = path.contains(".rec") ? "./Videoplayer " : "./Audioplayer ";
+    paint_all(*this);
     if (std::system((player + shell_word(path)).c_str()) == -1) std::puts("Playback error!");
+    drop_queued_input();
   }
   UpdateUI(PLAYBACK_STOP);
 }

@@ -1,8 +1,10 @@
 // Enables and disables widgets when an activity starts or stops.
+#include <optional>
 #include <vector>
 
 #include "app_state.h"
 #include "demodialog.h"
+#include "manners.h"
 
 namespace {
 
@@ -11,28 +13,22 @@ struct Row {
   const char *effect;  // one character for each UI_STATUS
 };
 
-// Enables or disables the widgets of a row as a character of its effect says.
-void apply(const Row &row, char sign) {
-  bool on = false;
+// Returns what a character of an effect means: true enables, false disables, no value changes nothing.
+std::optional<bool> meaning_of(char sign) {
   switch (sign) {
     case '+':
-      on = true;
-      break;
+      return true;
     case '-':
-      break;
+      return false;
     case 'r':
-      on = g_finish_record != 0;
-      break;
+      return g_finish_record != 0;
     case 'p':
-      on = g_finish_preview != 0;
-      break;
+      return g_finish_preview != 0;
     case 'a':
-      on = g_channel_mode != ENABLE_AUDIO;
-      break;
+      return g_channel_mode != ENABLE_AUDIO;
     default:
-      return;
+      return std::nullopt;
   }
-  for (QWidget *widget : row.widgets) widget->setEnabled(on);
 }
 
 }  // namespace
@@ -60,5 +56,15 @@ void DemoDialog::UpdateUI(UI_STATUS status) {
   };
   const auto column = static_cast<unsigned int>(status);
   if (column > MOTION_STOP) return;
-  for (const Row &row : table) apply(row, row.effect[column]);
+  const std::vector<StartStop> partners = {
+      {btnPreviewStart, btnPreviewStop}, {btnRecordStart, btnRecordStop}, {btnMotionStart, btnMotionStop}};
+  for (const bool on : {true, false}) {  // enable first, so that a partner can take the focus
+    for (const Row &row : table) {
+      if (meaning_of(row.effect[column]) != on) continue;
+      for (QWidget *widget : row.widgets) {
+        if (!on) pass_focus(partners, widget);
+        widget->setEnabled(on);
+      }
+    }
+  }
 }

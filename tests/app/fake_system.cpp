@@ -24,6 +24,7 @@ unsigned sleep(unsigned seconds) {
 }
 
 int system(const char *command) {
+  if (fake_system::while_playing) fake_system::while_playing();
   return fake_system::shell_broken ? -1 : real("system", system)(command);
 }
 }

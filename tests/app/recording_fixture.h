@@ -11,6 +11,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <functional>
 #include <iterator>
 #include <set>
 
@@ -23,6 +24,7 @@ inline std::atomic<time_t> clock_now;  // read by the capture threads too
 inline std::atomic<unsigned> slept;
 inline unsigned long disk_blocks, disk_free;
 inline bool shell_broken;
+inline std::function<void()> while_playing;
 }  // namespace fake_system
 
 inline std::time_t at(const char *local_time) {

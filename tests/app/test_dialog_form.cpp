@@ -91,6 +91,7 @@ using FormTest = DialogTestOf<ListeningDialog>;
 
 void use(QWidget *widget) {
   widget->setEnabled(true);
+  if (qobject_cast<QPushButton *>(widget) != nullptr) return QTest::keyClick(widget, Qt::Key_Return);
   if (auto *button = qobject_cast<QAbstractButton *>(widget)) return button->click();
   if (qobject_cast<QLineEdit *>(widget) != nullptr) return QTest::keyClicks(widget, "7\r");
   QTest::keyClick(widget, qobject_cast<QSlider *>(widget) != nullptr ? Qt::Key_Left : Qt::Key_End);
@@ -205,6 +206,20 @@ TEST_F(DialogTest, ClipsNothingAtAnyFontAndSize) {
   EXPECT_NE(dialog->btnGetShield->geometry(), place);
   dialog->setFont(font);
   EXPECT_EQ(dialog->btnGetShield->geometry(), place);
+}
+
+TEST_F(DialogTest, ShrinksIntoALowScreenWithoutClipping) {
+  for (const QSize room : {QSize(1366, 728), QSize(960, 500)}) {
+    dialog.reset();
+    dialog = std::make_unique<OpenDialog>();
+    FormFit fit(*dialog);
+    fit.shrink_into(room);
+    EXPECT_EQ(fit.least_size().expandedTo(room), room);
+    EXPECT_GT(fit.least_size().height(), room.height() - 20);  // no smaller than necessary
+    dialog->resize(fit.least_size());
+    dialog->show();
+    expect_nothing_clipped(dialog.get());
+  }
 }
 
 // Catches: a widget that keeps the state in which something else has left it.

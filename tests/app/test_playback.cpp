@@ -2,6 +2,7 @@
 #include <sys/wait.h>
 
 #include <QFileDialog>
+#include <QMouseEvent>
 #include <QTimer>
 
 #include "recording/header.h"
@@ -72,6 +73,25 @@ TEST_F(Playback, TheChosenFileReachesItsPlayerAsOneArgument) {
   EXPECT_FALSE(fs::exists("played"));
   fake_system::shell_broken = true;
   EXPECT_EQ(play(here / "a.rec"), "Playback error!\n");
+}
+
+TEST_F(Playback, ClicksAndKeysThatComeWhileThePlayerRunsAreDropped) {
+  write_program("Videoplayer", "");
+  std::ofstream("a.rec") << "x";
+  fake_system::while_playing = [this] {
+    const QPointF middle(dialog->btnSplit4->rect().center());
+    for (const auto type : {QEvent::MouseButtonPress, QEvent::MouseButtonRelease})
+      QApplication::postEvent(dialog->btnSplit4,
+                              new QMouseEvent(type, middle, middle, Qt::LeftButton, Qt::LeftButton, {}));
+    for (const auto type : {QEvent::KeyPress, QEvent::KeyRelease})
+      QApplication::postEvent(dialog->btnSplit9, new QKeyEvent(type, Qt::Key_Space, {}));
+  };
+  play(fs::current_path() / "a.rec");
+  QApplication::processEvents();
+  EXPECT_EQ(zv_mode, MUX_MODE_ZV_1CH);
+  std::exchange(fake_system::while_playing, nullptr)();  // the same input later
+  QApplication::processEvents();
+  EXPECT_EQ(zv_mode, MUX_MODE_ZV_9CH);
 }
 
 std::string record_header(const char *tag, int lines, int rate) {
