@@ -7,11 +7,11 @@ OPERATOR_FOLDER=   # display number and logs; removed at the end
 DIALOG=            # X window of the dialog
 declare -A WIDGET=()  # object name to "x y" in the dialog
 
-# open_display: starts an X server with an invisible screen, and a window manager on it.
+# open_display: starts an X server with an invisible screen (SCREEN, or 1680x1200), and a window manager on it.
 open_display() {
   OPERATOR_FOLDER=$(mktemp -d)
   trap close_display EXIT
-  Xvfb -displayfd 3 -screen 0 1680x1200x24 -nolisten tcp 3>"$OPERATOR_FOLDER/display" >"$OPERATOR_FOLDER/xvfb.log" 2>&1 &
+  Xvfb -displayfd 3 -screen 0 "${SCREEN:-1680x1200}x24" -nolisten tcp 3>"$OPERATOR_FOLDER/display" >"$OPERATOR_FOLDER/xvfb.log" 2>&1 &
   XVFB=$!
   wait_until 120 test -s "$OPERATOR_FOLDER/display" || die "Xvfb did not start: $(cat "$OPERATOR_FOLDER/xvfb.log")"
   DISPLAY=:$(cat "$OPERATOR_FOLDER/display")
@@ -126,3 +126,13 @@ rate_near() { local rate; rate=$(preview_rate) && [ "$rate" -ge $(($1 - 2)) ] &&
 
 # files_closed: whether the program has closed all its recordings.
 files_closed() { [ -z "$(find "/proc/$DEMO/fd" -lname '*.rec')" ]; }
+
+# dark_theme FOLDER: lets programs that start from now on use a dark theme, which it writes to the folder.
+dark_theme() {
+  local group
+  for group in Window View Button Tooltip Selection; do
+    printf '[Colors:%s]\nBackgroundNormal=35,38,41\nBackgroundAlternate=49,54,59\nForegroundNormal=239,240,241\n' "$group"
+    printf 'ForegroundLink=41,128,185\nForegroundVisited=127,140,141\n\n'
+  done >"$1/kdeglobals"
+  export XDG_CURRENT_DESKTOP=KDE KDE_FULL_SESSION=true KDE_SESSION_VERSION=5 XDG_CONFIG_HOME=$1
+}
