@@ -8,6 +8,7 @@
 #include <string>
 
 #include "demodialog/demodialog.h"
+#include "light_palette.h"
 #include "sdl.h"
 
 namespace {
@@ -62,9 +63,7 @@ int main(int argc, char **argv) {
     return 2;
   }
   std::setlocale(LC_NUMERIC, "C");  // printed numbers must not depend on the locale
-  // Two groups of the form have black text. Use the light palette of the style, since a dark theme would make
-  // that text unreadable.
-  QApplication::setPalette(QApplication::style()->standardPalette());
+  QApplication::setPalette(light_palette(QApplication::style()->standardPalette()));
   DemoDialog *dialog = new DemoDialog;
   dialog->show();
   QApplication::exec();

@@ -44,8 +44,9 @@ struct Factors {
   }
 };
 
-bool has_indicator(const QWidget *child) {
-  return child->inherits("QCheckBox") || child->inherits("QRadioButton");
+/// Whether a part of the widget has a fixed size: an indicator or the handle of a slider.
+bool has_fixed_part(const QWidget *child) {
+  return child->inherits("QCheckBox") || child->inherits("QRadioButton") || child->inherits("QSlider");
 }
 
 QSize room_for_text(const QWidget *child, double scale) {
@@ -63,6 +64,7 @@ QSize room_for_text(const QWidget *child, double scale) {
   if (const auto *box = qobject_cast<const QAbstractButton *>(child)) {
     QStyleOptionButton option;
     option.initFrom(box);
+    option.text = box->text();  // with a text there is a gap beside the indicator
     const auto contents =
         qobject_cast<const QRadioButton *>(child) != nullptr ? QStyle::CT_RadioButton : QStyle::CT_CheckBox;
     const QSize shown = text(box->text());
@@ -109,8 +111,8 @@ void FormFit::fit() {
   for (const Group &group : groups_) {
     for (const auto &[widget, place] : group.children) {
       const QRect now = factors.stretched(place);
-      // An indicator has a fixed size. On a low screen it may be higher than its place.
-      const int lacking = has_indicator(widget) ? widget->sizeHint().height() - now.height() : 0;
+      // On a low screen the fixed part may be higher than its place.
+      const int lacking = has_fixed_part(widget) ? widget->sizeHint().height() - now.height() : 0;
       widget->setGeometry(lacking > 0 ? now.adjusted(0, -lacking / 2, 0, lacking - lacking / 2) : now);
     }
     group.box->setMinimumSize(factors.stretched(group.size));

@@ -6,8 +6,10 @@
 #include <QTest>
 #include <QTranslator>
 #include <algorithm>
+#include <cmath>
 
 #include "dialog_fixture.h"
+#include "light_palette.h"
 
 namespace {
 
@@ -163,6 +165,40 @@ TEST_F(DialogTest, AnotherLanguageReplacesEachTextAndKeepsTheChoices) {
             "~Tarn Demo~\"1:Half-D1\"  \"2:CIF\"  \"9:D1\"");
   EXPECT_EQ(text_of(dialog->comboQualityMode), "~None,~CIF,~Half-D1,~D1");
   EXPECT_EQ(dialog->comboCBRValue->currentText() + dialog->comboFrameRate->currentText(), "~1M24");
+}
+
+// How much two colours differ for the eye: 1 (not at all) to 21.
+double contrast(const QColor &one, const QColor &other) {
+  const auto light = [](const QColor &colour) {
+    const auto part = [](double value) {
+      return value <= 0.03928 ? value / 12.92 : std::pow((value + 0.055) / 1.055, 2.4);
+    };
+    return 0.2126 * part(colour.redF()) + 0.7152 * part(colour.greenF()) + 0.0722 * part(colour.blueF());
+  };
+  const auto [dark, bright] = std::minmax({light(one), light(other)});
+  return (bright + 0.05) / (dark + 0.05);
+}
+
+TEST_F(DialogTest, EveryTextCanBeReadUnderADarkTheme) {
+  const QPalette before = QApplication::palette();
+  QApplication::setPalette(light_palette(QPalette(Qt::black, Qt::black)));
+  for (const QWidget *widget : dialog->findChildren<QWidget *>()) {
+    if (!widget->isEnabled()) continue;
+    const std::string name = widget->objectName().toStdString();
+    const QPalette &colours = widget->palette();
+    const auto of = [&](auto text, auto ground) {
+      return contrast(colours.color(text), colours.color(ground));
+    };
+    // Red and orange titles are as dark as their colours allow.
+    const bool title = widget == dialog->RecordGroup || widget == dialog->MotionGroup;
+    EXPECT_GE(of(QPalette::WindowText, QPalette::Window), title ? 3 : 4.5) << name;
+    EXPECT_GE(of(QPalette::ButtonText, QPalette::Button), 4.5) << name;
+    if (!is_group(widget)) {
+      EXPECT_GE(of(QPalette::Text, QPalette::Base), 4.5) << name;
+    }
+    EXPECT_GE(of(QPalette::HighlightedText, QPalette::Highlight), 4.5) << name;
+  }
+  QApplication::setPalette(before);
 }
 
 // What of a label is seen is its text; the labels of the form reach under their neighbours.
