@@ -7,8 +7,8 @@
 
 #include <QPalette>
 
-/// Returns the style's palette if its ground is light, else a light one: the form has texts in fixed dark
-/// colours, which nobody can read on the ground of a dark theme.
+/// Returns the style's palette if its ground is light, otherwise a light palette: the form has texts in fixed
+/// colours that are unreadable on the ground of a dark theme. Selected text has a dark ground in both.
 QPalette light_palette(const QPalette &of_style);
 
 #endif

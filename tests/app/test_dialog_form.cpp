@@ -181,7 +181,9 @@ double contrast(const QColor &one, const QColor &other) {
 
 TEST_F(DialogTest, EveryTextCanBeReadUnderADarkTheme) {
   const QPalette before = QApplication::palette();
+  dialog.reset();
   QApplication::setPalette(light_palette(QPalette(Qt::black, Qt::black)));
+  dialog = std::make_unique<OpenDialog>();
   for (const QWidget *widget : dialog->findChildren<QWidget *>()) {
     if (!widget->isEnabled()) continue;
     const std::string name = widget->objectName().toStdString();
