@@ -191,10 +191,13 @@ TEST_F(DialogTest, EveryTextCanBeReadUnderADarkTheme) {
     const auto of = [&](auto text, auto ground) {
       return contrast(colours.color(text), colours.color(ground));
     };
+    if (qobject_cast<const QPushButton *>(widget) != nullptr) {
+      EXPECT_GE(of(QPalette::ButtonText, QPalette::Button), 4.5) << name;
+      continue;
+    }
     // Red and orange titles are as dark as their colours allow.
     const bool title = widget == dialog->RecordGroup || widget == dialog->MotionGroup;
     EXPECT_GE(of(QPalette::WindowText, QPalette::Window), title ? 3 : 4.5) << name;
-    EXPECT_GE(of(QPalette::ButtonText, QPalette::Button), 4.5) << name;
     if (!is_group(widget)) {
       EXPECT_GE(of(QPalette::Text, QPalette::Base), 4.5) << name;
     }
