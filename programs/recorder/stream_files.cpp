@@ -99,6 +99,12 @@ void StreamFiles::queue(const Ring::Taken &taken) {
   queue_.push_back(taken);
 }
 
+bool StreamFiles::has_frame_of(std::int64_t time) const {
+  constexpr std::int64_t kSecond = 1000;
+  return !queue_.empty() &&
+         (queue_.front().frame->time <= time || queue_.front().frame->time > time + kSecond);
+}
+
 int StreamFiles::write() {
   while (!queue_.empty()) {
     const Frame &first = *queue_.front().frame;
@@ -232,8 +238,7 @@ int StreamFiles::sync() {
     close(file);
   }
   retired_.clear();
-  sync_file(file_);
-  sync_file(index_.file());
+  sync_file(file_);  // an index is synced at its end: a recording is good without the last lines
   if (folder_changed_) sync_folders();
   folder_changed_ = false;
   struct stat at_path {

@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
+#include <limits>
 #include <set>
 
 #include "disk_space.h"
@@ -15,9 +16,10 @@
 namespace recorder {
 namespace {
 
-/// How long the writer sleeps between two passes. A kill loses the frames of at most one such pause. Longer
-/// pauses make larger writes.
-constexpr auto kPause = std::chrono::milliseconds(40);
+/// A frame waits this long for the next, so that one write takes both: a write costs more than what it
+/// writes. A kill loses frames of at most this time and one pause.
+constexpr std::int64_t kWaitMs = 34;
+constexpr auto kPause = std::chrono::milliseconds(14);
 constexpr auto kRetry = std::chrono::seconds(10);
 constexpr auto kSpaceCheck = std::chrono::seconds(1);
 
@@ -73,7 +75,8 @@ void Writer::pass(Clock::time_point now) {
   if (now >= next_space_check_) check_space(now);
   take_frames(intake_.video());
   take_frames(intake_.audio());
-  for (auto &output : outputs_) write(*output, now);
+  const std::int64_t due = ending_ ? std::numeric_limits<std::int64_t>::max() : wall_ms() - kWaitMs;
+  for (auto &output : outputs_) write(*output, now, due);
   make_room(intake_.video(), true);
   make_room(intake_.audio(), false);
   for (auto &output : outputs_) {
@@ -97,8 +100,8 @@ void Writer::take_frames(Ring &ring) {
   }
 }
 
-void Writer::write(Output &output, Clock::time_point now) {
-  if (full_ || now < output.next_try) return;
+void Writer::write(Output &output, Clock::time_point now, std::int64_t due) {
+  if (full_ || now < output.next_try || !output.files.has_frame_of(due)) return;
   const int error = output.files.write();
   if (error != 0) {
     report_error(output, error);
@@ -130,7 +133,8 @@ void Writer::make_room(Ring &ring, bool video) {
   std::uint64_t oldest = taken;
   for (auto &output : outputs_) {
     if (is_video(output->stream) != video || output->files.all_written()) continue;
-    if (taken > half) output->files.drop_until(taken - half);
+    const bool held = full_ || output->error != 0;
+    if (held && taken > half) output->files.drop_until(taken - half);
     if (!output->files.all_written()) oldest = std::min(oldest, output->files.oldest());
   }
   ring.release(oldest);

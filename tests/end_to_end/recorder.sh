@@ -69,7 +69,7 @@ expect_whole() {
 }
 
 # index_sum KEY PATTERN: the sum of a key in the index lines with the pattern.
-index_sum() { files idx -print0 | tr '\n' '\0' | xargs -0 cat | grep -- "$2" | grep -o "\"$1\":[0-9]*" | awk -F : '{ sum += $2 } END { print sum + 0 }'; }
+index_sum() { files idx | xargs cat | grep -- "$2" | grep -o "\"$1\":[0-9]*" | awk -F : '{ sum += $2 } END { print sum + 0 }'; }
 
 VIDEO_LOST=0
 set_clock '2026-11-25 14:10:00'
@@ -128,7 +128,7 @@ case $1 in
   # quarter of a second here. The next start goes on in new parts and leaves the others alone.
   kill)
     for ((round = 0; round < ${ZARVO_KILLS:-3}; ++round)); do
-      before=$(files rec -print0 | tr '\n' '\0' | xargs -0 -r sha256sum)
+      before=$(files rec | xargs -r sha256sum)
       ZARVO_VIRTUAL_CARD="log=$FOLDER/card.log" start
       sleep "0.$((RANDOM % 900 + 100))"
       kill -9 "$RECORDER"
