@@ -99,12 +99,6 @@ void StreamFiles::queue(const Ring::Taken &taken) {
   queue_.push_back(taken);
 }
 
-bool StreamFiles::has_frame_of(std::int64_t time) const {
-  constexpr std::int64_t kSecond = 1000;
-  return !queue_.empty() &&
-         (queue_.front().frame->time <= time || queue_.front().frame->time > time + kSecond);
-}
-
 int StreamFiles::write() {
   while (!queue_.empty()) {
     const Frame &first = *queue_.front().frame;

@@ -1,13 +1,13 @@
 // Takes frames from the buffer to the files, in large writes.
 #include "writer.h"
 
+#include <pthread.h>
 #include <signal.h>
 
 #include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
-#include <limits>
 #include <set>
 
 #include "disk_space.h"
@@ -16,10 +16,9 @@
 namespace recorder {
 namespace {
 
-/// A frame waits this long for the next, so that one write takes both: a write costs more than what it
-/// writes. A kill loses frames of at most this time and one pause.
-constexpr std::int64_t kWaitMs = 34;
-constexpr auto kPause = std::chrono::milliseconds(14);
+/// The time between two passes. A kill loses frames of at most this time. The longer it is, the more frames a
+/// write takes, and a write costs more than what it writes.
+constexpr auto kPeriod = std::chrono::milliseconds(48);
 constexpr auto kRetry = std::chrono::seconds(10);
 constexpr auto kSpaceCheck = std::chrono::seconds(1);
 
@@ -61,9 +60,10 @@ void Writer::finish() {
 }
 
 void Writer::run() {
-  while (!ending_) {
+  pthread_setname_np(pthread_self(), "writer");
+  for (Clock::time_point next = Clock::now(); !ending_; next = std::max(next + kPeriod, Clock::now())) {
+    std::this_thread::sleep_until(next);
     pass(Clock::now());
-    std::this_thread::sleep_for(kPause);
   }
   for (auto &output : outputs_) output->next_try = {};  // the last try
   full_ = false;
@@ -75,8 +75,7 @@ void Writer::pass(Clock::time_point now) {
   if (now >= next_space_check_) check_space(now);
   take_frames(intake_.video());
   take_frames(intake_.audio());
-  const std::int64_t due = ending_ ? std::numeric_limits<std::int64_t>::max() : wall_ms() - kWaitMs;
-  for (auto &output : outputs_) write(*output, now, due);
+  for (auto &output : outputs_) write(*output, now);
   make_room(intake_.video(), true);
   make_room(intake_.audio(), false);
   for (auto &output : outputs_) {
@@ -100,8 +99,8 @@ void Writer::take_frames(Ring &ring) {
   }
 }
 
-void Writer::write(Output &output, Clock::time_point now, std::int64_t due) {
-  if (full_ || now < output.next_try || !output.files.has_frame_of(due)) return;
+void Writer::write(Output &output, Clock::time_point now) {
+  if (full_ || now < output.next_try) return;
   const int error = output.files.write();
   if (error != 0) {
     report_error(output, error);

@@ -52,7 +52,7 @@ class Writer {
   void run();
   void pass(Clock::time_point now);
   void take_frames(Ring &ring);
-  void write(Output &output, Clock::time_point now, std::int64_t due);
+  void write(Output &output, Clock::time_point now);
   void make_room(Ring &ring, bool video);
   void sync(Output &output, Clock::time_point now);
   void report_error(Output &output, int error);
