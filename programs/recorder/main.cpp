@@ -4,6 +4,7 @@
 #include <atomic>
 #include <cstdio>
 #include <thread>
+#include <utility>
 
 #include "programs/common/command_line.h"
 #include "programs/common/stop_signal.h"

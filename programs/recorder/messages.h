@@ -6,30 +6,25 @@
 #ifndef RECORDER_MESSAGES_H
 #define RECORDER_MESSAGES_H
 
-#include <cstdio>
+#include <cstdint>
 #include <mutex>
 #include <string>
-#include <utility>
 #include <vector>
+
+#include "frame.h"
 
 namespace recorder {
 
+/// Returns a time in milliseconds since 1970 as local time, "2026-11-25 14:58:01".
+std::string time_text(std::int64_t time);
+
 class Messages {
  public:
-  /// Any thread. Keeps at most kMost lines until they are printed, and drops the others.
-  void add(std::string line) {
-    const std::lock_guard lock(mutex_);
-    if (lines_.size() < kMost) lines_.push_back(std::move(line));
-  }
+  /// Any thread. The line begins with the time of what it tells. Keeps at most kMost lines until they are
+  /// printed, and drops the others.
+  void add(const std::string &line, std::int64_t time = wall_ms());
 
-  void print() {
-    std::vector<std::string> lines;
-    {
-      const std::lock_guard lock(mutex_);
-      lines.swap(lines_);
-    }
-    for (const std::string &line : lines) std::fprintf(stderr, "zarvo_recorder: %s\n", line.c_str());
-  }
+  void print();
 
  private:
   static constexpr std::size_t kMost = 1000;

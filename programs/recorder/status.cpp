@@ -3,7 +3,6 @@
 
 #include <algorithm>
 #include <cstdio>
-#include <ctime>
 
 namespace recorder {
 namespace {
@@ -23,15 +22,6 @@ template <typename... Values>
 std::string format(const char *pattern, Values... values) {
   char text[256];
   std::snprintf(text, sizeof text, pattern, values...);
-  return text;
-}
-
-std::string wall_time() {
-  const std::time_t now = std::time(nullptr);
-  std::tm local{};
-  localtime_r(&now, &local);
-  char text[32];
-  std::strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &local);
   return text;
 }
 
@@ -85,7 +75,7 @@ std::string Status::line() const {
       100.0 * static_cast<double>(intake.video().used()) / static_cast<double>(intake.video().capacity());
   return format(
       "%s: %u of %u streams, %ju frames, %.0f MiB, %ju lost, %ju gaps, buffer %.0f %%, disk %.1f %% free",
-      wall_time().c_str(), streams - silent, streams, std::uintmax_t{frames},
+      time_text(wall_ms()).c_str(), streams - silent, streams, std::uintmax_t{frames},
       static_cast<double>(bytes) / kMiB, std::uintmax_t{lost}, std::uintmax_t{gaps}, used,
       recorder_.writer().free_percent());
 }

@@ -90,11 +90,12 @@ void Writer::take_frames(Ring &ring) {
     if (frame.gap_ms > 0) {
       char text[64];
       std::snprintf(text, sizeof text, ": gap of %.2f s", frame.gap_ms / 1000.0);
-      messages_.add(stream_name(frame.stream) + text);
+      messages_.add(stream_name(frame.stream) + text, frame.time);
     }
     if (frame.lost > 0)
       messages_.add(stream_name(frame.stream) + ": the buffer was full: " + std::to_string(frame.lost) +
-                    (is_video(frame.stream) ? " frames" : " blocks") + " are lost");
+                        (is_video(frame.stream) ? " frames" : " blocks") + " are lost",
+                    frame.time);
     by_stream_[frame.stream]->files.queue(taken);
   }
 }

@@ -42,6 +42,13 @@ Hashes hashes_of(const fs::path &folder, std::size_t header) {
   return hashes;
 }
 
+/// Returns the resident memory in MiB.
+double resident() {
+  double pages = 0, skipped = 0;
+  std::ifstream("/proc/self/statm") >> skipped >> pages;
+  return pages * static_cast<double>(sysconf(_SC_PAGESIZE)) / (1 << 20);
+}
+
 }  // namespace
 
 extern "C" {
@@ -79,10 +86,13 @@ TEST(RecorderNight, EveryByteIsInTheFiles) {
   {
     recorder::Recorder recording(options);
     recording.start();
+    double memory = 0;
     for (int hour = 0; hour <= kHours; ++hour) {
+      if (hour == 1) memory = resident();
       ahead = 3600 * hour;
       ASSERT_TRUE(delivered(static_cast<std::uint64_t>(kVideoRate * seconds * (hour + 1) / (kHours + 1))));
     }
+    EXPECT_LT(resident() - memory, 8) << "MiB more than after the first hour";
     const virtual_card::Counters counters = virtual_card::counters();
     recording.stop();
     EXPECT_EQ(counters.mpeg4.lost + counters.audio.lost, 0u);
