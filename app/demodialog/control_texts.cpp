@@ -135,9 +135,9 @@ void set_control_texts(const QWidget &dialog) {
     const QString digits = number.match(pattern).captured();
     pattern.replace(number, QStringLiteral("#"));
     for (const ControlText &text : kTexts) {
-      const bool numbered = pattern == QLatin1String(text.control);
-      if (!numbered && widget->objectName() != QLatin1String(text.control)) continue;
-      const QString name = numbered ? translated(text.name).arg(digits) : translated(text.name);
+      const QLatin1String control(text.control);
+      if (control != pattern && control != widget->objectName()) continue;
+      const QString name = translated(text.name).replace(QLatin1String("%1"), digits);
       const QString range = translated(text.range);
       widget->setAccessibleName(name);
       widget->setAccessibleDescription(range);

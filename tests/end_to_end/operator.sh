@@ -35,6 +35,7 @@ echo recording >"$FOLDER/work/a.rec"
 
 on_screen 1680x1200
 expect_equal "lines of the dialog on a large screen" 780 "$DIALOG_HEIGHT"
+expect_equal "first line of the program" "Zarvo Demo AP: zv_Open Success, test count = 10" "$(head -n 1 "$LOG")"
 
 # The wheel: a slider and a list without the focus stay as they are.
 click edtFocus
