@@ -210,6 +210,21 @@ tour_sizes() {
   close_program
 }
 
+# The dialog with a dark theme on a screen that is lower than the dialog: light, and smaller.
+tour_dark() {
+  say "The dialog with a dark theme on a screen of 1366 x 768"
+  mkdir -p "$TOUR/dark"
+  (
+    dark_theme "$TOUR/dark"
+    SCREEN=1366x768 # for open_display
+    open_display
+    start_program "$TOUR"
+    picture "$DIALOG" "$SHOTS/dialog-dark-theme.png"
+    close_program
+    close_display
+  )
+}
+
 run_tour() {
   local losses
   say "A scripted operator uses the program on an invisible display"
@@ -230,6 +245,7 @@ run_tour() {
   ! losses=$(grep '^virtual card: .* lost' "$LOG") || slow "$losses"
   tour_sizes
   close_display
+  tour_dark
 
   say "Picture-in-picture and zoom, with the example zarvo_motion"
   "${ON_CARD[@]}" "$BUILD/examples/zarvo_motion" "$RESULTS/zoom" || fail "zarvo_motion failed"
