@@ -13,6 +13,8 @@ namespace {
 
 /// Bytes of the MPEG-4 stream header in front of each intra frame.
 constexpr std::size_t kStreamHeader = 20;
+/// A clip that misses less than this at its ends has what was asked for.
+constexpr Milliseconds kNear = 1000;
 
 /// Returns the offset of the last intra frame at or before a time; 0 without an index.
 std::int64_t intra_before(const Recording &recording, Milliseconds time) {
@@ -144,6 +146,7 @@ void Clip::begin_stretch(const Recording &recording, const Group &group) {
   if (audio_ != nullptr) audio_->seek(begin);
   writing_ = true;
   if (muxer_ != nullptr) return;
+  begin_ = begin;
   if (format_->codec == VIDEO_CODEC_ZV_MPEG4) {
     const auto header = group.data.first(std::min(kStreamHeader, group.sizes[0]));
     stream_header_.assign(header.begin(), header.end());
@@ -169,6 +172,11 @@ void Clip::finish() {
   write_audio(timeline_->time_of(next_ + shift_));
   muxer_->finish();
   output_.commit();
+  const Milliseconds end = timeline_->time_of(next_ + shift_);
+  if (!options_.motion && begin_ > options_.range.from + kNear && options_.range.from > Stretch().from)
+    report_.note("nothing is recorded before " + local_text(begin_));
+  if (!options_.motion && end < options_.range.to - kNear && options_.range.to < Stretch().to)
+    report_.note("nothing is recorded after " + local_text(end));
   if (shown_ >= 0) std::fprintf(stderr, "\r%s  done\n", length_text(timeline_->length_of(next_)).c_str());
 }
 

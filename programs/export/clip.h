@@ -60,6 +60,7 @@ class Clip {
   bool writing_ = false;               ///< a part of the current stretch is written
   std::int64_t shift_ = 0;             ///< period of the recordings that is period 0 of the clip
   std::int64_t next_ = 0;              ///< where the clip ends, in its periods
+  Milliseconds begin_ = 0;             ///< when the first frame of the clip was recorded
   Milliseconds audio_shift_ = 0;       ///< the same shift in time
   Milliseconds shown_ = -1;            ///< the progress on the terminal
 };

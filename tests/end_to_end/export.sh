@@ -122,6 +122,8 @@ case $1 in
     touch -d '2026-11-25 15:30:00' "$VIDEO/20261125-15.rec"
     export_clip 0 --root "$ROOT" --channel 3 --from '2026-11-25 15:29:59' --to 15:35 "$FOLDER/dialog.mkv"
     expect_equal "frames of the last second" "$(source_hashes 7 8)" "$(hashes -i "$FOLDER/dialog.mkv")"
+    says 'nothing is recorded after 2026-11-25 15:30:00'
+    expect "a line about the start" test "$(grep -c before "$FOLDER/errors")" -eq 0
     expect_equal "date of the dialog's" 2026-11-25T15:29:58.999000Z "$(entry v format_tags=creation_time "$FOLDER/dialog.mkv")"
     expect_equal "rate of two files" 30000/1001 "$(entry v stream=avg_frame_rate "$FOLDER/files.mp4")"
     ;;
