@@ -6,6 +6,8 @@ set -euo pipefail
 . /test/tools/common.sh
 # shellcheck source=tools/streams.sh
 . /test/tools/streams.sh
+# shellcheck source=tools/operator.sh
+. /test/tools/operator.sh
 ON_CARD=(env LD_PRELOAD=libzarvo_virtual_card.so)
 NAMES=(libzarvo-sdk1 libzarvo-sdk-dev zarvo-virtual-card zarvo-tools zarvo-demo)
 
@@ -30,20 +32,16 @@ expect_no_missing_library() { ! ldd "$@" | grep 'not found' || die "a library is
 
 # The command of the menu entry opens the dialog and ends with it.
 open_dialog() {
-  local entry=/usr/share/applications/zarvo-demo.desktop dialog status=0
   local command
   say "Opening the dialog by the menu entry"
-  Xvfb :7 -screen 0 1680x1200x24 -nolisten tcp >/tmp/xvfb.log 2>&1 &
-  export DISPLAY=:7
-  wait_until 60 xprop -root || die "Xvfb did not start: $(cat /tmp/xvfb.log)"
-  openbox >/dev/null 2>&1 &
-  read -ra command <<<"$(sed -n 's/^Exec=//p' $entry)"
-  "${command[@]}" >/tmp/dialog.log 2>&1 </dev/null &
-  dialog=$!
-  wait_until 120 xdotool search --onlyvisible --name '^Tarn Demo$' || die "no dialog appeared: $(cat /tmp/dialog.log)"
-  xdotool search --onlyvisible --name '^Tarn Demo$' windowactivate --sync key alt+F4
-  wait $dialog || status=$?
-  [ $status -eq 0 ] || die "the dialog ended with status $status: $(cat /tmp/dialog.log)"
+  read -ra command <<<"$(sed -n 's/^Exec=//p' /usr/share/applications/zarvo-demo.desktop)"
+  open_display
+  "${command[@]}" >/tmp/log 2>&1 </dev/null &
+  DEMO=$!
+  wait_until 120 dialog_shown || die "no dialog appeared: $(cat /tmp/log)"
+  close_program
+  close_display
+  [ "$STATUS" -eq 0 ] || die "the dialog ended with status $STATUS: $(cat /tmp/log)"
   [ -x /root/Zarvo/Videoplayer ] || die "the launcher has prepared no folder"
 }
 
@@ -69,7 +67,7 @@ build_program() {
   # shellcheck disable=SC2046 # a list of options
   quietly "${3}" "main.$2" $(pkg-config --cflags --libs zarvo-sdk) -o recorder
   for program in build/recorder ./recorder; do
-    ldd $program | grep -q 'libzarvo_sdk.so.1 => /' || die "$program does not use the shared library"
+    [[ $(ldd $program) == *libzarvo_sdk.so.1* ]] || die "$program does not use the shared library"
     quietly "${ON_CARD[@]}" $program
     report_streams camera1.m4v || die "the README's program has recorded nothing that decodes"
     rm camera1.m4v
@@ -108,7 +106,7 @@ purge() {
   say "Removing and purging"
   before=$(find /root -type f -printf '%p %s\n' | sort)
   quietly apt-get -y remove "${NAMES[@]}"
-  quietly apt-get -y purge "${NAMES[@]}"
+  quietly dpkg --purge "${NAMES[@]}"
   left=$(find / -xdev -path /test -prune -o -path /tmp -prune -o -path /root -prune -o -path /proc -prune -o -iname '*zarvo*' -print)
   [ -z "$left" ] || die "these files are left: $left"
   [ "$before" = "$(find /root -type f -printf '%p %s\n' | sort)" ] || die "the purge has changed the recordings"
