@@ -19,7 +19,10 @@ const char *stream_format(ZV_VIDEO_CODEC codec) {
 std::string picture_rate(const RECORD_FILE_HEADER &header, const std::string &file) {
   for (const recording::IndexEntry &entry : recording::read_index(recording::index_path(file))) {
     if (entry.kind != recording::IndexEntry::Kind::start) continue;
-    return entry.fields == 2 ? std::to_string(2 * std::atoi(entry.rate.c_str())) : entry.rate;
+    if (entry.fields != 2) return entry.rate;
+    char twice[32];
+    std::snprintf(twice, sizeof twice, "%g", 2 * std::strtod(entry.rate.c_str(), nullptr));
+    return twice;
   }
   return header.frame_rate > 0 ? recording::frame_rate_label(header) : "";
 }

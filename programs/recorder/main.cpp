@@ -16,6 +16,8 @@ namespace {
 
 using recorder::Clock;
 
+constexpr int kIncomplete = 3;
+
 std::atomic<bool> table_wanted{false};
 
 void catch_table_signal() {
@@ -75,7 +77,7 @@ int record(const recorder::Options &options) {
   recording.stop();
   recording.messages().print();
   if (!options.quiet) print(status.line() + "\n");
-  return 0;
+  return recording.lost() > 0 ? kIncomplete : 0;
 }
 
 }  // namespace

@@ -34,7 +34,7 @@ constexpr char kHelp[] =
     "  -h, --help          this text\n"
     "  --version           the version\n\n"
     "SIGUSR1 prints a table of all channels.\n"
-    "Status: 0 ended by a signal; 1 failed; 2 wrong option\n";
+    "Status: 0 ended by a signal; 1 failed; 2 wrong option; 3 ended by a signal, but frames are lost\n";
 
 const option kOptions[] = {{"root", required_argument, nullptr, 'o'},
                            {"channels", required_argument, nullptr, 'c'},

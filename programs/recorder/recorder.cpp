@@ -59,8 +59,16 @@ void Recorder::stop() {
 }
 
 std::uint64_t Recorder::frames() const {
+  std::uint64_t video = 0, audio = 0;
+  for (unsigned stream = 0; stream < kStreams; ++stream)
+    (is_video(stream) ? video : audio) += intake_.arrivals(stream).frames;
+  return options_.channels != 0 ? video : audio;
+}
+
+std::uint64_t Recorder::lost() const {
   std::uint64_t sum = 0;
-  for (unsigned stream = 0; stream < kStreams; ++stream) sum += intake_.arrivals(stream).frames;
+  for (unsigned stream = 0; stream < kStreams; ++stream)
+    sum += intake_.arrivals(stream).lost + writer_.dropped(stream);
   return sum;
 }
 

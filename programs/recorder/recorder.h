@@ -31,8 +31,10 @@ class Recorder {
   const Writer &writer() const { return writer_; }
   Messages &messages() { return messages_; }
   Clock::time_point start_time() const { return start_; }
-  /// Returns how many frames and audio blocks have come.
+  /// Returns how many video frames have come, or audio blocks if no channel is recorded.
   std::uint64_t frames() const;
+  /// Returns how many frames and audio blocks have come but are in no file.
+  std::uint64_t lost() const;
 
  private:
   const Options options_;

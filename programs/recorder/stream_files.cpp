@@ -225,24 +225,34 @@ void StreamFiles::retire(std::int64_t time) {
 int StreamFiles::sync() {
   int error = 0;
   const auto sync_file = [&error](int file) {
-    if (file >= 0 && fdatasync(file) != 0) error = errno;
+    const bool synced = file < 0 || fdatasync(file) == 0;
+    if (!synced) error = errno;
+    return synced;
   };
   for (const int file : retired_) {
     sync_file(file);
     close(file);
   }
   retired_.clear();
-  sync_file(file_);  // an index is synced at its end: a recording is good without the last lines
+  // An index is synced at its end: a recording is good without the last lines.
+  if (!sync_file(file_)) replace_ = true;
   if (folder_changed_) sync_folders();
   folder_changed_ = false;
+  return error;
+}
+
+int StreamFiles::check_place(std::int64_t time) {
+  if (file_ < 0 || replace_) return 0;
   struct stat at_path {
   }, opened{};
-  const bool vanished = file_ >= 0 && !replace_ && fstat(file_, &opened) == 0 &&
-                        (stat(path_.c_str(), &at_path) != 0 || at_path.st_ino != opened.st_ino ||
-                         at_path.st_dev != opened.st_dev);
-  if (vanished) error = ENOENT;
-  if (error != 0) replace_ = true;
-  return error;
+  if (fstat(file_, &opened) != 0) return 0;
+  const bool in_place = stat(path_.c_str(), &at_path) == 0 && at_path.st_ino == opened.st_ino &&
+                        at_path.st_dev == opened.st_dev;
+  if (in_place) return 0;
+  // A file that was moved takes the rest of its group. A file that was deleted takes nothing any more.
+  replace_ = true;
+  if (opened.st_nlink == 0) retire(time);
+  return ENOENT;
 }
 
 /// Writes the names of new files and folders through to the disk.

@@ -51,9 +51,14 @@ class StreamFiles {
   /// Returns how many frames have been dropped.
   std::uint64_t dropped() const { return dropped_; }
 
-  /// Writes what has been written through to the disk. Returns 0 or an errno; if the file has vanished from
-  /// its folder, ENOENT. After an error the next intra frame begins a new file.
+  /// Writes what has been written through to the disk. Returns 0 or an errno. If the open file could not be
+  /// synced, the next intra frame begins a new file.
   int sync();
+  /// Returns ENOENT, once, if the file is no longer in its folder. The next intra frame then begins a new
+  /// file. If the file was deleted, the frames until then are dropped. Call it every second.
+  int check_place(std::int64_t time);
+  /// Whether a file is open, and stays open at the next intra frame of its hour.
+  bool in_place() const { return file_ >= 0 && !replace_; }
   /// Ends the file. Returns 0 or the errno of the sync.
   int finish(std::int64_t time);
   /// Adds an event to the index.

@@ -20,7 +20,7 @@ namespace {
 /// write takes, and a write costs more than what it writes.
 constexpr auto kPeriod = std::chrono::milliseconds(48);
 constexpr auto kRetry = std::chrono::seconds(10);
-constexpr auto kSpaceCheck = std::chrono::seconds(1);
+constexpr auto kCheck = std::chrono::seconds(1);
 
 /// Returns an hour as the names of its files begin.
 std::string name_of(const Hour &hour) {
@@ -72,7 +72,12 @@ void Writer::run() {
 }
 
 void Writer::pass(Clock::time_point now) {
-  if (now >= next_space_check_) check_space(now);
+  if (now >= next_check_) {
+    next_check_ = now + kCheck;
+    check_space();
+    for (auto &output : outputs_)
+      if (const int error = output->files.check_place(wall_ms())) report_error(*output, error);
+  }
   take_frames(intake_.video());
   take_frames(intake_.audio());
   for (auto &output : outputs_) write(*output, now);
@@ -106,12 +111,16 @@ void Writer::write(Output &output, Clock::time_point now) {
   if (error != 0) {
     report_error(output, error);
     output.next_try = now + kRetry;
-  } else if (output.error != 0) {
+  } else if (output.error != 0 && output.files.in_place()) {
     messages_.add(stream_name(output.stream) + ": goes on in " + output.files.path());
+    output.error = 0;
   }
-  output.error = error;
+  if (error == 0) tell_dropped(output);
+}
+
+void Writer::tell_dropped(Output &output) {
   const std::uint64_t lost = output.files.dropped() - output.told;
-  if (error != 0 || lost == 0) return;
+  if (lost == 0) return;
   messages_.add(stream_name(output.stream) + ": " + std::to_string(lost) +
                 " could not be written and are lost");
   output.told += lost;
@@ -120,6 +129,7 @@ void Writer::write(Output &output, Clock::time_point now) {
 /// Says the same only once.
 void Writer::report_error(Output &output, int error) {
   if (error == output.error) return;
+  output.error = error;
   output.files.note_disk_error(wall_ms(), error);
   messages_.add(stream_name(output.stream) + ": " + output.files.path() + ": " + std::strerror(error));
 }
@@ -142,11 +152,13 @@ void Writer::make_room(Ring &ring, bool video) {
 
 void Writer::sync(Output &output, Clock::time_point now) {
   output.next_sync = now + options_.sync;
-  if (const int error = output.files.sync()) report_error(output, error);
+  if (const int error = output.files.sync()) {
+    report_error(output, error);
+    output.next_try = now + kRetry;
+  }
 }
 
-void Writer::check_space(Clock::time_point now) {
-  next_space_check_ = now + kSpaceCheck;
+void Writer::check_space() {
   free_ = recorder::free_percent(options_.root).value_or(-1);
   const bool low = free_ >= 0 && free_ < options_.min_free;
   const bool full = low && !(options_.delete_oldest && delete_oldest());
@@ -176,6 +188,7 @@ void Writer::end_files() {
   for (auto &output : outputs_) {
     output->files.drop_until(~std::uint64_t{0});
     dropped_[output->stream] = output->files.dropped();
+    tell_dropped(*output);
     if (const int error = output->files.finish(time)) report_error(*output, error);
   }
 }

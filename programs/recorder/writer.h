@@ -53,10 +53,11 @@ class Writer {
   void pass(Clock::time_point now);
   void take_frames(Ring &ring);
   void write(Output &output, Clock::time_point now);
+  void tell_dropped(Output &output);
   void make_room(Ring &ring, bool video);
   void sync(Output &output, Clock::time_point now);
   void report_error(Output &output, int error);
-  void check_space(Clock::time_point now);
+  void check_space();
   bool delete_oldest();
   void end_files();
 
@@ -65,7 +66,7 @@ class Writer {
   Messages &messages_;
   std::vector<std::unique_ptr<Output>> outputs_;
   std::array<Output *, kStreams> by_stream_{};
-  Clock::time_point next_space_check_;
+  Clock::time_point next_check_;
   bool full_ = false;  ///< less is free than must stay free
   std::array<std::atomic<std::uint64_t>, kStreams> dropped_{};
   std::atomic<double> free_{-1};

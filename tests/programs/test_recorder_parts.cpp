@@ -240,10 +240,10 @@ TEST_F(StreamFilesTest, WriteErrorKeepsWholeFrames) {
 TEST_F(StreamFilesTest, VanishedRootIsToldAndComesBack) {
   give(kTwoOClock, true, 1);
   ASSERT_EQ(files->write(), 0);
-  ASSERT_EQ(files->sync(), 0);
+  ASSERT_EQ(files->check_place(kTwoOClock), 0);
   fs::rename(options.root, options.root + ".away");
-  EXPECT_EQ(files->sync(), ENOENT);
-  EXPECT_EQ(files->sync(), 0);  // told once
+  EXPECT_EQ(files->check_place(kTwoOClock), ENOENT);
+  EXPECT_EQ(files->check_place(kTwoOClock), 0);  // told once
   give(kTwoOClock + 40, true, 2);
   EXPECT_EQ(files->write(), ENOENT);
   EXPECT_FALSE(fs::exists(options.root));
@@ -252,6 +252,20 @@ TEST_F(StreamFilesTest, VanishedRootIsToldAndComesBack) {
   EXPECT_EQ(files->write(), 0);
   EXPECT_THAT(marks("20251125-14.rec"), ElementsAre(1));
   EXPECT_THAT(marks("20251125-14.1.rec"), ElementsAre(2, 3));
+}
+
+// Catches: frames that are counted as recorded although their file has been deleted.
+TEST_F(StreamFilesTest, FramesForADeletedFileAreCountedAsDropped) {
+  give(kTwoOClock, true, 1);
+  ASSERT_EQ(files->write(), 0);
+  fs::remove(path("20251125-14.rec"));
+  EXPECT_EQ(files->check_place(kTwoOClock), ENOENT);
+  give(kTwoOClock + 40, false, 2);
+  files->drop_until(0);
+  EXPECT_EQ(files->dropped(), 1u);
+  give(kTwoOClock + 80, true, 3);
+  EXPECT_EQ(files->write(), 0);
+  EXPECT_THAT(marks("20251125-14.1.rec"), ElementsAre(3));
 }
 
 // Catches: a file that is no recording, or an hour that is being recorded, among the deleted ones.
