@@ -41,9 +41,10 @@ std::vector<Stretch> audio_stretches(const std::vector<Recording> &audio,
 }
 
 AudioReader::AudioReader(const std::vector<Recording> &audio, const std::vector<Recording> &video,
-                         Report &report) {
+                         Milliseconds from, Report &report) {
   const std::vector<Stretch> stretches = audio_stretches(audio, video);
   for (std::size_t i = 0; i < audio.size(); ++i) {
+    if (stretches[i].to <= from) continue;
     files_.push_back({audio[i].path, stretches[i], blocks_of(audio[i])});
     if (std::filesystem::file_size(audio[i].path) % kBlockBytes != 0)
       report.skipped(audio[i].path + ": the last block is torn: skipped");

@@ -27,8 +27,9 @@ struct AudioBlock {
 
 class AudioReader {
  public:
-  /// See audio_stretches(). Reports blocks that are torn.
-  AudioReader(const std::vector<Recording> &audio, const std::vector<Recording> &video, Report &report);
+  /// See audio_stretches(). Leaves out the files that end before `from`. Reports blocks that are torn.
+  AudioReader(const std::vector<Recording> &audio, const std::vector<Recording> &video, Milliseconds from,
+              Report &report);
 
   /// Goes on at the first block that begins at a time or behind it.
   void seek(Milliseconds time);

@@ -1,6 +1,7 @@
 // zarvo_export: makes clips of recordings, and lists what is recorded.
 #include <algorithm>
 #include <cstdio>
+#include <iterator>
 #include <memory>
 
 #include "clip.h"
@@ -101,9 +102,15 @@ int make_clip(const Options &options) {
   std::vector<Recording> recordings = recordings_of(options, report);
   std::unique_ptr<AudioReader> audio;
   if (options.audio != 0) {
-    const auto found = find_recordings(options.root, recording::Kind::audio, options.audio, options.range);
+    // Where the audio of an hour begins depends on the hour before.
+    const Stretch before{options.range.from - kHour, options.range.from},
+        around{before.from, options.range.to};
+    const auto found = find_recordings(options.root, recording::Kind::audio, options.audio, around);
     report_missing_hours(found, options.range, "audio input " + std::to_string(options.audio), report);
-    audio = std::make_unique<AudioReader>(found, recordings, report);
+    std::vector<Recording> beside = recordings;
+    std::ranges::move(find_recordings(options.root, recording::Kind::video, options.channel, before),
+                      std::back_inserter(beside));
+    audio = std::make_unique<AudioReader>(found, beside, options.range.from, report);
   }
   std::vector<Stretch> stretches{options.range};
   if (options.motion) stretches = motion_in(recordings, options.range, report);
