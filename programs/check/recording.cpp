@@ -98,7 +98,15 @@ double monotonic_seconds() {
 
 double rate_of(const Track &track) {
   if (track.size() < 3) return 0;
-  return static_cast<double>(track.size() - 1) / (track.back().time - track.front().time);
+  // The slope of a straight line through all arrivals: a single late frame hardly changes it.
+  const double count = static_cast<double>(track.size()), middle = (count - 1) / 2;
+  double squares = 0, products = 0;
+  for (std::size_t n = 0; n < track.size(); ++n) {
+    const double from_middle = static_cast<double>(n) - middle;
+    squares += from_middle * from_middle;
+    products += from_middle * (track[n].time - track.front().time);
+  }
+  return products > 0 ? squares / products : 0;
 }
 
 double bytes_of(const Track &track) {

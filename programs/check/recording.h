@@ -31,7 +31,7 @@ struct Recording {
   std::array<Track, ZV_AUDIO_CHANNELS> audio;
 };
 
-/// Frames a second, from the first frame to the last; 0 with less than three frames.
+/// Frames a second; 0 with less than three frames.
 double rate_of(const Track &track);
 /// Bytes of all frames.
 double bytes_of(const Track &track);
