@@ -220,8 +220,7 @@ tour_dark() {
     open_display
     start_program "$TOUR"
     picture "$DIALOG" "$SHOTS/dialog-dark-theme.png"
-    close_program
-    close_display
+    close_display # ends the program too
   )
 }
 

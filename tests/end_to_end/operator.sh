@@ -7,6 +7,14 @@
 # pixels: a checksum of what the dialog shows above its last groups.
 pixels() { import -silent -window "$DIALOG" -crop 728x670+0+0 rgb:- | cksum; }
 
+# record_start: a checksum of Start in Record, which is disabled while a player runs.
+record_start() {
+  local x y
+  read -r x y <<<"${WIDGET[btnRecordStart]}"
+  import -silent -window "$DIALOG" -crop "80x20+$((x - 40))+$((y - 10))" rgb:- | cksum
+}
+reacts() { [ "$(record_start)" != "$blocked" ]; }
+
 # value_of PROPERTY: what the dialog says about it after Set.
 value_of() {
   local before
@@ -92,7 +100,9 @@ count=$(lines '^Hue =')
 click btnSetProperty
 xdotool key Return space
 click btnSplit16
+blocked=$(record_start)
 touch "$FOLDER/work/played"
+expect "the dialog does not react after the player has ended" wait_until 20 reacts
 expect_equal "uses of Set after the player has ended" $((count + 1)) "$(value_of Hue >/dev/null && lines '^Hue =')"
 end_program
 close_display
