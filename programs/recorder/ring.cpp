@@ -1,6 +1,7 @@
 // The buffer between the SDK's threads and the writer.
 #include "ring.h"
 
+#include <algorithm>
 #include <cstring>
 
 namespace recorder {
@@ -29,7 +30,8 @@ bool Ring::push(const Frame &frame, const u8 *data) {
   }
   std::byte *const record = &memory_[(head + skipped) % memory_.size()];
   std::memcpy(record, &frame, sizeof frame);
-  std::memcpy(record + sizeof frame, data, frame.length);
+  std::copy_n(reinterpret_cast<const std::byte *>(data), frame.length,
+              record + sizeof frame);  // it may be empty
   head_.store(head + skipped + size, std::memory_order_release);
   return true;
 }
