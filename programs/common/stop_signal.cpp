@@ -3,6 +3,8 @@
 
 #include <signal.h>
 
+#include <initializer_list>
+
 std::atomic<bool> stopping{false};
 
 void catch_stop_signals() {
