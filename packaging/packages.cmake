@@ -89,7 +89,8 @@ zarvo_package(zarvo-tools SECTION video NEEDS libzarvo-sdk1
 These programs record its channels, for seconds or for months as a
 service, detect motion, make clips of recordings, and check the card and
 its driver."
-  SUGGESTS zarvo-virtual-card)
+  SUGGESTS zarvo-virtual-card
+  CONTROL ${control}/zarvo-tools/postinst ${control}/zarvo-tools/prerm ${control}/zarvo-tools/postrm)
 zarvo_package(zarvo-demo SECTION video NEEDS libzarvo-sdk1 zarvo-virtual-card
   SUMMARY "dialog for watching and recording sixteen cameras"
   TEXT "${card}
