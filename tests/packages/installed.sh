@@ -51,6 +51,16 @@ record() {
   report_streams /root/recordings/ch*.m4v /root/recordings/audio*.g726 || die "a recording does not decode"
 }
 
+# A clip of what the recorder has written, and the contract of the card.
+use_tools() {
+  say "Making a clip, and checking the card"
+  mkdir -p /root/Data
+  quietly "${ON_CARD[@]}" timeout --preserve-status 5 zarvo_recorder --root /root/Data --channels 2 --audio 1
+  quietly zarvo_export /root/Data/Video/*/CH02/*.rec /root/clip.mkv
+  quietly ffmpeg -nostdin -v error -xerror -i /root/clip.mkv -f null -
+  quietly "${ON_CARD[@]}" zarvo_check --quick
+}
+
 # readme_block LANGUAGE: the code block of the README in that language.
 readme_block() { awk -v begin="\`\`\`$1" '$0 == "```" { inside = 0 } inside; $0 == begin { inside = 1 }' /test/README.md; }
 
@@ -115,6 +125,7 @@ purge() {
 install_packages
 open_dialog
 record
+use_tools
 completed=$(complete_option --se)
 [ "$completed" = --seconds ] || die "bash completes --se to '$completed'"
 build_program C c cc
