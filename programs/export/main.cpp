@@ -3,6 +3,7 @@
 #include <cstdio>
 #include <iterator>
 #include <memory>
+#include <stdexcept>
 
 #include "clip.h"
 #include "listing.h"
@@ -113,7 +114,10 @@ int make_clip(const Options &options) {
     audio = std::make_unique<AudioReader>(found, beside, options.range.from, report);
   }
   std::vector<Stretch> stretches{options.range};
-  if (options.motion) stretches = motion_in(recordings, options.range, report);
+  if (options.motion) {
+    stretches = motion_in(recordings, options.range, report);
+    if (stretches.empty()) throw std::runtime_error("nothing moves there; no clip is written");
+  }
   Clip clip(options, stretches, audio.get(), report);
   for (const Recording &recording : recordings) clip.add(recording);
   clip.finish();

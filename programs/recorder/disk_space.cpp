@@ -17,13 +17,20 @@ namespace {
 
 constexpr std::size_t kHourLength = 11;  // "20261125-14"
 
+bool is_digit(char c) {
+  return std::isdigit(static_cast<unsigned char>(c)) != 0;
+}
+
+/// Returns a name with 0 for each digit.
+std::string shape_of(std::string name) {
+  std::replace_if(name.begin(), name.end(), is_digit, '0');
+  return name;
+}
+
 /// Returns the hour in the name of a recording or an index, or an empty text for another name.
 std::string hour_in(const std::string &name) {
   constexpr const char *kExtensions[] = {".rec", ".idx", ".aud"};
-  const auto is_digit = [](char c) { return std::isdigit(static_cast<unsigned char>(c)) != 0; };
-  std::string shape = name.substr(0, kHourLength);
-  std::replace_if(shape.begin(), shape.end(), is_digit, '0');
-  if (shape != "00000000-00") return "";
+  if (shape_of(name.substr(0, kHourLength)) != "00000000-00") return "";
   std::string rest = name.substr(kHourLength);
   if (rest.size() > 2 && rest[0] == '.' && is_digit(rest[1])) {  // the number of a part
     const auto end = std::find_if_not(rest.begin() + 1, rest.end(), is_digit);
@@ -42,6 +49,16 @@ std::vector<fs::path> entries_of(const fs::path &folder) {
   return entries;
 }
 
+/// Returns the folders in a folder whose names have a shape. Leaves out links.
+std::vector<fs::path> folders_of(const fs::path &folder, const std::string &shape) {
+  std::vector<fs::path> folders = entries_of(folder);
+  std::erase_if(folders, [&shape](const fs::path &entry) {
+    std::error_code ignored;
+    return shape_of(entry.filename()) != shape || !fs::is_directory(fs::symlink_status(entry, ignored));
+  });
+  return folders;
+}
+
 }  // namespace
 
 std::optional<double> free_percent(const std::string &folder) {
@@ -53,8 +70,8 @@ std::optional<double> free_percent(const std::string &folder) {
 std::string delete_oldest_hour(const std::string &root, const std::set<std::string> &kept) {
   std::map<std::string, std::vector<fs::path>> hours;
   for (const char *kind : {"Video", "Audio"})
-    for (const fs::path &day : entries_of(fs::path(root) / kind))
-      for (const fs::path &channel : entries_of(day))
+    for (const fs::path &day : folders_of(fs::path(root) / kind, "00000000"))
+      for (const fs::path &channel : folders_of(day, "CH00"))
         for (const fs::path &file : entries_of(channel))
           if (const std::string hour = hour_in(file.filename()); !hour.empty() && kept.count(hour) == 0)
             hours[hour].push_back(file);

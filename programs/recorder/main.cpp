@@ -57,6 +57,7 @@ void watch(recorder::Recorder &recording, recorder::Status &status) {
     if (now >= next_second) {
       next_second = now + kSecond;
       status.look_for_silence(recording.messages());
+      status.look_for_overrun(recording.messages());
       const std::uint64_t before = std::exchange(frames, recording.frames());
       tell_service(status.line(), frames != before);
     }

@@ -42,6 +42,16 @@ void Status::look_for_silence(Messages &messages) {
   }
 }
 
+void Status::look_for_overrun(Messages &messages) {
+  std::uint64_t lost = 0;
+  for (unsigned stream = 0; stream < kStreams; ++stream) lost += recorder_.intake().arrivals(stream).lost;
+  const bool overrun = lost > lost_;
+  if (overrun && !overrun_)
+    messages.add("the buffer is full, because the disk does not keep up: frames are lost");
+  lost_ = lost;
+  overrun_ = overrun;
+}
+
 void Status::compare_with_expected(Messages &messages) {
   const Clock::time_point now = Clock::now();
   for (unsigned stream = 0; stream < kStreams; ++stream) {

@@ -18,6 +18,8 @@ class Status {
 
   /// Call it once a second. Says when a stream brings nothing for some seconds.
   void look_for_silence(Messages &messages);
+  /// Call it once a second. Says at once, not only when the disk takes frames again, that the buffer is full.
+  void look_for_overrun(Messages &messages);
   /// Call it once a minute. Says how many frames a stream is short of in this minute.
   void compare_with_expected(Messages &messages);
 
@@ -34,6 +36,8 @@ class Status {
 
   const Recorder &recorder_;
   std::array<bool, kStreams> silent_{};
+  std::uint64_t lost_ = 0;  ///< what the buffer had no space for, a second ago
+  bool overrun_ = false;
   std::array<Minute, kStreams> minute_{};  ///< the counts when the last minute ended
 };
 

@@ -198,7 +198,7 @@ TABLE
     rm -r "$VIDEO" && mkdir "$VIDEO"
     hour_tree
     export_clip 1 "${RANGE[@]}" 15:30 --motion "$FOLDER/still.mp4"
-    says 'nothing is recorded there'
+    says 'nothing moves there'
     rm "$VIDEO"/*.idx
     export_clip 1 "${RANGE[@]}" 15:30 --motion "$FOLDER/still.mp4"
     says '15.rec: no index tells of motion'

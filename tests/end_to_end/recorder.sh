@@ -114,7 +114,8 @@ case $1 in
   overrun)
     start --buffer 1 --audio none
     touch "$ZARVO_STALL"
-    sleep 6
+    wait_told 'the buffer is full'
+    sleep 3
     rm "$ZARVO_STALL"
     wait_told 'channel 16: the buffer was full: [0-9]+ frames are lost'
     goes_on

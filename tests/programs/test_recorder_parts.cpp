@@ -282,7 +282,8 @@ TEST(RecorderDiskSpace, DeletesTheOldestHourAlone) {
   const std::vector<std::string> others{
       "Video/20251123/CH01/notes.txt",         "Video/20251123/CH01/20251123-10.rec~",
       "Video/20251123/CH01/20251123-10.x.rec", "Audio/20251125/CH01/20251125-00.aud",
-      "Video/20251125/CH01/20251125-00.rec",   ".zarvo-recorder.lock"};
+      "Video/20251125/CH01/20251125-00.rec",   "Video/keep/CH01/20251101-10.rec",
+      "Video/20251101/kept/20251101-10.rec",   ".zarvo-recorder.lock"};
   for (const std::string &other : others) make(other);
   EXPECT_EQ(delete_oldest_hour(root, {"20251125-00"}), "20251124-23");
   EXPECT_FALSE(fs::exists(root / "Video/20251124"));
