@@ -13,7 +13,7 @@ show_log() {
     die "the table in docs/virtual-card.md is not the one of zarvo_card --list"
 
   # The item slow delays each call, so the log begins before the recording starts.
-  ZARVO_VIRTUAL_CARD+=';slow=20' "${ON_CARD[@]}" "$ZARVO_RECORD" --seconds 2 --channels 3 --audio 1 --output "$FOLDER/out" >/dev/null &
+  ZARVO_VIRTUAL_CARD+=';slow=20' "${ON_CARD[@]}" "$ZARVO_RECORD" --seconds 5 --channels 3 --audio 1 --output "$FOLDER/out" >/dev/null &
   expect "no socket appeared" wait_until 20 test -S "$FOLDER/card"
   card log --no-reads --only encoder >"$FOLDER/log" &
   expect "the log stays empty" wait_until 20 test -s "$FOLDER/log"

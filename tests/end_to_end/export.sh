@@ -9,12 +9,18 @@ AUDIO=$ROOT/Audio/20261125/CH02
 RECORDED=$FOLDER/stream
 mkdir -p "$VIDEO" "$AUDIO"
 
-# record OPTION...: a stream of channel 3, and where its groups begin in it.
+# record SECONDS OPTION...: a stream of channel 3, and where its groups begin in it. A slow machine takes longer for as
+# many groups.
 record() {
-  rm -rf "$RECORDED" && "${ON_CARD[@]}" "$ZARVO_RECORD" --channels 3 --audio 2 --output "$RECORDED" "$@" >/dev/null 2>&1 || true
-  mv "$RECORDED"/ch03.* "$RECORDED/video"
-  mapfile -t GROUPS_AT < <(LC_ALL=C grep -obUaP '\x00\x00\x01\x00\x00\x00\x01\x20|\xff\xd8\xff\xdb' "$RECORDED/video" | cut -d : -f 1)
-  GROUPS_AT+=("$(stat -c %s "$RECORDED/video")")
+  local seconds
+  for seconds in "$1" $(($1 * 2)) $(($1 * 4)); do
+    rm -rf "$RECORDED"
+    "${ON_CARD[@]}" "$ZARVO_RECORD" --channels 3 --audio 2 --output "$RECORDED" --seconds "$seconds" "${@:2}" >/dev/null 2>&1 || true
+    mv "$RECORDED"/ch03.* "$RECORDED/video"
+    mapfile -t GROUPS_AT < <(LC_ALL=C grep -obUaP '\x00\x00\x01\x00\x00\x00\x01\x20|\xff\xd8\xff\xdb' "$RECORDED/video" | cut -d : -f 1)
+    GROUPS_AT+=("$(stat -c %s "$RECORDED/video")")
+    [ ${#GROUPS_AT[@]} -lt "$1" ] || return 0
+  done
 }
 
 # header CODEC WIDTH HEIGHT RATE: the header of a recording.
@@ -82,7 +88,7 @@ case $1 in
   # Two hours and a part. Catches: a frame missing or doubled where files meet; a gap that closes; a wrong rate,
   # shape or date; samples that move against the pictures.
   range)
-    record --seconds 9
+    record 9
     hour_tree
     for hour in 13 14 14.1 15; do head -c 6000 "$RECORDED/audio2.g726" >"$AUDIO/20261125-$hour.aud"; done
     for type in mkv mp4; do
@@ -132,7 +138,7 @@ case $1 in
   formats)
     while read -r options codec width height label rate two_fields; do
       # shellcheck disable=SC2086 # options are words
-      record --seconds 2 ${options//,/ }
+      record 2 ${options//,/ }
       HEADER=("$codec" "$width" "$height" "$label")
       part 20261125-13 0 ${#GROUPS_AT[@]}-1
       for type in mkv mp4; do
@@ -157,7 +163,7 @@ TABLE
   # Catches: a damaged frame in the clip; a frame that moves in time because one before it is skipped; a clip that
   # is silent about what it lacks.
   damage)
-    record --seconds 9
+    record 9
     hour_tree
     rm "$VIDEO/20261125-14.1.idx"
     truncate -s -100 "$VIDEO/20261125-14.1.rec"                                                # torn
@@ -190,7 +196,7 @@ TABLE
   # Groups 1, 4 and 5 have motion. Two seconds around them: groups 0 to 3 from the one, and 4 and 5; group 3 ends
   # two seconds before group 4 begins.
   motion)
-    record --seconds 9
+    record 9
     hour_tree '1 4 5'
     export_clip 0 "${RANGE[@]}" 15:30 --motion "$FOLDER/clip.mp4"
     expect_equal "frames with motion" "$(source_hashes 0 6)" "$(hashes -i "$FOLDER/clip.mp4")"
@@ -205,7 +211,7 @@ TABLE
     ;;
 
   list)
-    record --seconds 9
+    record 9
     hour_tree '1 4 5'
     echo "{\"event\":\"gap\",\"time\":$(date -d '2026-11-25 15:00:02' +%s)000,\"offset\":32,\"ms\":1500}" >>"$VIDEO/20261125-15.idx"
     echo '{"intra":true,"ti' >>"$VIDEO/20261125-15.idx"
@@ -226,7 +232,7 @@ TABLE
 
   # Nothing but a whole clip appears under its name.
   output)
-    record --seconds 3
+    record 3
     part 20261125-13 0 2
     file=$VIDEO/20261125-13.rec
     while IFS='|' read -r status pattern arguments; do
