@@ -21,8 +21,8 @@ constexpr int kWrongUse = 2;
 constexpr const char *kUsage = R"(Usage: zarvo_card [OPTION...] ITEM...
        zarvo_card [OPTION...] state | counters | log | snapshot CHANNEL FILE
 
-Changes, breaks and watches the virtual card of a running program. The card listens when the program was
-started with the option control=SOCKET in ZARVO_VIRTUAL_CARD.
+Changes, breaks and watches the virtual card of a running program. The card listens if ZARVO_VIRTUAL_CARD
+held the item control=SOCKET when the program was started.
 
   ITEM                      e.g. lost=3; "lost=" undoes it. With a time, counted from now, in one word:
                             "@5-8 lost=3", "@12 lost=3", "@every 10 for 0.5 stall=mpeg4"
