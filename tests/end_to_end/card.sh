@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # zarvo_card beside a running program: it changes what the operator sees, and shows what the program does.
 #   card.sh log      the log of a recording; the table of items in the documentation
-#   card.sh window   a camera is lost and comes back in each of the six layouts of the preview
+#   card.sh window   a camera is lost and comes back in each of the six layouts of the preview; a snapshot
 . "$(dirname "$0")/common.sh"
 
 export ZARVO_CARD_SOCKET=$FOLDER/card ZARVO_VIRTUAL_CARD=control=$FOLDER/card
@@ -13,7 +13,7 @@ show_log() {
     die "the table in docs/virtual-card.md is not the one of zarvo_card --list"
 
   # The item slow delays each call, so the log begins before the recording starts.
-  ZARVO_VIRTUAL_CARD+=';slow=20' "${ON_CARD[@]}" "$ZARVO_RECORD" --seconds 5 --channels 3 --audio 1 --output "$FOLDER/out" >/dev/null &
+  ZARVO_VIRTUAL_CARD+=';slow=20' "${ON_CARD[@]}" "$ZARVO_RECORD" --seconds 2 --channels 3 --audio 1 --output "$FOLDER/out" >/dev/null &
   expect "no socket appeared" wait_until 20 test -S "$FOLDER/card"
   card log --no-reads --only encoder >"$FOLDER/log" &
   expect "the log stays empty" wait_until 20 test -s "$FOLDER/log"
@@ -21,9 +21,6 @@ show_log() {
   expect "no state" grep -qx 'standard NTSC' <(card state)
   expect "a wrong item is not refused" grep -q 'expected: channels 1-16' <(card lost=17 2>&1 || true)
   expect_equal "kicks in the counters" 0 "$(card --json counters | sed -n 's/.*"kicks": \([0-9]*\).*/\1/p')"
-  card snapshot 3 "$FOLDER/three.png"
-  expect_equal "size of the snapshot" 720x480 "$(identify -format %wx%h "$FOLDER/three.png")"
-  ! card snapshot 3 "$FOLDER/none/three.png" 2>/dev/null || die "a snapshot that cannot be written counts as done"
   wait # the log ends with the card
   expect "the socket is left over" test ! -e "$FOLDER/card"
   expected='SET_SCALE channel=2 value=2|SET_GOP channel=2 value=30|ENC_IOC_START = 0|SET_SCALE channel=2 value=0|ENC_IOC_STOP = 0|encoder close = 0'
@@ -69,6 +66,9 @@ lose_in_each_layout() {
     card lost=
     expect "camera 3 does not come back in $split" wait_until 10 is_not_blue
   done
+  card snapshot 3 "$FOLDER/three.png"
+  expect_equal "size of the snapshot" 720x480 "$(identify -format %wx%h "$FOLDER/three.png")"
+  ! card snapshot 3 "$FOLDER/none/three.png" 2>/dev/null || die "a snapshot that cannot be written counts as done"
   end_program
 }
 
