@@ -1,9 +1,6 @@
 // What an hour of one channel costs as a clip: zarvo_export against a stream copy by ffmpeg of the same file,
 // and the memory for an hour against that for six minutes.
 #include <benchmark/benchmark.h>
-#include <spawn.h>
-#include <sys/resource.h>
-#include <sys/wait.h>
 
 #include <atomic>
 #include <chrono>
@@ -14,12 +11,11 @@
 #include <thread>
 #include <vector>
 
+#include "measure.h"
 #include "recording/header.h"
 #include "report.h"
 #include "virtual_card.h"
 #include "zv_lib.h"
-
-extern char **environ;
 
 namespace {
 
@@ -61,53 +57,30 @@ void write_recording(const fs::path &path, int seconds) {
   for (int written = 0; written < seconds * 30; written += kFrames) file << stream;
 }
 
-struct Cost {
-  double ns;
-  double memory;  ///< kilobytes
-};
-
-Cost run(std::vector<std::string> words) {
-  std::vector<char *> arguments;
-  arguments.reserve(words.size() + 1);
-  for (std::string &word : words) arguments.push_back(word.data());
-  arguments.push_back(nullptr);
-  const auto start = std::chrono::steady_clock::now();
-  pid_t child = 0;
-  int status = -1;
-  rusage usage{};
-  if (posix_spawnp(&child, arguments[0], nullptr, nullptr, arguments.data(), environ) != 0) std::abort();
-  wait4(child, &status, 0, &usage);
-  const std::chrono::duration<double, std::nano> time = std::chrono::steady_clock::now() - start;
-  if (status != 0) std::abort();
-  return {time.count(), static_cast<double>(usage.ru_maxrss)};
-}
-
 void export_an_hour(benchmark::State &state) {
   for (auto iteration : state) {
     (void)iteration;
     take_stream();
-    char name[] = "/tmp/zarvo-bench-XXXXXX";
-    if (mkdtemp(name) == nullptr) std::abort();
-    const fs::path folder = name;
+    const bench::Folder own;
+    const fs::path &folder = own.path();
     write_recording(folder / "hour.rec", 3600);
     write_recording(folder / "short.rec", 360);
     const auto exported = [&](const char *recording, const std::string &type) {
-      return run({ZARVO_EXPORT, "--force", folder / recording, folder / ("ours." + type)});
+      return bench::run_program({ZARVO_EXPORT, "--force", folder / recording, folder / ("ours." + type)});
     };
     for (const std::string type : {"mkv", "mp4"}) {
       bench::compare(
           "an hour of one channel as " + type + ", against ffmpeg -c copy", 5, 1.2,
-          [&] { return exported("hour.rec", type).ns; },
+          [&] { return exported("hour.rec", type).wall_ns; },
           [&] {
-            return run({"ffmpeg", "-nostdin", "-v", "error", "-y", "-f", "m4v", "-framerate", "30000/1001",
-                        "-skip_initial_bytes", "32", "-i", folder / "hour.rec", "-c", "copy",
-                        folder / ("theirs." + type)})
-                .ns;
+            return bench::run_program({"ffmpeg", "-nostdin", "-v", "error", "-y", "-f", "m4v", "-framerate",
+                                       "30000/1001", "-skip_initial_bytes", "32", "-i", folder / "hour.rec",
+                                       "-c", "copy", folder / ("theirs." + type)})
+                .wall_ns;
           });
     }
     bench::figure("memory for an hour as mkv, against six minutes",
-                  exported("hour.rec", "mkv").memory / exported("short.rec", "mkv").memory, 1.1, "x");
-    fs::remove_all(folder);
+                  exported("hour.rec", "mkv").kilobytes / exported("short.rec", "mkv").kilobytes, 1.1, "x");
   }
 }
 BENCHMARK(export_an_hour)->Iterations(1)->Unit(benchmark::kSecond);

@@ -24,6 +24,7 @@ namespace {
 namespace fs = bench::fs;
 
 std::atomic<int> hours_ahead{0};
+
 /// The one Qt application of the process, which stands before the first dialog and never ends.
 struct Application {
   Application() {

@@ -1,16 +1,22 @@
 #include "measure.h"
 
 #include <fcntl.h>
+#include <spawn.h>
 #include <sys/ioctl.h>
 #include <sys/mman.h>
+#include <sys/resource.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
+#include <chrono>
 #include <cstdlib>
 #include <cstring>
 #include <ctime>
 
 #include "zv_driver.h"
 #include "zv_lib.h"
+
+extern char **environ;
 
 namespace bench {
 namespace {
@@ -43,6 +49,34 @@ double thread_cpu_ns() {
 }
 double process_cpu_ns() {
   return clock_ns(CLOCK_PROCESS_CPUTIME_ID);
+}
+
+Folder::Folder() {
+  char name[] = "/tmp/zarvo-bench-XXXXXX";
+  if (mkdtemp(name) == nullptr) std::abort();
+  path_ = name;
+}
+
+Folder::~Folder() {
+  std::filesystem::remove_all(path_);
+}
+
+Usage run_program(std::vector<std::string> words) {
+  std::vector<char *> arguments;
+  arguments.reserve(words.size() + 1);
+  for (std::string &word : words) arguments.push_back(word.data());
+  arguments.push_back(nullptr);
+  const auto start = std::chrono::steady_clock::now();
+  pid_t child = 0;
+  int status = -1;
+  rusage used{};
+  if (posix_spawnp(&child, arguments[0], nullptr, nullptr, arguments.data(), environ) != 0) std::abort();
+  wait4(child, &status, 0, &used);
+  const std::chrono::duration<double, std::nano> wall = std::chrono::steady_clock::now() - start;
+  if (status != 0) std::abort();
+  const double cpu = static_cast<double>(used.ru_utime.tv_sec + used.ru_stime.tv_sec) * 1e9 +
+                     static_cast<double>(used.ru_utime.tv_usec + used.ru_stime.tv_usec) * 1e3;
+  return {wall.count(), cpu, static_cast<double>(used.ru_maxrss)};
 }
 
 BareDriver::BareDriver()

@@ -4,7 +4,10 @@
 #define BENCH_MEASURE_H
 
 #include <cstdint>
+#include <filesystem>
 #include <functional>
+#include <string>
+#include <vector>
 
 #include "virtual_card.h"
 #include "zv_type.h"
@@ -13,6 +16,28 @@ namespace bench {
 
 double thread_cpu_ns();
 double process_cpu_ns();
+
+/// A folder of its own, gone at the end.
+class Folder {
+ public:
+  Folder();
+  ~Folder();
+  Folder(const Folder &) = delete;
+  Folder &operator=(const Folder &) = delete;
+  const std::filesystem::path &path() const { return path_; }
+
+ private:
+  std::filesystem::path path_;
+};
+
+/// What a program has used.
+struct Usage {
+  double wall_ns;
+  double cpu_ns;
+  double kilobytes;  ///< the most memory at a time
+};
+/// Runs a program to its end. Aborts if it fails.
+Usage run_program(std::vector<std::string> words);
 
 /// The device nodes, opened and mapped without the SDK.
 class BareDriver {

@@ -2,9 +2,6 @@
 
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
-#include <spawn.h>
-#include <sys/resource.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <array>
@@ -16,8 +13,6 @@
 #include <vector>
 
 #include "report.h"
-
-extern char **environ;
 
 namespace bench {
 namespace {
@@ -109,23 +104,7 @@ double ffmpeg_ns(std::uint64_t frames, bool mjpeg, bool paced, const Program &pr
       words.push_back(word);
     words.push_back(folder.path() / ("out" + std::to_string(i) + suffix));
   }
-  std::vector<char *> arguments;
-  arguments.reserve(words.size() + 1);
-  for (std::string &word : words) arguments.push_back(word.data());
-  arguments.push_back(nullptr);
-  rusage before{};
-  getrusage(RUSAGE_CHILDREN, &before);
-  pid_t child = 0;
-  int status = -1;
-  if (posix_spawnp(&child, "ffmpeg", nullptr, nullptr, arguments.data(), environ) != 0) std::abort();
-  waitpid(child, &status, 0);
-  rusage after{};
-  getrusage(RUSAGE_CHILDREN, &after);
-  const auto ns = [](const rusage &usage) {
-    return static_cast<double>(usage.ru_utime.tv_sec + usage.ru_stime.tv_sec) * 1e9 +
-           static_cast<double>(usage.ru_utime.tv_usec + usage.ru_stime.tv_usec) * 1e3;
-  };
-  return ns(after) - ns(before);
+  return run_program(words).cpu_ns;
 }
 
 double recorded_ns(std::uint64_t frames, bool mjpeg, bool paced, const Program &program) {

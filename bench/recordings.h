@@ -4,7 +4,6 @@
 #define BENCH_RECORDINGS_H
 
 #include <cstdint>
-#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <functional>
@@ -16,21 +15,6 @@
 namespace bench {
 
 namespace fs = std::filesystem;
-
-/// A folder of its own for the recordings and streams, gone at the end.
-class Folder {
- public:
-  Folder() {
-    char name[] = "/tmp/zarvo-bench-XXXXXX";
-    if (mkdtemp(name) == nullptr) std::abort();
-    path_ = name;
-  }
-  ~Folder() { fs::remove_all(path_); }
-  const fs::path &path() const { return path_; }
-
- private:
-  fs::path path_;
-};
 
 /// Real streams of sixteen CIF channels and four audio inputs, so many video frames, at 480 frames a second
 /// or as fast as they are read.

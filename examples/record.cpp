@@ -5,7 +5,6 @@
  * stop, close.
  */
 #include <fcntl.h>
-#include <signal.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -175,9 +174,7 @@ int record(const RecordOptions &options) {
 }  // namespace
 
 int main(int argc, char **argv) {
-  // A full file or a reader that has gone is a write error, not the end of the program.
-  signal(SIGXFSZ, SIG_IGN);
-  signal(SIGPIPE, SIG_IGN);
+  survive_write_errors();
   try {
     return record(parse_options(argc, argv));
   } catch (const UsageError &error) {

@@ -23,11 +23,9 @@ const char *const *frame_rate_list(ZV_VIDEO_STANDARD standard) {
 }
 
 std::string frame_rate_label(const RECORD_FILE_HEADER &header) {
-  const bool ntsc = header.record_height % 240 == 0;
   std::string whole = std::to_string(header.frame_rate);
   std::string cut;
-  for (auto label = frame_rate_list(ntsc ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL); *label != nullptr;
-       ++label) {
+  for (auto label = frame_rate_list(standard_of(header)); *label != nullptr; ++label) {
     if (*label == whole) return whole;
     if (cut.empty() && std::atoi(*label) == header.frame_rate) cut = *label;
   }

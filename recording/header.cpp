@@ -44,6 +44,10 @@ std::optional<ZV_VIDEO_CODEC> codec_of(const RECORD_FILE_HEADER &header) {
   return std::nullopt;
 }
 
+ZV_VIDEO_STANDARD standard_of(const RECORD_FILE_HEADER &header) {
+  return header.record_height % 240 == 0 ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL;
+}
+
 std::string label_of(const RECORD_FILE_HEADER &header) {
   return {header.channel_label, strnlen(header.channel_label, sizeof header.channel_label)};
 }

@@ -43,6 +43,8 @@ std::optional<RECORD_FILE_HEADER> read_header(int file);
 /// Returns the codec of a header; none for an unknown tag: the file is then not a recording.
 std::optional<ZV_VIDEO_CODEC> codec_of(const RECORD_FILE_HEADER &header);
 std::string label_of(const RECORD_FILE_HEADER &header);
+/// Returns the standard that the picture's height tells.
+ZV_VIDEO_STANDARD standard_of(const RECORD_FILE_HEADER &header);
 
 }  // namespace recording
 

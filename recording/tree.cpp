@@ -3,7 +3,9 @@
 
 #include <sys/stat.h>
 
+#include <charconv>
 #include <cstdio>
+#include <string_view>
 
 #include "zv_type.h"
 
@@ -27,6 +29,14 @@ std::string day_name(const std::tm &time) {
   return text;
 }
 
+/// Reads a text of decimal digits alone.
+std::optional<unsigned> number_in(std::string_view digits) {
+  unsigned number = 0;
+  const char *const last = digits.data() + digits.size();
+  const auto [end, error] = std::from_chars(digits.data(), last, number);
+  return error == std::errc{} && end == last ? std::optional(number) : std::nullopt;
+}
+
 void make_folder(const std::string &path) {
   mkdir(path.c_str(), 0777);
 }
@@ -41,8 +51,12 @@ std::tm local_time() {
   return fields;
 }
 
+std::string kind_folder(const std::string &root, Kind kind) {
+  return root + row_of(kind).folder;
+}
+
 std::string day_folder(const std::string &root, Kind kind, const std::tm &time) {
-  return root + row_of(kind).folder + "/" + day_name(time);
+  return kind_folder(root, kind) + "/" + day_name(time);
 }
 
 std::string channel_folder(const std::string &day_folder, unsigned channel) {
@@ -58,8 +72,40 @@ std::string file_name(Kind kind, const std::tm &time, unsigned part) {
   return day_name(time) + hour + number + row_of(kind).extension;
 }
 
+std::optional<NamedHour> parse_file_name(const std::string &name) {
+  constexpr std::size_t kDay = 8, kHour = 11;  // the lengths of "20090303" and "20090303-14"
+  const std::string_view text = name;
+  if (text.size() < kHour || text[kDay] != '-') return std::nullopt;
+  const auto day = number_in(text.substr(0, kDay)), hour = number_in(text.substr(kDay + 1, 2));
+  if (!day || !hour) return std::nullopt;
+  NamedHour named;
+  named.hour.tm_year = static_cast<int>(*day / 10000) - 1900;
+  named.hour.tm_mon = static_cast<int>(*day / 100 % 100) - 1;
+  named.hour.tm_mday = static_cast<int>(*day % 100);
+  named.hour.tm_hour = static_cast<int>(*hour);
+  const std::string_view rest = text.substr(kHour);
+  if (rest.empty()) return named;
+  const std::size_t dot = rest.rfind('.');
+  if (dot == std::string_view::npos) return std::nullopt;
+  named.extension = rest.substr(dot);
+  if (dot == 0) return named;
+  const auto part = rest.front() == '.' ? number_in(rest.substr(1, dot - 1)) : std::nullopt;
+  if (!part) return std::nullopt;
+  named.part = *part;
+  return named;
+}
+
+std::optional<unsigned> parse_channel_folder(const std::string &name) {
+  const auto number = name.size() == 4 && name.starts_with("CH") ? number_in(name.substr(2)) : std::nullopt;
+  return number && *number > 0 ? std::optional(*number - 1) : std::nullopt;
+}
+
+std::string extension_of(Kind kind) {
+  return row_of(kind).extension;
+}
+
 void make_day_folder(const std::string &root, Kind kind, const std::tm &time) {
-  make_folder(root + row_of(kind).folder);
+  make_folder(kind_folder(root, kind));
   const std::string day = day_folder(root, kind, time);
   make_folder(day);
   for (unsigned channel = 0; channel < row_of(kind).channels; ++channel)

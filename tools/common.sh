@@ -103,3 +103,6 @@ wait_until() {
     sleep 0.05
   done
 }
+
+# readme_block LANGUAGE [DOCUMENT]: the code block of the README, or of another document, in that language.
+readme_block() { awk -v begin="\`\`\`$1" '$0 == "```" { inside = 0 } inside; $0 == begin { inside = 1 }' "$ZARVO_ROOT/${2:-README.md}"; }

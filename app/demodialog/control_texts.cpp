@@ -57,7 +57,7 @@ constexpr ControlText kTexts[] = {
     {"btnSetSensitivity", T("Set sensitivity"),
      T("sends the threshold and forgets the channel's motion areas"), kAtOnce},
     {"btnGetSensitivity", T("Get sensitivity"), T("reads the threshold from the card"), kAtOnce},
-    {"comboMotionArea", T("Motion area: channel"), T("channel, 1 to 16"), T("Set uses this channel.")},
+    {"comboMotionArea", T("Motion area: channel"), kChannels, T("Set uses this channel.")},
     {"checkMotionArea", T("Mark"),
      T("checked: motion in the area is ignored; unchecked: it is reported again"), kWithSet},
     {"btnSetMotionArea", T("Set motion area"), T("sends the area to the card"), kAtOnce},

@@ -79,20 +79,14 @@ Result apart(Bench &bench) {
   return pairs == 0 ? skipped("fewer than two inputs have a signal") : held();
 }
 
-struct Row {
-  const char *name;
-  const char *proves;
-  const char *meaning;
-  Result (*run)(Bench &bench);
-};
-constexpr Row kRows[] = {
+constexpr CheckRow kRows[] = {
     {"read.no-error", "No read of audio fails.", "Recordings have gaps in the sound.",
      [](Bench &bench) { return no_read_error(bench.capture(), 2); }},
     {"read.blocks", "A read returns one block for each of the four inputs.", "Inputs are mixed up.", results},
     {"start.soon", "The first block comes within half a second.", "The start of each recording is silent.",
      [](Bench &bench) { return starts_soon(bench.capture(), bench.capture().audio); }},
     {"gap", "No pause between blocks is longer than 0.4 seconds.", "Sound stutters.",
-     [](Bench &bench) { return no_gap(bench.capture().audio, [](const OtherRead &) { return 0u; }); }},
+     [](Bench &bench) { return no_gap(bench.capture().audio); }},
     {"block", "A block has 48 bytes.", "Players do not understand the recording.", block_size},
     {"apart", "The inputs have different sounds.", "Two recordings have the sound of one microphone.", apart},
     {"silence", "An input without a signal is silent.", "The status is wrong, or the input picks up noise.",
@@ -102,8 +96,7 @@ constexpr Row kRows[] = {
 }  // namespace
 
 void add_audio(Checks &checks) {
-  for (const Row &row : kRows)
-    checks.push_back({words("audio.", row.name), row.proves, row.meaning, true, row.run});
+  add_rows(checks, "audio", kRows);
   for (u32 input = 0; input < ZV_AUDIO_CHANNELS; ++input) {
     checks.push_back({words("audio.rate.input-", input + 1), "62.5 blocks a second come, within 1 %.",
                       "Sound and picture drift apart.", true,

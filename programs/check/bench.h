@@ -49,8 +49,6 @@ class Bench {
   u32 cameras();  ///< channels with a picture
   u32 sounds();   ///< audio inputs with a signal
 
-  bool quick() const { return quick_; }
-
   /// Puts everything back. Returns what could not be put back, or an empty text.
   std::string restore();
 

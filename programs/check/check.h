@@ -11,6 +11,8 @@
 #include <string>
 #include <vector>
 
+#include "zv_type.h"
+
 namespace contract {
 
 class Bench;
@@ -59,6 +61,25 @@ struct Check {
   std::function<Result(Bench &)> run;
 };
 using Checks = std::vector<Check>;
+
+/// A row of a theme's table: a check that needs nothing but the card.
+struct CheckRow {
+  const char *name;  ///< without the theme
+  const char *proves;
+  const char *meaning;
+  Result (*run)(Bench &bench);
+};
+/// Adds the rows as quick checks.
+template <typename Rows>
+void add_rows(Checks &checks, const std::string &theme, const Rows &rows) {
+  for (const CheckRow &row : rows)
+    checks.push_back({theme + "." + row.name, row.proves, row.meaning, true, row.run});
+}
+
+/// Returns "ntsc" or "pal".
+inline const char *name_of(u32 standard) {
+  return standard == VIDEO_STANDARD_ZV_PAL ? "pal" : "ntsc";
+}
 
 /// Thrown when the program cannot run at all; what() says why and what to do.
 struct CannotRun : std::runtime_error {

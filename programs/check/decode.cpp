@@ -2,26 +2,21 @@
 #include "decode.h"
 
 #include <cstring>
-#include <memory>
 #include <stdexcept>
 
-extern "C" {
-#include <libavcodec/avcodec.h>
-}
+#include "programs/common/libav.h"
 
 namespace contract {
 namespace {
 
 class Decoder {
  public:
-  explicit Decoder(AVCodecID id) {
+  explicit Decoder(AVCodecID id)
+      : frame_(libav::allocated(av_frame_alloc())), packet_(libav::allocated(av_packet_alloc())) {
     av_log_set_level(AV_LOG_QUIET);
     const AVCodec *const codec = avcodec_find_decoder(id);
-    codec_ = codec != nullptr ? avcodec_alloc_context3(codec) : nullptr;
-    frame_ = av_frame_alloc();
-    packet_ = av_packet_alloc();
-    if (codec_ == nullptr || frame_ == nullptr || packet_ == nullptr)
-      throw std::runtime_error("libavcodec has no decoder, or memory is short");
+    if (codec == nullptr) throw std::runtime_error("libavcodec has no decoder");
+    codec_.reset(libav::allocated(avcodec_alloc_context3(codec)));
     codec_->thread_count = 1;
     codec_->err_recognition = AV_EF_BITSTREAM | AV_EF_BUFFER | AV_EF_EXPLODE;
     if (id == AV_CODEC_ID_ADPCM_G726) {
@@ -29,31 +24,20 @@ class Decoder {
       codec_->bits_per_coded_sample = 3;
       codec_->ch_layout = AV_CHANNEL_LAYOUT_MONO;
     }
-    if (avcodec_open2(codec_, codec, nullptr) < 0) throw std::runtime_error("libavcodec opens no decoder");
+    libav::checked(avcodec_open2(codec_.get(), codec, nullptr), "libavcodec opens no decoder");
   }
-  ~Decoder() {
-    avcodec_free_context(&codec_);
-    av_frame_free(&frame_);
-    av_packet_free(&packet_);
-  }
-  Decoder(const Decoder &) = delete;
-  Decoder &operator=(const Decoder &) = delete;
 
   /// Decodes data, or without data what the decoder still has. Calls `take` for each frame. Returns false on
   /// an error in the data.
   template <typename Take>
   bool decode(const std::vector<u8> &data, Take take) {
     bool good = true;
-    if (data.empty()) {
-      avcodec_send_packet(codec_, nullptr);
-    } else {
-      if (av_new_packet(packet_, static_cast<int>(data.size())) < 0) throw std::bad_alloc();
-      std::memcpy(packet_->data, data.data(), data.size());
-      good = avcodec_send_packet(codec_, packet_) >= 0;
-      av_packet_unref(packet_);
-    }
+    if (data.empty())
+      avcodec_send_packet(codec_.get(), nullptr);
+    else
+      good = libav::send(*codec_, *packet_, data) >= 0;
     int result = 0;
-    while ((result = avcodec_receive_frame(codec_, frame_)) >= 0) {
+    while ((result = avcodec_receive_frame(codec_.get(), frame_.get())) >= 0) {
       if (frame_->decode_error_flags != 0) good = false;
       take(*frame_);
     }
@@ -61,9 +45,9 @@ class Decoder {
   }
 
  private:
-  AVCodecContext *codec_ = nullptr;
-  AVFrame *frame_ = nullptr;
-  AVPacket *packet_ = nullptr;
+  libav::CodecContext codec_;
+  libav::FrameOwner frame_;
+  libav::PacketOwner packet_;
 };
 
 std::vector<u8> plane_of(const AVFrame &frame, int plane, u32 width, u32 height) {
@@ -117,12 +101,12 @@ Decoded decode_mpeg4(const Track &track) {
   return decoded;
 }
 
-Decoded decode_mjpeg(const Track &track, std::size_t every) {
+Decoded decode_mjpeg(const Track &track) {
   Decoded decoded;
   Decoder decoder(AV_CODEC_ID_MJPEG);
   Taker take(decoded);
-  for (std::size_t n = 0; n < track.size(); n += every)
-    if (!decoder.decode(track[n].data, take)) ++decoded.errors;
+  for (const Frame &frame : track)
+    if (!decoder.decode(frame.data, take)) ++decoded.errors;
   return decoded;
 }
 

@@ -25,8 +25,8 @@ struct Decoded {
 
 /// Decodes a track of MPEG-4 frames from its first frame on.
 Decoded decode_mpeg4(const Track &track);
-/// Decodes a track of Motion-JPEG pictures, or only every n-th.
-Decoded decode_mjpeg(const Track &track, std::size_t every = 1);
+/// Decodes a track of Motion-JPEG pictures.
+Decoded decode_mjpeg(const Track &track);
 /// Decodes one Motion-JPEG picture; empty if that fails.
 Image decode_jpeg(const Frame &frame);
 

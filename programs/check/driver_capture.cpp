@@ -156,10 +156,8 @@ DriverCapture capture_at_driver(const Nodes &nodes, const CaptureSetup &setup) {
   DriverCapture capture;
   capture.channels = setup.channels;
   Reader reader(nodes, setup, capture);
-  u32 standard = VIDEO_STANDARD_ZV_NTSC, width = 720;
-  nodes.issue(kVideoInput, driver::VIN_IOC_SET_STANDARD, &standard);
-  nodes.issue(kEncoder, driver::ENC_IOC_SET_STANDARD, &standard);
-  nodes.issue(kDisplay, driver::DISP_IOC_SET_STANDARD, &standard);
+  u32 width = 720;
+  nodes.set_standard(VIDEO_STANDARD_ZV_NTSC);
   nodes.issue(kVideoInput, driver::VIN_IOC_SET_WIDTH, &width);
   set_encoders(nodes, setup.channels);
   nodes.issue(kDisplay, driver::DISP_IOC_PREVIEW_ON);

@@ -46,7 +46,7 @@ struct DriverCapture {
 struct CaptureSetup {
   u32 channels;  ///< CIF at the full rate
   double seconds;
-  double pause;  ///< the host reads nothing for this time, one second after the start
+  double pause;  ///< the host reads nothing for this time, half a second after the start
 };
 
 /// Encodes NTSC, 720 pixels wide, and reads. Leaves both set, and puts the encoders' settings as the SDK

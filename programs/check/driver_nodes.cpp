@@ -85,6 +85,12 @@ u8 Nodes::decoder(u8 chip, u8 address) const {
   return record.value;
 }
 
+void Nodes::set_standard(u32 standard) const {
+  issue(kVideoInput, driver::VIN_IOC_SET_STANDARD, &standard);
+  issue(kEncoder, driver::ENC_IOC_SET_STANDARD, &standard);
+  issue(kDisplay, driver::DISP_IOC_SET_STANDARD, &standard);
+}
+
 void Nodes::write_codec(u32 address, u32 value) const {
   driver::Register record{address, value};
   require(issue(kDisplay, driver::DISP_IOC_WRITE_REG, &record), "writing a codec register");

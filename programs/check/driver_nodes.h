@@ -47,6 +47,8 @@ class Nodes {
   u32 codec(u32 address) const { return read_register(kDisplay, driver::DISP_IOC_READ_REG, address); }
   u32 video_input(u32 address) const { return read_register(kVideoInput, driver::VIN_IOC_READ_REG, address); }
   u8 decoder(u8 chip, u8 address) const;
+  /// Sets the standard of video input, encoder and display.
+  void set_standard(u32 standard) const;
   void write_codec(u32 address, u32 value) const;
   void write_video_input(u32 address, u32 value) const;
   void write_decoder(u8 chip, u8 address, u8 value) const;

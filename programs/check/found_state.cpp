@@ -67,10 +67,11 @@ bool disabled_in(const Image &picture, const ZV_DISPLAY_WINDOW &window) {
   return found.luma < 20 && found.deviation < 2;
 }
 
-void write_back(const Nodes &nodes, Node node, u32 get, u32 set, driver::ChannelValue found) {
+/// Puts a setting of an encoder back, if it has changed.
+void write_back(const Nodes &nodes, u32 get, u32 set, driver::ChannelValue found) {
   driver::ChannelValue now{found.channel, 0};
-  if (nodes.issue(node, get, &now) != 0 || now.value == found.value) return;
-  nodes.issue(node, set, &found);
+  if (nodes.issue(kEncoder, get, &now) != 0 || now.value == found.value) return;
+  nodes.issue(kEncoder, set, &found);
 }
 
 }  // namespace
@@ -134,7 +135,7 @@ void FoundState::note_encoders(const Nodes &nodes) {
       driver::ChannelValue found{channel, 0};
       if (nodes.issue(kEncoder, get, &found) != 0) continue;
       undo_.emplace_back(
-          [get = get, set = set, found](const Nodes &card) { write_back(card, kEncoder, get, set, found); });
+          [get = get, set = set, found](const Nodes &card) { write_back(card, get, set, found); });
     }
     driver::Interval found{channel, 0, 0};
     if (nodes.issue(kEncoder, driver::ENC_IOC_GET_INTERVAL, &found) != 0) continue;
@@ -212,10 +213,8 @@ void FoundState::clear_layout(const Nodes &nodes) const {
 }
 
 void FoundState::restore(const Nodes &nodes) const {
-  u32 standard = standard_, width = resolution_ == RESOLUTION_ZV_704 ? kNarrow : 720;
-  nodes.issue(kVideoInput, driver::VIN_IOC_SET_STANDARD, &standard);
-  nodes.issue(kEncoder, driver::ENC_IOC_SET_STANDARD, &standard);
-  nodes.issue(kDisplay, driver::DISP_IOC_SET_STANDARD, &standard);
+  u32 width = resolution_ == RESOLUTION_ZV_704 ? kNarrow : 720;
+  nodes.set_standard(standard_);
   nodes.issue(kVideoInput, driver::VIN_IOC_SET_WIDTH, &width);
   if (no_layout_) clear_layout(nodes);
   for (const auto &undo : undo_) undo(nodes);

@@ -3,6 +3,7 @@
 
 #include <array>
 #include <cmath>
+#include <cstdlib>
 
 namespace contract {
 namespace {
@@ -49,6 +50,13 @@ Image unpacked(const u8 *uyvy, u32 width, u32 height) {
     image.y.push_back(bytes[3]);
   }
   return image;
+}
+
+std::size_t changed_pixels(const Image &one, const Image &other, int clearly) {
+  std::size_t changed = 0;
+  for (std::size_t at = 0; at < one.y.size(); ++at)
+    changed += std::abs(one.y[at] - other.y[at]) > clearly ? 1 : 0;
+  return changed;
 }
 
 double difference(const Image &one, Area one_area, const Image &other, Area other_area) {

@@ -36,6 +36,9 @@ Tones tones(const Image &image, Area area);
 /// Unpacks a UYVY picture.
 Image unpacked(const u8 *uyvy, u32 width, u32 height);
 
+/// Counts the pixels whose luma differs by more than `clearly` between two pictures of the same size.
+std::size_t changed_pixels(const Image &one, const Image &other, int clearly);
+
 /// Returns the mean difference of luma and chroma between two areas, scaled to 24 x 16 samples each.
 double difference(const Image &one, Area one_area, const Image &other, Area other_area);
 

@@ -35,10 +35,7 @@ u32 first_channel(u32 mask) {
 }
 
 Live::Live(HANDLE card, u32 channels) : card_(card) {
-  ZV_VIDEO_CONFIG config{};
-  config.scale = SCALE_ZV_CIF;
-  config.gop = 30;
-  config.qp = 8;
+  const ZV_VIDEO_CONFIG config = cif_config();
   for (u32 n = 0; n < ZV_CHANNELS; ++n)
     if ((channels >> n & 1) != 0) check(zv_SetVideoEncodeConfig(card, n, &config), "zv_SetVideoEncodeConfig");
   newest = {};

@@ -12,16 +12,6 @@ namespace {
 constexpr double kFrames = 30000.0 / 1001;
 constexpr double kBlocks = 62.5;
 
-u32 channel_of(const Mpeg4Read &frame) {
-  return frame.head.channel;
-}
-u32 channel_of(const MjpegRead &picture) {
-  return picture.descriptor.channel;
-}
-u32 channel_of(const OtherRead &) {
-  return 0;
-}
-
 /// Expects as many reads on each channel of a mask as its rate gives from the first read to the end, but a
 /// few that may still be on their way.
 template <typename Read>
@@ -56,28 +46,17 @@ Result no_lost_frame(const DriverCapture &capture) {
 constexpr double kOnTheWay = 6;
 
 Result preview_rate(Bench &bench) {
-  const auto &reads = bench.full_load().preview;
-  std::size_t pictures = 0;
-  for (std::size_t n = 1; n < reads.size(); ++n) pictures += reads[n].index != reads[n - 1].index ? 1 : 0;
+  const std::size_t pictures = new_pictures(bench.full_load().preview);
   const double expected = (bench.full_load().end - bench.full_load().start) * kFrames;
   return expect(static_cast<double>(pictures) > expected * 0.9 - kOnTheWay,
                 words("about ", expected, " pictures"), pictures);
 }
 
-struct Row {
-  const char *name;
-  const char *proves;
-  const char *meaning;
-  Result (*run)(Bench &bench);
-};
 constexpr const char *kLost = "Recordings of all cameras have gaps.";
 constexpr const char *kPaused = "A busy machine loses frames sooner than it should.";
-constexpr Row kRows[] = {
+constexpr CheckRow kRows[] = {
     {"channels", "All sixteen channels deliver frames at the same time.", kLost,
-     [](Bench &bench) {
-       return channels_seen(bench.full_load(), bench.full_load().mpeg4,
-                            [](const Mpeg4Read &frame) { return channel_of(frame); });
-     }},
+     [](Bench &bench) { return channels_seen(bench.full_load(), bench.full_load().mpeg4); }},
     {"mpeg4.gap", "No gap between the time stamps of a channel is longer than two periods.", kLost,
      [](Bench &bench) { return no_lost_frame(bench.full_load()); }},
     {"mpeg4.complete", "No MPEG-4 frame is missing.", kLost,
@@ -110,8 +89,7 @@ constexpr Row kRows[] = {
 }  // namespace
 
 void add_load(Checks &checks) {
-  for (const Row &row : kRows)
-    checks.push_back({words("load.", row.name), row.proves, row.meaning, true, row.run});
+  add_rows(checks, "load", kRows);
 }
 
 }  // namespace contract

@@ -18,7 +18,7 @@ std::vector<SizeCase> size_cases() {
     for (const u32 width : {720u, 704u})
       for (u32 channel = 0; channel < std::size(kScales); ++channel) {
         const Scale &scale = kScales[channel];
-        const char *const standard = pal ? "pal" : "ntsc";
+        const char *const standard = name_of(pal ? VIDEO_STANDARD_ZV_PAL : VIDEO_STANDARD_ZV_NTSC);
         const u32 lines = pal ? 576 : 480;
         cases.push_back({words(standard, ".", width, ".", scale.name), words("size-", standard, "-", width),
                          channel, scale.full_width ? width : kCifWidth, scale.full_height ? lines : lines / 2,
@@ -33,11 +33,19 @@ Result no_read_error(const DriverCapture &capture, std::size_t stream) {
   return expect(error == 0, "no read fails", error_name(error));
 }
 
-namespace {
-
-u32 channel_of(const MjpegRead &picture) {
-  return picture.descriptor.channel;
+std::array<double, 3> mean_sizes(Bench &bench, std::array<Track, ZV_CHANNELS> Recording::*tracks,
+                                 u32 channel) {
+  std::array<double, 3> means{};
+  for (u32 step = 0; step < means.size(); ++step) {
+    const Track &track = (bench.recording(words("quality-", step)).*tracks)[channel];
+    double bytes = 0;
+    for (const Frame &frame : track) bytes += static_cast<double>(frame.data.size());
+    means[step] = track.empty() ? 0 : bytes / static_cast<double>(track.size());
+  }
+  return means;
 }
+
+namespace {
 
 Result results(Bench &bench) {
   for (const MjpegRead &picture : bench.capture().mjpeg)
@@ -65,11 +73,7 @@ Result eoi(Bench &bench) {
 
 Result qualities(Bench &bench) {
   for (u32 channel = 0; channel < kQualityChannels; ++channel) {
-    std::array<double, 3> mean{};
-    for (u32 step = 0; step < mean.size(); ++step) {
-      const Track &track = bench.recording(words("quality-", step)).mjpeg[channel];
-      mean[step] = track.empty() ? 0 : bytes_of(track) / static_cast<double>(track.size());
-    }
+    const auto mean = mean_sizes(bench, &Recording::mjpeg, channel);
     if (mean[0] >= mean[1] || mean[2] < mean[1] * 0.9 || mean[2] > mean[1] * 1.1)
       return broken("more bytes for medium than for low, the same for high",
                     words(mean[0], ", ", mean[1], ", ", mean[2], " bytes"));
@@ -98,27 +102,21 @@ Result decodes(Bench &bench) {
   return held();
 }
 
-struct Row {
-  const char *name;
-  const char *proves;
-  const char *meaning;
-  Result (*run)(Bench &bench);
-};
-constexpr Row kRows[] = {
+constexpr CheckRow kRows[] = {
     {"read.no-error", "No read of a picture fails.", "Pictures are missing in recordings.",
      [](Bench &bench) { return no_read_error(bench.capture(), 1); }},
     {"read.length", "The result of a read counts descriptor and data.", "The SDK discards pictures.",
      results},
     {"descriptor.channel", "Pictures come from all encoded channels and from no others.",
      "Pictures of one camera are in the recording of another one.",
-     [](Bench &bench) { return channels_seen(bench.capture(), bench.capture().mjpeg, channel_of); }},
+     [](Bench &bench) { return channels_seen(bench.capture(), bench.capture().mjpeg); }},
     {"descriptor.size", "The descriptor tells the size of the picture.", "Pictures have the wrong size.",
      descriptor_size},
     {"eoi", "Each picture ends with an EOI marker.", "Pictures are cut or discarded.", eoi},
     {"start.soon", "The first picture comes within half a second.", "The start of each recording is missing.",
      [](Bench &bench) { return starts_soon(bench.capture(), bench.capture().mjpeg); }},
     {"gap", "No pause between pictures of a channel is longer than 0.4 seconds.", "Recordings stutter.",
-     [](Bench &bench) { return no_gap(bench.capture().mjpeg, channel_of); }},
+     [](Bench &bench) { return no_gap(bench.capture().mjpeg); }},
     {"qualities", "Low quality has fewer bytes than medium, and high as many as medium.",
      "The quality of recordings cannot be chosen.", qualities},
     {"decodes", "Every picture decodes, in each quality.", "Recordings have damaged pictures.", decodes},
@@ -127,8 +125,7 @@ constexpr Row kRows[] = {
 }  // namespace
 
 void add_mjpeg(Checks &checks) {
-  for (const Row &row : kRows)
-    checks.push_back({words("mjpeg.", row.name), row.proves, row.meaning, true, row.run});
+  add_rows(checks, "mjpeg", kRows);
   for (const SizeCase &row : size_cases())
     checks.push_back({"mjpeg.size." + row.name,
                       words("Pictures decode behind the SDK's header to ", row.width, " x ", row.height, "."),

@@ -18,10 +18,7 @@ struct Series {
 bool scene_moves(const Image &one, const Image &other) {
   constexpr int kClearly = 30;
   constexpr std::size_t kPixels = 200;
-  std::size_t changed = 0;
-  for (std::size_t at = 0; at < one.y.size(); ++at)
-    changed += std::abs(one.y[at] - other.y[at]) > kClearly ? 1 : 0;
-  return changed > kPixels;
+  return changed_pixels(one, other, kClearly) > kPixels;
 }
 
 Series take_series(Bench &bench) {

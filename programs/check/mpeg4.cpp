@@ -93,11 +93,7 @@ Result bit_rate(Bench &bench, u32 n) {
 
 Result quantiser(Bench &bench) {
   for (u32 channel = 0; channel < kQualityChannels; ++channel) {
-    std::array<double, 3> mean{};
-    for (u32 step = 0; step < mean.size(); ++step) {
-      const Track &track = bench.recording(words("quality-", step)).mpeg4[channel];
-      mean[step] = track.empty() ? 0 : bytes_of(track) / static_cast<double>(track.size());
-    }
+    const auto mean = mean_sizes(bench, &Recording::mpeg4, channel);
     if (mean[0] <= mean[1] || mean[1] <= mean[2])
       return broken("fewer bytes a frame with quantisers 2, 8, 24",
                     words(mean[0], ", ", mean[1], ", ", mean[2]));
@@ -130,23 +126,14 @@ Result size(Bench &bench, const SizeCase &expected) {
                 decoded.errors, " errors in ", track.size(), " frames");
 }
 
-struct Row {
-  const char *name;
-  const char *proves;
-  const char *meaning;
-  Result (*run)(Bench &bench);
-};
-constexpr Row kRows[] = {
+constexpr CheckRow kRows[] = {
     {"read.no-error", "No read of a frame fails.", "Frames are missing in recordings.",
      [](Bench &bench) { return no_read_error(bench.capture(), 0); }},
     {"read.length", "The result of a read covers descriptor and bitstream.",
      "Recordings end within a frame, or the SDK discards frames.", lengths},
     {"descriptor.channel", "Frames come from all encoded channels and from no others.",
      "Pictures of one camera are in the recording of another one.",
-     [](Bench &bench) {
-       return channels_seen(bench.capture(), bench.capture().mpeg4,
-                            [](const Mpeg4Read &frame) { return frame.head.channel; });
-     }},
+     [](Bench &bench) { return channels_seen(bench.capture(), bench.capture().mpeg4); }},
     {"descriptor.type", "The descriptor names intra frames, and only them.",
      "Recordings do not play from their start: the header stands before the wrong frames.", types},
     {"start.intra", "The first frame of each channel is an intra frame.",
@@ -157,9 +144,7 @@ constexpr Row kRows[] = {
     {"stamp.wall-clock", "Time stamps agree with the wall clock.",
      "Motion and signal loss are noticed too late, or frames arrive late.", stamps_agree},
     {"gap", "No pause between frames of a channel is longer than 0.4 seconds.", "Recordings stutter.",
-     [](Bench &bench) {
-       return no_gap(bench.capture().mpeg4, [](const Mpeg4Read &frame) { return frame.head.channel; });
-     }},
+     [](Bench &bench) { return no_gap(bench.capture().mpeg4); }},
     {"quantiser", "A larger quantiser means fewer bits.", "The quality of recordings cannot be chosen.",
      quantiser},
 };
@@ -171,7 +156,7 @@ void add_rates(Checks &checks, ZV_VIDEO_STANDARD standard) {
   const std::string recording = ntsc ? "rates-ntsc" : "rates-pal";
   const char *const *labels = recording::frame_rate_list(standard);
   for (u32 n = 0; labels[n] != nullptr; ++n)
-    checks.push_back({words("mpeg4.rate.", ntsc ? "ntsc." : "pal.", labels[n]),
+    checks.push_back({words("mpeg4.rate.", name_of(standard), ".", labels[n]),
                       words("The interval gives ", labels[n], " frames a second, within 2 %."),
                       "Recordings play too fast or too slowly.", ntsc && n < kQuickRates, [=](Bench &bench) {
                         const auto exact = recording::exact_frame_rate(standard, n);
@@ -184,8 +169,7 @@ void add_rates(Checks &checks, ZV_VIDEO_STANDARD standard) {
 }  // namespace
 
 void add_mpeg4(Checks &checks) {
-  for (const Row &row : kRows)
-    checks.push_back({words("mpeg4.", row.name), row.proves, row.meaning, true, row.run});
+  add_rows(checks, "mpeg4", kRows);
   for (u32 n = 0; n < kGroupLengths.size(); ++n)
     checks.push_back({words("mpeg4.group.", kGroupLengths[n]),
                       words("An intra frame comes every ", kGroupLengths[n], " frames."),

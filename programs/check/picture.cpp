@@ -75,10 +75,7 @@ double contrast(const Image &image) {
 /// The part of the pixels whose luma differs clearly between two pictures.
 double changed_part(const Image &one, const Image &other) {
   constexpr int kClearly = 24;
-  std::size_t changed = 0;
-  for (std::size_t at = 0; at < one.y.size(); ++at)
-    changed += std::abs(one.y[at] - other.y[at]) > kClearly ? 1 : 0;
-  return static_cast<double>(changed) / static_cast<double>(one.y.size());
+  return static_cast<double>(changed_pixels(one, other, kClearly)) / static_cast<double>(one.y.size());
 }
 
 /// Pixels that are alike in two pictures and in a third one, but differ clearly between the two kinds. Things

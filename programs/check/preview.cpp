@@ -41,10 +41,8 @@ Result indexes(Bench &bench) {
 
 Result rate(Bench &bench) {
   const auto &reads = bench.capture().preview;
-  std::size_t pictures = 0;
-  for (std::size_t n = 1; n < reads.size(); ++n) pictures += reads[n].index != reads[n - 1].index ? 1 : 0;
   const double seconds = reads.size() < 2 ? 1 : reads.back().time - reads.front().time;
-  return expect_between("pictures a second", static_cast<double>(pictures) / seconds, 28, 31.5);
+  return expect_between("pictures a second", static_cast<double>(new_pictures(reads)) / seconds, 28, 31.5);
 }
 
 Result ends(Bench &bench) {
@@ -171,13 +169,7 @@ Result zoom(Bench &bench) {
                 " at the end");
 }
 
-struct Row {
-  const char *name;
-  const char *proves;
-  const char *meaning;
-  Result (*run)(Bench &bench);
-};
-constexpr Row kRows[] = {
+constexpr CheckRow kRows[] = {
     {"read.no-error", "No read of a preview picture fails.", "The preview ends with an error.",
      [](Bench &bench) { return no_read_error(bench.capture(), 3); }},
     {"read.size", "A read returns the bytes of a picture.", "The preview stays black.", results},
@@ -202,14 +194,13 @@ constexpr Row kRows[] = {
 }  // namespace
 
 void add_preview(Checks &checks) {
-  for (const Row &row : kRows)
-    checks.push_back({words("preview.", row.name), row.proves, row.meaning, true, row.run});
+  add_rows(checks, "preview", kRows);
   for (const u32 standard : {u32{VIDEO_STANDARD_ZV_NTSC}, u32{VIDEO_STANDARD_ZV_PAL}})
     for (const u32 resolution : {u32{RESOLUTION_ZV_720}, u32{RESOLUTION_ZV_704}})
-      checks.push_back({words("preview.size.", standard == VIDEO_STANDARD_ZV_PAL ? "pal" : "ntsc", ".",
-                              resolution == RESOLUTION_ZV_704 ? 704 : 720),
-                        "The picture has the size of the standard and the width.", "The preview is torn.",
-                        true, [=](Bench &bench) { return size(bench, standard, resolution); }});
+      checks.push_back(
+          {words("preview.size.", name_of(standard), ".", resolution == RESOLUTION_ZV_704 ? 704 : 720),
+           "The picture has the size of the standard and the width.", "The preview is torn.", true,
+           [=](Bench &bench) { return size(bench, standard, resolution); }});
   constexpr std::array<const char *, MUX_MODE_ZV_INVALID> kLayouts{"1", "4", "6", "8", "9", "16"};
   for (u32 mode = 0; mode < kLayouts.size(); ++mode)
     checks.push_back(

@@ -6,6 +6,7 @@
 #include <thread>
 
 #include "recording.h"
+#include "recording/header.h"
 
 namespace contract {
 
@@ -14,8 +15,10 @@ Image settled_preview(HANDLE card) {
   // that was read last, so another address is a new picture.
   constexpr int kSkip = 4;
   constexpr double kLimit = 2.0;
-  const u32 width = zv_GetResolution(card) == RESOLUTION_ZV_704 ? 704 : 720;
-  const u32 height = zv_GetVideoStandard(card) == VIDEO_STANDARD_ZV_PAL ? 576 : 480;
+  const auto whole_size =
+      recording::picture_size(SCALE_ZV_D1, static_cast<ZV_VIDEO_STANDARD>(zv_GetVideoStandard(card)),
+                              static_cast<ZV_RESOLUTION>(zv_GetResolution(card)));
+  const auto width = static_cast<u32>(whole_size.width), height = static_cast<u32>(whole_size.height);
   u8 *picture = nullptr;
   int size = 0, pictures = 0;
   const double start = monotonic_seconds();

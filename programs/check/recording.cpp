@@ -26,21 +26,13 @@ void on_audio(u32 channel, u8 *data, i32 length, i32 flags) {
   keep(running->audio.at(channel), data, length, flags);
 }
 
-constexpr ZV_VIDEO_CONFIG cif() {
-  ZV_VIDEO_CONFIG config{};
-  config.scale = SCALE_ZV_CIF;
-  config.gop = 30;
-  config.qp = 8;
-  return config;
-}
-
 Setup rates(u32 standard, bool quick) {
   Setup setup;
   setup.standard = standard;
   setup.seconds = quick ? 3 : 12;
   const u32 count = standard == VIDEO_STANDARD_ZV_NTSC ? 16 : 15;
   for (u32 n = 0; n < count; ++n) {
-    setup.config[n] = cif();
+    setup.config[n] = cif_config();
     setup.config[n].interval = static_cast<ZV_INTERVAL_VALUE>(n);
   }
   return setup;
@@ -49,7 +41,7 @@ Setup rates(u32 standard, bool quick) {
 Setup settings() {
   Setup setup;
   setup.seconds = 4;
-  for (u32 n = 0; n <= kTwoFieldChannel; ++n) setup.config[n] = cif();
+  for (u32 n = 0; n <= kTwoFieldChannel; ++n) setup.config[n] = cif_config();
   for (u32 n = 0; n < kGroupLengths.size(); ++n) setup.config[n].gop = kGroupLengths[n];
   for (u32 n = 0; n < kBitRates.size(); ++n) {
     setup.config[kFirstBitRate + n].CBRValue = kBitRates[n];
@@ -63,7 +55,7 @@ Setup quality(u32 step) {
   Setup setup;
   setup.seconds = 1.5;
   for (u32 n = 0; n < kQualityChannels; ++n) {
-    setup.config[n] = cif();
+    setup.config[n] = cif_config();
     setup.config[n].mjpeg = VIDEO_CODEC_ZV_MJPEG;  // only these channels set the quality
     setup.config[n].qp = kQuantisers.at(step);
     setup.config[n].jpeg_qp = static_cast<ZV_JPEG_QUALITY>(step);
@@ -74,7 +66,7 @@ Setup quality(u32 step) {
 Setup sizes(u32 standard, u32 resolution) {
   Setup setup{standard, resolution, 1.5, {}};
   for (u32 n = 0; n < SCALE_ZV_D1; ++n) {
-    setup.config[n] = cif();
+    setup.config[n] = cif_config();
     setup.config[n].scale = static_cast<ZV_SCALE_VALUE>(n + 1);
   }
   return setup;
@@ -96,6 +88,14 @@ double monotonic_seconds() {
   return std::chrono::duration<double>(std::chrono::steady_clock::now().time_since_epoch()).count();
 }
 
+ZV_VIDEO_CONFIG cif_config() {
+  ZV_VIDEO_CONFIG config{};
+  config.scale = SCALE_ZV_CIF;
+  config.gop = 30;
+  config.qp = 8;
+  return config;
+}
+
 double rate_of(const Track &track) {
   if (track.size() < 3) return 0;
   // The slope of a straight line through all arrivals: a single late frame hardly changes it.
@@ -107,18 +107,6 @@ double rate_of(const Track &track) {
     products += from_middle * (track[n].time - track.front().time);
   }
   return products > 0 ? squares / products : 0;
-}
-
-double bytes_of(const Track &track) {
-  double bytes = 0;
-  for (const Frame &frame : track) bytes += static_cast<double>(frame.data.size());
-  return bytes;
-}
-
-double longest_gap(const Track &track) {
-  double gap = 0;
-  for (std::size_t n = 1; n < track.size(); ++n) gap = std::max(gap, track[n].time - track[n - 1].time);
-  return gap;
 }
 
 Setup setup_named(const std::string &name, bool quick) {
@@ -147,7 +135,6 @@ Recording record(HANDLE card, const Setup &setup) {
   recording.start = monotonic_seconds();
   pause_for(setup.seconds);
   check(zv_Stop(card), "zv_Stop");
-  recording.seconds = monotonic_seconds() - recording.start;
   return recording;
 }
 

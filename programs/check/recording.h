@@ -26,17 +26,12 @@ using Track = std::vector<Frame>;
 
 struct Recording {
   double start = 0;  ///< when zv_Start() returned
-  double seconds = 0;
   std::array<Track, ZV_CHANNELS> mpeg4, mjpeg;
   std::array<Track, ZV_AUDIO_CHANNELS> audio;
 };
 
 /// Frames a second; 0 with less than three frames.
 double rate_of(const Track &track);
-/// Bytes of all frames.
-double bytes_of(const Track &track);
-/// The longest time between two frames, in seconds.
-double longest_gap(const Track &track);
 
 struct Setup {
   u32 standard = VIDEO_STANDARD_ZV_NTSC;
@@ -57,6 +52,9 @@ inline constexpr u32 kQualityChannels = 4;
 /// The recordings: rates-ntsc, rates-pal, settings, quality-0 to quality-2, and size-STANDARD-WIDTH, e.g.
 /// size-pal-704, whose channels 0-2 have the scales 1-3.
 Setup setup_named(const std::string &name, bool quick);
+
+/// CIF at the full rate.
+ZV_VIDEO_CONFIG cif_config();
 
 /// Records; the card has the standard and the width of the setup. Throws std::runtime_error.
 Recording record(HANDLE card, const Setup &setup);

@@ -158,24 +158,13 @@ Result board_version(Bench &bench) {
 
 Result display_size(Bench &bench, u32 standard, u32 lines) {
   const Nodes &nodes = bench.nodes();
-  for (const auto &[node, code] : {std::pair{kVideoInput, driver::VIN_IOC_SET_STANDARD},
-                                   std::pair{kEncoder, driver::ENC_IOC_SET_STANDARD},
-                                   std::pair{kDisplay, driver::DISP_IOC_SET_STANDARD}}) {
-    u32 word = standard;
-    nodes.issue(node, code, &word);
-  }
+  nodes.set_standard(standard);
   u32 now = 0;
   nodes.issue(kDisplay, driver::DISP_IOC_GET_HEIGHT, &now);
   return expect(now == lines, words(lines, " lines of a field"), now);
 }
 
-struct Row {
-  const char *name;
-  const char *proves;
-  const char *meaning;
-  Result (*run)(Bench &bench);
-};
-constexpr Row kRows[] = {
+constexpr CheckRow kRows[] = {
     {"steady", "Registers that nobody writes do not change.", "Settings that a program reads are random.",
      steady},
     {"routing.permutation", "Each of the sixteen windows shows another channel.",
@@ -237,13 +226,12 @@ void add_registers(Checks &checks) {
          "zv_get_video_config returns wrong settings.", true,
          [row](Bench &bench) { return encoder_read_back(bench, row.get, row.set, row.values); }});
   for (const u32 standard : {u32{VIDEO_STANDARD_ZV_NTSC}, u32{VIDEO_STANDARD_ZV_PAL}})
-    checks.push_back({words("registers.display.lines-", standard == VIDEO_STANDARD_ZV_PAL ? "pal" : "ntsc"),
+    checks.push_back({words("registers.display.lines-", name_of(standard)),
                       "The display has the lines of the standard.",
                       "The preview is cut or has a black border.", true, [standard](Bench &bench) {
                         return display_size(bench, standard, standard == VIDEO_STANDARD_ZV_PAL ? 288 : 240);
                       }});
-  for (const Row &row : kRows)
-    checks.push_back({words("registers.", row.name), row.proves, row.meaning, true, row.run});
+  add_rows(checks, "registers", kRows);
 }
 
 }  // namespace contract

@@ -10,6 +10,7 @@
 
 #include "check.h"
 #include "driver_capture.h"
+#include "recording.h"
 
 namespace contract {
 
@@ -37,9 +38,19 @@ Result starts_soon(const DriverCapture &capture, const std::vector<Read> &reads)
   return expect(delay < kSoon, words("less than ", kSoon, " s"), delay, " s");
 }
 
+inline u32 channel_of(const Mpeg4Read &frame) {
+  return frame.head.channel;
+}
+inline u32 channel_of(const MjpegRead &picture) {
+  return picture.descriptor.channel;
+}
+inline u32 channel_of(const OtherRead &) {
+  return 0;
+}
+
 /// Expects reads from all encoded channels and from no others.
-template <typename Read, typename ChannelOf>
-Result channels_seen(const DriverCapture &capture, const std::vector<Read> &reads, ChannelOf channel_of) {
+template <typename Read>
+Result channels_seen(const DriverCapture &capture, const std::vector<Read> &reads) {
   u32 seen = 0;
   for (const Read &each : reads) {
     const u32 channel = channel_of(each);
@@ -51,8 +62,8 @@ Result channels_seen(const DriverCapture &capture, const std::vector<Read> &read
 }
 
 /// Expects no long pause between the reads of a channel.
-template <typename Read, typename ChannelOf>
-Result no_gap(const std::vector<Read> &reads, ChannelOf channel_of) {
+template <typename Read>
+Result no_gap(const std::vector<Read> &reads) {
   constexpr double kLongest = 0.4;
   std::map<u32, double> last;
   double longest = 0;
@@ -64,6 +75,17 @@ Result no_gap(const std::vector<Read> &reads, ChannelOf channel_of) {
   if (last.empty()) return broken("data", "none");
   return expect(longest < kLongest, words("less than ", kLongest, " s"), longest, " s");
 }
+
+/// Counts the preview reads that name another buffer than the read before: the new pictures.
+inline std::size_t new_pictures(const std::vector<OtherRead> &reads) {
+  std::size_t pictures = 0;
+  for (std::size_t n = 1; n < reads.size(); ++n) pictures += reads[n].index != reads[n - 1].index ? 1 : 0;
+  return pictures;
+}
+
+/// Returns the mean bytes of a frame of a channel in the recordings quality-0 to quality-2.
+std::array<double, 3> mean_sizes(Bench &bench, std::array<Track, ZV_CHANNELS> Recording::*tracks,
+                                 u32 channel);
 
 }  // namespace contract
 

@@ -4,14 +4,11 @@
 #include "decode.h"
 #include "live.h"
 #include "preview_picture.h"
+#include "recording/header.h"
 #include "zv_display.h"
 
 namespace contract {
 namespace {
-
-const char *name_of(u32 standard) {
-  return standard == VIDEO_STANDARD_ZV_PAL ? "pal" : "ntsc";
-}
 
 Result width_at_driver(Bench &bench, u32 width) {
   const Nodes &nodes = bench.nodes();
@@ -28,10 +25,11 @@ Result during_nothing(Bench &bench, u32 standard, u32 resolution) {
   HANDLE card = bench.sdk(standard, resolution);
   const ZV_DISPLAY *const display = zv_display_open(card, MUX_MODE_ZV_1CH);
   if (display == nullptr) return broken("the display opens", "it does not");
-  const u32 width = resolution == RESOLUTION_ZV_704 ? 704 : 720,
-            height = standard == VIDEO_STANDARD_ZV_PAL ? 576 : 480;
-  return expect(display->width == width && display->height == height, words(width, " x ", height),
-                display->width, " x ", display->height);
+  const auto size = recording::picture_size(SCALE_ZV_D1, static_cast<ZV_VIDEO_STANDARD>(standard),
+                                            static_cast<ZV_RESOLUTION>(resolution));
+  return expect(
+      display->width == static_cast<u32>(size.width) && display->height == static_cast<u32>(size.height),
+      words(size.width, " x ", size.height), display->width, " x ", display->height);
 }
 
 /// settled_preview() fails unless pictures of the new size come.

@@ -50,16 +50,19 @@ Result sdk_stops(Bench &bench) {
   return expect(status == ZV_OK, "zv_DisableWatchDog succeeds", "status ", status);
 }
 
+constexpr const char *kUseless = "The machine is not restarted when it hangs.";
+constexpr const char *kReset = "The machine restarts although the program has ended in order.";
+constexpr CheckRow kRows[] = {
+    {"starts", "The board confirms the start of the watchdog.", kUseless, starts},
+    {"fed", "The board confirms each feeding.", kReset, is_fed},
+    {"stops", "The board confirms the stop of the watchdog.", kReset, stops},
+    {"sdk", "The SDK starts and stops the watchdog.", kReset, sdk_stops},
+};
+
 }  // namespace
 
 void add_watchdog(Checks &checks) {
-  constexpr const char *kUseless = "The machine is not restarted when it hangs.";
-  constexpr const char *kReset = "The machine restarts although the program has ended in order.";
-  checks.push_back(
-      {"watchdog.starts", "The board confirms the start of the watchdog.", kUseless, true, starts});
-  checks.push_back({"watchdog.fed", "The board confirms each feeding.", kReset, true, is_fed});
-  checks.push_back({"watchdog.stops", "The board confirms the stop of the watchdog.", kReset, true, stops});
-  checks.push_back({"watchdog.sdk", "The SDK starts and stops the watchdog.", kReset, true, sdk_stops});
+  add_rows(checks, "watchdog", kRows);
 }
 
 }  // namespace contract

@@ -7,6 +7,11 @@
 
 std::atomic<bool> stopping{false};
 
+void survive_write_errors() {
+  signal(SIGXFSZ, SIG_IGN);
+  signal(SIGPIPE, SIG_IGN);
+}
+
 void catch_stop_signals() {
   struct sigaction action {};
   action.sa_handler = [](int) { stopping = true; };

@@ -15,4 +15,7 @@ extern std::atomic<bool> stopping;
 /// A signal that the caller ignores, as nohup does, stays ignored.
 void catch_stop_signals();
 
+/// After this call a full file and a reader that has gone are errors of a write, not the end of the program.
+void survive_write_errors();
+
 #endif

@@ -7,10 +7,12 @@
 namespace clips {
 namespace {
 
-CodecContext open_codec(const AVCodec *codec, bool global_header) {
+using libav::allocated, libav::checked;
+
+libav::CodecContext open_codec(const AVCodec *codec, bool global_header) {
   if (codec == nullptr)
     throw std::runtime_error("libavcodec has no AAC encoder; write an .mkv, or leave out --audio");
-  CodecContext context(allocated(avcodec_alloc_context3(codec)));
+  libav::CodecContext context(allocated(avcodec_alloc_context3(codec)));
   context->sample_rate = kSampleRate;
   av_channel_layout_default(&context->ch_layout, 1);
   context->time_base = {1, kSampleRate};
@@ -38,11 +40,7 @@ void AacEncoder::add(std::span<const std::uint8_t> block, std::int64_t sample) {
     waiting_.resize(waiting_.size() + static_cast<std::size_t>(std::min<std::int64_t>(missing, kSampleRate)));
     encode_whole_frames();
   }
-  checked(av_new_packet(packet_.get(), static_cast<int>(block.size())), "audio");
-  std::ranges::copy(block, packet_->data);
-  const int sent = avcodec_send_packet(decoder_.get(), packet_.get());
-  av_packet_unref(packet_.get());
-  checked(sent, "audio");
+  checked(libav::send(*decoder_, *packet_, block), "audio");
   while (avcodec_receive_frame(decoder_.get(), decoded_.get()) >= 0) {
     const auto *const samples = reinterpret_cast<const std::int16_t *>(decoded_->data[0]);
     for (int i = 0; i < decoded_->nb_samples; ++i) waiting_.push_back(static_cast<float>(samples[i]) / 32768);

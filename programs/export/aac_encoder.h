@@ -10,7 +10,7 @@
 #include <span>
 #include <vector>
 
-#include "libav.h"
+#include "programs/common/libav.h"
 
 namespace clips {
 
@@ -39,9 +39,9 @@ class AacEncoder {
   void take_packets();
 
   Sink sink_;
-  CodecContext decoder_, encoder_;
-  FrameOwner decoded_, frame_;
-  PacketOwner packet_;
+  libav::CodecContext decoder_, encoder_;
+  libav::FrameOwner decoded_, frame_;
+  libav::PacketOwner packet_;
   std::vector<float> waiting_;  ///< samples that fill no frame yet
   std::int64_t encoded_ = 0;    ///< samples given to the encoder
 };

@@ -2,7 +2,6 @@
 #include "catalogue.h"
 
 #include <algorithm>
-#include <charconv>
 #include <filesystem>
 #include <tuple>
 
@@ -13,42 +12,15 @@ namespace fs = std::filesystem;
 using recording::IndexEntry;
 using Kind = IndexEntry::Kind;
 
-/// Reads a whole number of decimal digits.
-std::optional<int> number_in(std::string_view digits) {
-  int number = 0;
-  const auto [end, error] = std::from_chars(digits.data(), digits.data() + digits.size(), number);
-  if (error != std::errc{} || end != digits.data() + digits.size() || number < 0) return std::nullopt;
-  return number;
-}
-
-/// Reads "20261125-14" or, for a further part of the hour, "20261125-14.1".
-void read_name(std::string_view name, Recording &recording) {
-  const std::size_t dot = std::min(name.find('.'), name.size());
-  const std::string_view hour = name.substr(0, dot);
-  const auto day = number_in(hour.substr(0, 8));
-  if (hour.size() != 11 || hour[8] != '-' || !day || !number_in(hour.substr(9))) return;
-  const auto part = dot == name.size() ? 0 : number_in(name.substr(dot + 1));
-  if (!part) return;
-  std::tm fields{};
-  fields.tm_year = *day / 10000 - 1900;
-  fields.tm_mon = *day / 100 % 100 - 1;
-  fields.tm_mday = *day % 100;
-  fields.tm_hour = *number_in(hour.substr(9));
-  recording.hour = from_local(fields);
-  recording.part = static_cast<unsigned>(*part);
-}
-
-unsigned number_of_folder(const std::string &name) {
-  return name.size() == 4 && name.starts_with("CH")
-             ? static_cast<unsigned>(number_in(name.substr(2)).value_or(0))
-             : 0;
-}
-
 Recording named(const fs::path &path) {
   Recording recording;
   recording.path = path;
-  recording.number = number_of_folder(path.parent_path().filename());
-  read_name(path.stem().string(), recording);
+  if (const auto channel = recording::parse_channel_folder(path.parent_path().filename()))
+    recording.number = *channel + 1;
+  if (const auto name = recording::parse_file_name(path.filename())) {
+    recording.hour = from_local(name->hour);
+    recording.part = name->part;
+  }
   return recording;
 }
 
@@ -70,14 +42,6 @@ std::vector<fs::path> entries_of(const fs::path &folder) {
   return paths;
 }
 
-/// Adds a stretch, to the last one if they touch.
-void append(std::vector<Stretch> &stretches, const Stretch &stretch) {
-  if (!stretches.empty() && stretches.back().to >= stretch.from)
-    stretches.back().to = std::max(stretches.back().to, stretch.to);
-  else
-    stretches.push_back(stretch);
-}
-
 }  // namespace
 
 Recording recording_at(const std::string &path) {
@@ -89,16 +53,15 @@ Recording recording_at(const std::string &path) {
 
 std::vector<Recording> find_recordings(const std::string &root, recording::Kind kind, unsigned number,
                                        const Stretch &stretch) {
-  const bool video = kind == recording::Kind::video;
-  const fs::path folder = fs::path(root) / (video ? "Video" : "Audio");
+  const fs::path folder = recording::kind_folder(root, kind);
   if (!fs::is_directory(folder)) throw std::runtime_error(folder.string() + " is not a folder");
   std::vector<Recording> found;
   for (const fs::path &day : entries_of(folder)) {
     for (const fs::path &channel : entries_of(day)) {
-      const unsigned own = number_of_folder(channel.filename());
-      if (own == 0 || (number != 0 && own != number)) continue;
+      const auto own = recording::parse_channel_folder(channel.filename());
+      if (!own || (number != 0 && *own + 1 != number)) continue;
       for (const fs::path &file : entries_of(channel)) {
-        if (file.extension() != (video ? ".rec" : ".aud")) continue;
+        if (file.extension() != recording::extension_of(kind)) continue;
         Recording recording = named(file);
         if (!recording.hour) continue;
         if (stretch.overlaps({*recording.hour, *recording.hour + kHour + kLateChange}))
@@ -108,7 +71,8 @@ std::vector<Recording> find_recordings(const std::string &root, recording::Kind 
   }
   for (Recording &recording : found) read_index_of(recording);
   std::ranges::sort(found, {}, [](const Recording &r) {
-    return std::tuple(r.number, r.index.empty() ? *r.hour : hour_of(r.index.front().time), r.part);
+    return std::tuple(r.number, r.index.empty() ? *r.hour : recording::hour_begin(r.index.front().time),
+                      r.part);
   });
   return found;
 }

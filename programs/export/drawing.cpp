@@ -98,11 +98,15 @@ void draw_legend(Drawing &drawing, const Stretch &span) {
 void draw(const std::vector<ListedRecording> &rows, const std::string &file, bool force) {
   if (rows.empty()) throw std::runtime_error("nothing is recorded there; nothing is drawn");
   Stretch span = rows.front().contents.recorded;
-  std::map<std::pair<bool, unsigned>, double> lines;  // the y of each channel and input
+  struct Line {
+    std::string name;
+    double y;
+  };
+  std::map<std::pair<bool, unsigned>, Line> lines;  // of each channel and input
   for (const ListedRecording &row : rows) {
     span.from = std::min(span.from, row.contents.recorded.from);
     span.to = std::max(span.to, row.contents.recorded.to);
-    lines[{!row.video, row.recording.number}] = 0;
+    lines[{!row.video, row.recording.number}] = {row.name(), 0};
   }
   span.to = std::max(span.to, span.from + 1000);
   double y = kTop;
@@ -111,12 +115,11 @@ void draw(const std::vector<ListedRecording> &rows, const std::string &file, boo
   draw_legend(drawing, span);
   draw_axis(drawing, span, bottom);
   for (auto &[key, line] : lines) {
-    line = y;
-    drawing.text(kLeft - 8, y + kBar - 5, "end",
-                 (key.first ? "audio " : "channel ") + std::to_string(key.second));
+    line.y = y;
+    drawing.text(kLeft - 8, y + kBar - 5, "end", line.name);
     y += kRow;
   }
-  for (const ListedRecording &row : rows) draw_row(drawing, row, lines[{!row.video, row.recording.number}]);
+  for (const ListedRecording &row : rows) draw_row(drawing, row, lines[{!row.video, row.recording.number}].y);
 
   OutputFile output(file, force);
   std::ofstream stream(output.path());

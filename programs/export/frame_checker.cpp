@@ -1,19 +1,17 @@
 // Decodes frames to find damaged ones.
 #include "frame_checker.h"
 
-#include <algorithm>
-
 namespace clips {
 
 FrameChecker::FrameChecker(ZV_VIDEO_CODEC codec)
-    : picture_(allocated(av_frame_alloc())), packet_(allocated(av_packet_alloc())) {
+    : picture_(libav::allocated(av_frame_alloc())), packet_(libav::allocated(av_packet_alloc())) {
   const AVCodec *const decoder =
       avcodec_find_decoder(codec == VIDEO_CODEC_ZV_MJPEG ? AV_CODEC_ID_MJPEG : AV_CODEC_ID_MPEG4);
-  decoder_.reset(allocated(avcodec_alloc_context3(decoder)));
+  decoder_.reset(libav::allocated(avcodec_alloc_context3(decoder)));
   decoder_->thread_count = 1;
   decoder_->flags |= AV_CODEC_FLAG_LOW_DELAY;
   decoder_->err_recognition = AV_EF_EXPLODE | AV_EF_BITSTREAM | AV_EF_BUFFER;
-  checked(avcodec_open2(decoder_.get(), decoder, nullptr), "cannot decode");
+  libav::checked(avcodec_open2(decoder_.get(), decoder, nullptr), "cannot decode");
 }
 
 std::size_t FrameChecker::whole_frames(const Group &group) {
@@ -25,12 +23,8 @@ std::size_t FrameChecker::whole_frames(const Group &group) {
 }
 
 bool FrameChecker::decodes(std::span<const std::uint8_t> frame) {
-  checked(av_new_packet(packet_.get(), static_cast<int>(frame.size())), "cannot decode");
-  std::copy(frame.begin(), frame.end(), packet_->data);
-  const int sent = avcodec_send_packet(decoder_.get(), packet_.get());
-  av_packet_unref(packet_.get());
-  return sent >= 0 && avcodec_receive_frame(decoder_.get(), picture_.get()) >= 0 &&
-         picture_->decode_error_flags == 0;
+  return libav::send(*decoder_, *packet_, frame) >= 0 &&
+         avcodec_receive_frame(decoder_.get(), picture_.get()) >= 0 && picture_->decode_error_flags == 0;
 }
 
 }  // namespace clips

@@ -5,7 +5,7 @@
 #ifndef EXPORT_FRAME_CHECKER_H
 #define EXPORT_FRAME_CHECKER_H
 
-#include "libav.h"
+#include "programs/common/libav.h"
 #include "stream_reader.h"
 
 namespace clips {
@@ -20,9 +20,9 @@ class FrameChecker {
  private:
   bool decodes(std::span<const std::uint8_t> frame);
 
-  CodecContext decoder_;
-  FrameOwner picture_;
-  PacketOwner packet_;
+  libav::CodecContext decoder_;
+  libav::FrameOwner picture_;
+  libav::PacketOwner packet_;
 };
 
 }  // namespace clips

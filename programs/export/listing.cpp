@@ -13,10 +13,6 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-std::string name_of(const ListedRecording &row) {
-  return (row.video ? "channel " : "audio ") + std::to_string(row.recording.number);
-}
-
 Json as_json(const std::vector<Stretch> &stretches) {
   Json list = Json::array();
   for (const Stretch &stretch : stretches)
@@ -31,13 +27,14 @@ ListedRecording listed(const Recording &recording) {
   return {recording, true, {{*recording.hour, *recording.hour + kHour}, {}, {}}};
 }
 
-}  // namespace
-
+/// Returns the length of all stretches together.
 Milliseconds total(const std::vector<Stretch> &stretches) {
   Milliseconds sum = 0;
   for (const Stretch &stretch : stretches) sum += stretch.to - stretch.from;
   return sum;
 }
+
+}  // namespace
 
 std::vector<ListedRecording> list_recordings(const Options &options) {
   using recording::Kind;
@@ -59,7 +56,7 @@ void print_table(const std::vector<ListedRecording> &rows) {
               "gaps", "file");
   for (const ListedRecording &row : rows) {
     const auto &[recorded, motion, gaps, lost] = row.contents;
-    std::printf("%-11s %-19s  %-19s ", name_of(row).c_str(), local_text(recorded.from).c_str(),
+    std::printf("%-11s %-19s  %-19s ", row.name().c_str(), local_text(recorded.from).c_str(),
                 local_text(recorded.to).c_str());
     const std::string length = row.is_known() ? length_text(recorded.to - recorded.from) : "no index";
     std::printf("%9s ", length.c_str());

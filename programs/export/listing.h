@@ -19,6 +19,8 @@ struct ListedRecording {
   bool video;
   Contents contents;  ///< of video without an index the whole clock hour
 
+  /// Returns "channel 3" or "audio 2".
+  std::string name() const { return (video ? "channel " : "audio ") + std::to_string(recording.number); }
   /// Whether the times are those of the recording.
   bool is_known() const { return !video || !recording.index.empty(); }
 };
@@ -29,9 +31,6 @@ void print_table(const std::vector<ListedRecording> &rows);
 void print_json(const std::vector<ListedRecording> &rows);
 /// Draws an SVG. Throws std::runtime_error if the file cannot be written or exists and `force` is false.
 void draw(const std::vector<ListedRecording> &rows, const std::string &file, bool force);
-
-/// Returns the length of all stretches together.
-Milliseconds total(const std::vector<Stretch> &stretches);
 
 }  // namespace clips
 

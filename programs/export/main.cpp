@@ -39,7 +39,7 @@ void report_missing_hours(const std::vector<Recording> &found, const Stretch &ra
     return hour < range.to &&
            std::ranges::none_of(found, [hour](const Recording &r) { return r.hour == hour; });
   };
-  for (Milliseconds hour = hour_of(range.from); hour < range.to; hour += kHour) {
+  for (Milliseconds hour = hour_begin(range.from); hour < range.to; hour += kHour) {
     const Milliseconds first = hour;
     while (is_missing(hour)) hour += kHour;
     if (hour > first)
@@ -58,11 +58,7 @@ std::vector<Stretch> motion_in(std::vector<Recording> &recordings, const Stretch
     for (Stretch stretch : contents_of(recording.index).motion) {
       stretch.from = std::max(stretch.from - kAroundMotion, range.from);
       stretch.to = std::min(stretch.to + kAroundMotion, range.to);
-      if (stretch.from >= stretch.to) continue;
-      if (!stretches.empty() && stretch.from <= stretches.back().to)
-        stretches.back().to = std::max(stretches.back().to, stretch.to);
-      else
-        stretches.push_back(stretch);
+      if (stretch.from < stretch.to) append(stretches, stretch);
     }
   }
   std::erase_if(recordings, [](const Recording &recording) { return recording.index.empty(); });

@@ -6,6 +6,8 @@
 namespace clips {
 namespace {
 
+using libav::allocated, libav::checked;
+
 constexpr AVRational kSamples{1, kSampleRate};
 
 }  // namespace

@@ -11,8 +11,12 @@
 #include <string>
 #include <vector>
 
+extern "C" {
+#include <libavformat/avformat.h>
+}
+
 #include "aac_encoder.h"
-#include "libav.h"
+#include "programs/common/libav.h"
 #include "video_format.h"
 #include "wall_time.h"
 
@@ -50,7 +54,7 @@ class Muxer {
   AVFormatContext *file_ = nullptr;
   AVStream *video_ = nullptr, *audio_ = nullptr;
   AVRational period_{};
-  PacketOwner packet_;
+  libav::PacketOwner packet_;
   std::unique_ptr<AacEncoder> encoder_;
   std::int64_t heard_ = 0;  ///< where the last audio block ends, in samples
 };

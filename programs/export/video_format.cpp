@@ -14,7 +14,7 @@ constexpr Milliseconds kEarly = 2000;
 
 /// Returns the rate of frames, of both fields where they are encoded together.
 recording::FrameRate frame_rate(const RECORD_FILE_HEADER &header, const std::string &label) {
-  const auto standard = header.record_height % 240 == 0 ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL;
+  const ZV_VIDEO_STANDARD standard = recording::standard_of(header);
   const char *const *const labels = recording::frame_rate_list(standard);
   for (std::size_t row = 0; labels[row] != nullptr; ++row)
     if (labels[row] == label) return recording::exact_frame_rate(standard, row).value();

@@ -1,24 +1,13 @@
 // Reads and prints times of the wall clock.
 #include "wall_time.h"
 
+#include <algorithm>
 #include <cstdio>
 
 #include "programs/common/command_line.h"
 
 namespace clips {
 namespace {
-
-std::tm local_fields(Milliseconds time) {
-  const std::time_t seconds = time / 1000;
-  std::tm fields{};
-  localtime_r(&seconds, &fields);
-  return fields;
-}
-
-std::string formatted(const char *format, const std::tm &fields) {
-  char text[64];
-  return {text, std::strftime(text, sizeof text, format, &fields)};
-}
 
 /// Reads the whole text by a format of strptime().
 bool matches(const std::string &text, const char *format, std::tm &fields) {
@@ -28,14 +17,16 @@ bool matches(const std::string &text, const char *format, std::tm &fields) {
 
 }  // namespace
 
+void append(std::vector<Stretch> &stretches, const Stretch &stretch) {
+  if (!stretches.empty() && stretches.back().to >= stretch.from)
+    stretches.back().to = std::max(stretches.back().to, stretch.to);
+  else
+    stretches.push_back(stretch);
+}
+
 Milliseconds from_local(std::tm fields) {
   fields.tm_isdst = -1;
   return Milliseconds{std::mktime(&fields)} * 1000;
-}
-
-Milliseconds hour_of(Milliseconds time) {
-  const std::tm fields = local_fields(time);
-  return (time / 1000 - fields.tm_min * 60 - fields.tm_sec) * 1000;
 }
 
 Milliseconds parse_time(const std::string &option, const std::string &text,
@@ -45,7 +36,7 @@ Milliseconds parse_time(const std::string &option, const std::string &text,
     if (matches(text, format, fields)) return from_local(fields);
   }
   for (const char *format : {"%H:%M", "%H:%M:%S"}) {
-    std::tm fields = local_fields(after.value_or(0));
+    std::tm fields = recording::local_fields(after.value_or(0));
     fields.tm_sec = 0;
     if (!after || !matches(text, format, fields)) continue;
     const Milliseconds time = from_local(fields);
@@ -55,17 +46,14 @@ Milliseconds parse_time(const std::string &option, const std::string &text,
   throw UsageError(option + ": '" + text + "' is not a time such as \"2026-11-25 14:58\"");
 }
 
-std::string local_text(Milliseconds time) {
-  return formatted("%Y-%m-%d %H:%M:%S", local_fields(time));
-}
-
 std::string utc_text(Milliseconds time) {
   const std::time_t seconds = time / 1000;
   std::tm fields{};
   gmtime_r(&seconds, &fields);
-  char fraction[16];
+  char text[32], fraction[16];
+  std::strftime(text, sizeof text, "%Y-%m-%dT%H:%M:%S", &fields);
   std::snprintf(fraction, sizeof fraction, ".%03d000Z", static_cast<int>(time % 1000));
-  return formatted("%Y-%m-%dT%H:%M:%S", fields) + fraction;
+  return std::string(text) + fraction;
 }
 
 std::string length_text(Milliseconds length) {

@@ -10,12 +10,15 @@
 #include <limits>
 #include <optional>
 #include <string>
+#include <vector>
+
+#include "recording/wall_time.h"
 
 namespace clips {
 
 using Milliseconds = std::int64_t;  ///< since 1970, or a length
 
-inline constexpr Milliseconds kHour = 3600000;
+using recording::hour_begin, recording::kHour, recording::local_text;
 
 /// From `from`, included, to `to`, excluded.
 struct Stretch {
@@ -24,17 +27,17 @@ struct Stretch {
   bool overlaps(const Stretch &other) const { return from < other.to && other.from < to; }
 };
 
+/// Adds a stretch, to the last one if they touch.
+void append(std::vector<Stretch> &stretches, const Stretch &stretch);
+
 /// Returns the time of local date and time.
 Milliseconds from_local(std::tm fields);
-/// Returns the start of the local clock hour.
-Milliseconds hour_of(Milliseconds time);
 
 /// Reads "2026-11-25 14:58" or "2026-11-25 14:58:30", local time. With `after`, the day may be left out: it
 /// is then the first such time behind `after`. Throws UsageError.
 Milliseconds parse_time(const std::string &option, const std::string &text,
                         std::optional<Milliseconds> after = std::nullopt);
 
-std::string local_text(Milliseconds time);     ///< "2026-11-25 14:58:00"
 std::string utc_text(Milliseconds time);       ///< "2026-11-25T13:58:00.120000Z"
 std::string length_text(Milliseconds length);  ///< "1:02:03"
 

@@ -4,6 +4,8 @@
 #include <string>
 
 #include "launch.h"
+#include "recording/tree.h"
+#include "zv_type.h"
 
 namespace {
 
@@ -12,8 +14,8 @@ std::string title_of(const std::string &file) {
   const std::string name = players::base_name(file);
   const std::string folder =
       players::base_name(file.substr(0, file.size() - std::min(file.size(), name.size() + 1)));
-  const bool input = folder.size() == 4 && folder.starts_with("CH0") && folder[3] >= '1' && folder[3] <= '4';
-  return input ? std::string("Audio ") + folder[3] + " - " + name : name;
+  const auto input = recording::parse_channel_folder(folder);
+  return input && *input < ZV_AUDIO_CHANNELS ? "Audio " + std::to_string(*input + 1) + " - " + name : name;
 }
 
 }  // namespace

@@ -10,34 +10,28 @@
 #include <map>
 #include <vector>
 
+#include "recording/tree.h"
+
 namespace fs = std::filesystem;
 
 namespace recorder {
 namespace {
 
-constexpr std::size_t kHourLength = 11;  // "20261125-14"
-
-bool is_digit(char c) {
-  return std::isdigit(static_cast<unsigned char>(c)) != 0;
-}
-
 /// Returns a name with 0 for each digit.
 std::string shape_of(std::string name) {
-  std::replace_if(name.begin(), name.end(), is_digit, '0');
+  std::replace_if(
+      name.begin(), name.end(), [](unsigned char c) { return std::isdigit(c) != 0; }, '0');
   return name;
 }
 
-/// Returns the hour in the name of a recording or an index, or an empty text for another name.
+/// Returns the hour in the name of a recording or an index, as "20261125-14", or an empty text for another
+/// name.
 std::string hour_in(const std::string &name) {
   constexpr const char *kExtensions[] = {".rec", ".idx", ".aud"};
-  if (shape_of(name.substr(0, kHourLength)) != "00000000-00") return "";
-  std::string rest = name.substr(kHourLength);
-  if (rest.size() > 2 && rest[0] == '.' && is_digit(rest[1])) {  // the number of a part
-    const auto end = std::find_if_not(rest.begin() + 1, rest.end(), is_digit);
-    rest.erase(rest.begin(), end);
-  }
-  const bool known = std::find(std::begin(kExtensions), std::end(kExtensions), rest) != std::end(kExtensions);
-  return known ? name.substr(0, kHourLength) : "";
+  const auto named = recording::parse_file_name(name);
+  const bool known = named && std::find(std::begin(kExtensions), std::end(kExtensions), named->extension) !=
+                                  std::end(kExtensions);
+  return known ? name.substr(0, name.find('.')) : "";
 }
 
 /// Returns the entries of a folder; none if it cannot be read.
@@ -69,8 +63,8 @@ std::optional<double> free_percent(const std::string &folder) {
 
 std::string delete_oldest_hour(const std::string &root, const std::set<std::string> &kept) {
   std::map<std::string, std::vector<fs::path>> hours;
-  for (const char *kind : {"Video", "Audio"})
-    for (const fs::path &day : folders_of(fs::path(root) / kind, "00000000"))
+  for (const recording::Kind kind : {recording::Kind::video, recording::Kind::audio})
+    for (const fs::path &day : folders_of(recording::kind_folder(root, kind), "00000000"))
       for (const fs::path &channel : folders_of(day, "CH00"))
         for (const fs::path &file : entries_of(channel))
           if (const std::string hour = hour_in(file.filename()); !hour.empty() && kept.count(hour) == 0)

@@ -31,8 +31,6 @@ class IndexWriter {
 
   /// Writes the lines that are not yet in the file. What the disk does not take is written by a later call.
   void write();
-  /// Returns the descriptor, or -1.
-  int file() const { return file_; }
 
  private:
   void add(recording::IndexEntry::Kind kind, std::int64_t time, std::int64_t offset);

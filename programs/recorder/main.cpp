@@ -84,9 +84,7 @@ int record(const recorder::Options &options) {
 }  // namespace
 
 int main(int argc, char **argv) {
-  // A full file or a reader that has gone is a write error, not the end of the program.
-  signal(SIGXFSZ, SIG_IGN);
-  signal(SIGPIPE, SIG_IGN);
+  survive_write_errors();
   try {
     return record(recorder::parse_options(argc, argv));
   } catch (const UsageError &error) {

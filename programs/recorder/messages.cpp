@@ -2,22 +2,14 @@
 #include "messages.h"
 
 #include <cstdio>
-#include <ctime>
+
+#include "recording/wall_time.h"
 
 namespace recorder {
 
-std::string time_text(std::int64_t time) {
-  const std::time_t seconds = time / 1000;
-  std::tm local{};
-  localtime_r(&seconds, &local);
-  char text[32];
-  std::strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &local);
-  return text;
-}
-
 void Messages::add(const std::string &line, std::int64_t time) {
   const std::lock_guard lock(mutex_);
-  if (lines_.size() < kMost) lines_.push_back(time_text(time) + " " + line);
+  if (lines_.size() < kMost) lines_.push_back(recording::local_text(time) + " " + line);
 }
 
 void Messages::print() {

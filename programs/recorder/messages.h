@@ -15,9 +15,6 @@
 
 namespace recorder {
 
-/// Returns a time in milliseconds since 1970 as local time, "2026-11-25 14:58:01".
-std::string time_text(std::int64_t time);
-
 class Messages {
  public:
   /// Any thread. The line begins with the time of what it tells. Keeps at most kMost lines until they are

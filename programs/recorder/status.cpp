@@ -4,6 +4,8 @@
 #include <algorithm>
 #include <cstdio>
 
+#include "recording/wall_time.h"
+
 namespace recorder {
 namespace {
 
@@ -69,7 +71,7 @@ void Status::compare_with_expected(Messages &messages) {
 
 std::string Status::line() const {
   const Intake &intake = recorder_.intake();
-  std::uint64_t frames = 0, bytes = 0, lost = 0, gaps = 0;
+  std::uint64_t frames = 0, bytes = 0, gaps = 0;
   unsigned streams = 0, silent = 0;
   for (unsigned stream = 0; stream < kStreams; ++stream) {
     if (!intake.records(stream)) continue;
@@ -78,15 +80,14 @@ std::string Status::line() const {
     silent += silent_[stream] ? 1 : 0;
     if (is_video(stream)) frames += arrivals.frames;
     bytes += arrivals.bytes;
-    lost += arrivals.lost + recorder_.writer().dropped(stream);
     gaps += arrivals.gaps;
   }
   const double used =
       100.0 * static_cast<double>(intake.video().used()) / static_cast<double>(intake.video().capacity());
   return format(
       "%s: %u of %u streams, %ju frames, %.0f MiB, %ju lost, %ju gaps, buffer %.0f %%, disk %.1f %% free",
-      time_text(wall_ms()).c_str(), streams - silent, streams, std::uintmax_t{frames},
-      static_cast<double>(bytes) / kMiB, std::uintmax_t{lost}, std::uintmax_t{gaps}, used,
+      recording::local_text(wall_ms()).c_str(), streams - silent, streams, std::uintmax_t{frames},
+      static_cast<double>(bytes) / kMiB, std::uintmax_t{recorder_.lost()}, std::uintmax_t{gaps}, used,
       recorder_.writer().free_percent());
 }
 

@@ -15,6 +15,7 @@
 #include "recording/header.h"
 #include "recording/index.h"
 #include "recording/tree.h"
+#include "recording/wall_time.h"
 
 namespace recorder {
 namespace {
@@ -73,13 +74,8 @@ bool has_space_error(int error) {
 }  // namespace
 
 Hour hour_of(std::int64_t time) {
-  constexpr std::int64_t kHour = 3600000;
-  Hour hour;
-  const std::time_t seconds = time / 1000;
-  localtime_r(&seconds, &hour.local);
-  hour.begin = (seconds - hour.local.tm_min * 60 - hour.local.tm_sec) * 1000;
-  hour.end = hour.begin + kHour;
-  return hour;
+  const std::int64_t begin = recording::hour_begin(time);
+  return {begin, begin + recording::kHour, recording::local_fields(time)};
 }
 
 StreamFiles::StreamFiles(const Options &options, unsigned stream)

@@ -37,9 +37,6 @@ class StreamFiles {
   /// Adds a frame to those that are to be written. Its memory must stay valid until it is written or dropped.
   void queue(const Ring::Taken &taken);
   bool all_written() const { return queue_.empty(); }
-  /// Returns whether a frame is waiting that came at a time or before. After a clock that went back, any
-  /// frame is.
-  bool has_frame_of(std::int64_t time) const;
   /// Returns the position of the oldest frame that is not written.
   std::uint64_t oldest() const { return queue_.front().position; }
 

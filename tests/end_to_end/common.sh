@@ -38,9 +38,6 @@ expect_equal() { [ "$2" = "$3" ] || die "$1: expected '$2', got '$3'"; }
 # expect_decodes FILE...: every file must exist and decode without an error line.
 expect_decodes() { report_streams "$@" || die "not all recordings decode"; }
 
-# readme_block LANGUAGE [DOCUMENT]: the code block of the README, or of another document, in that language.
-readme_block() { awk -v begin="\`\`\`$1" '$0 == "```" { inside = 0 } inside; $0 == begin { inside = 1 }' "$ZARVO_ROOT/${2:-README.md}"; }
-
 # open_program: starts the demo application in $FOLDER/work, on an invisible display.
 open_program() {
   mkdir -p "$FOLDER/work/Data"
@@ -53,6 +50,35 @@ open_program() {
 end_program() {
   close_program
   expect_equal "exit status of the program" 0 "$STATUS"
+}
+
+# wait_for_all: waits for all jobs; the first that fails ends the test.
+wait_for_all() { local job; for job in $(jobs -p); do wait "$job" || exit 1; done; }
+
+# expect_all_faults TABLE: the table, whose rows begin with an item, has each fault of the card. Catches: a new kind of
+# fault that nobody tries.
+expect_all_faults() {
+  local name
+  for name in $("$ZARVO_CARD_PROGRAM" --list | sed -nE 's/^\| `([a-z]+).*/\1/p'); do
+    case $name in cameraN | camera | board | seed | speed | log | state | control) continue ;; esac
+    grep -q "^$name\(=\||\)" <<<"$1" || die "no row for the fault $name"
+  done
+}
+
+# acknowledged LOG: frames and bytes of the MPEG-4 frames that the card's log shows as acknowledged: their callbacks
+# have returned.
+acknowledged() {
+  awk -v descriptor=64 '
+    / read size=1048576 = / { got = $NF }
+    / ENC_IOC_MPEG4_DONE / && got > 0 { ++frames; bytes += got - descriptor; got = 0 }
+    END { print frames + 0, bytes + 0 }' "$1"
+}
+
+# packets FILE: "frames that decode,frames"
+packets() {
+  stream_input "$1"
+  ffprobe -v quiet -count_frames -count_packets -show_entries stream=nb_read_frames,nb_read_packets \
+    -of csv=p=0 "${STREAM[@]}"
 }
 
 # record_cif: chooses 16 CIF channels and starts the recording.

@@ -62,11 +62,7 @@ sanitized() { [[ $(ldd "$CARD") =~ lib(asan|tsan) ]]; }
 # A sanitizer believes what a read returns and looks at as many bytes of the buffer. The reads of video have none.
 ! sanitized || FAULTS=${FAULTS/oversize=mpeg4,audio,preview/oversize=mpeg4}
 
-# Catches: a new kind of fault that nobody tries.
-for name in $("$ZARVO_CARD_PROGRAM" --list | sed -nE 's/^\| `([a-z]+).*/\1/p'); do
-  case $name in cameraN | camera | board | seed | speed | log | state | control) continue ;; esac
-  grep -q "^$name\(=\||\)" <<<"$FAULTS" || die "no test of the fault $name"
-done
+expect_all_faults "$FAULTS"
 
 # end_errors FILE: what ffmpeg says about the recording from its last but one intra frame on.
 end_errors() {
@@ -111,7 +107,6 @@ run_recorder() {
   done <<<"$FAULTS"
   wait_for_all
 }
-wait_for_all() { local job; for job in $(jobs -p); do wait "$job" || exit 1; done; }
 
 # restore_preview FAULT: the preview runs, or has ended with its error line and runs after Stop and Start.
 restore_preview() {

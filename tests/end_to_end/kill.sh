@@ -6,24 +6,8 @@
 # callback has returned.
 . "$(dirname "$0")/common.sh"
 
-readonly DESCRIPTOR_BYTES=64      # in front of each frame in the card's memory; not in the file
 readonly STREAM_HEADER_BYTES=20   # the SDK puts it in front of each intra frame
 readonly STREAM_HEADER_BEGINS='\x00\x00\x01\x20'
-
-# delivered: frames and bytes of the frames that the log shows as acknowledged.
-delivered() {
-  awk -v descriptor=$DESCRIPTOR_BYTES '
-    / read size=1048576 = / { got = $NF }
-    / ENC_IOC_MPEG4_DONE / && got > 0 { ++frames; bytes += got - descriptor; got = 0 }
-    END { print frames + 0, bytes + 0 }' "$FOLDER/card.log"
-}
-
-# packets FILE: "frames that decode,frames"
-packets() {
-  stream_input "$1"
-  ffprobe -v quiet -count_frames -count_packets -show_entries stream=nb_read_frames,nb_read_packets \
-    -of csv=p=0 "${STREAM[@]}"
-}
 
 set_clock '2026-03-03 14:10:00' # far from a change of the hour
 mkdir -p "$FOLDER/work/Data"
@@ -40,7 +24,7 @@ for ((round = 1; round <= ${ZARVO_KILLS:-3}; ++round)); do
   wait "$DEMO" 2>/dev/null || true
   DEMO=
 
-  read -r frames bytes < <(delivered)
+  read -r frames bytes < <(acknowledged "$FOLDER/card.log")
   mapfile -t files < <(find "$FOLDER/work/Data" -name '*.rec')
   expect_equal "files" 16 "${#files[@]}"
   expect "round $round: only $frames frames were delivered" test "$frames" -gt 100

@@ -134,16 +134,13 @@ case $1 in
       sleep "0.$((RANDOM % 900 + 100))"
       kill -9 "$RECORDER"
       wait "$RECORDER" 2>/dev/null || true
-      delivered=$(awk '/ read size=1048576 = / { got = $NF } / ENC_IOC_MPEG4_DONE / && got > 0 { ++frames; got = 0 }
-        END { print frames + 0 }' "$FOLDER/card.log")
+      read -r delivered _ < <(acknowledged "$FOLDER/card.log")
       rm "$FOLDER/card.log"
       part=
       [ "$round" -eq 0 ] || part=.$round
       found=0
       for file in "$ROOT/Video/$DAY"/CH*/"$DAY-14$part.rec"; do
-        stream_input "$file"
-        IFS=, read -r good all < <(ffprobe -v quiet -count_frames -count_packets \
-          -show_entries stream=nb_read_frames,nb_read_packets -of csv=p=0 "${STREAM[@]}")
+        IFS=, read -r good all < <(packets "$file")
         expect "round $round: $file: $good of $all frames decode" test "$((all - good))" -le 1
         found=$((found + all))
       done

@@ -61,9 +61,6 @@ use_tools() {
   quietly "${ON_CARD[@]}" zarvo_check --quick
 }
 
-# readme_block LANGUAGE: the code block of the README in that language.
-readme_block() { awk -v begin="\`\`\`$1" '$0 == "```" { inside = 0 } inside; $0 == begin { inside = 1 }' /test/README.md; }
-
 # build_program LANGUAGE SUFFIX: builds the README's program with CMake and with pkg-config; both must record.
 build_program() {
   local folder=/tmp/$1

@@ -38,7 +38,7 @@ TEST(ExportTimes, AreLocalAndTheDayOfTheSecondMayBeLeftOut) {
   for (const char *wrong : {"", "14", "2026-11-25", "2026-11-25 14:58x", "15:03 "})
     EXPECT_THROW(parse_time("--to", wrong, Milliseconds{0}), UsageError) << wrong;
   EXPECT_THROW(parse_time("--from", "14:58"), UsageError);
-  EXPECT_EQ(length_text(parse_time("--to", "15:03", hour_of(1795618800000)) % kHour), "0:03:00");
+  EXPECT_EQ(length_text(parse_time("--to", "15:03", hour_begin(1795618800000)) % kHour), "0:03:00");
   unsetenv("TZ");
   tzset();
 }

@@ -1,30 +1,33 @@
 /**
  * @file libav.h
- * Owners for the objects of libavcodec and libavformat.
+ * Owners for the objects of libavcodec, and its errors as exceptions. A program that includes this links
+ * libavcodec.
  */
-#ifndef EXPORT_LIBAV_H
-#define EXPORT_LIBAV_H
+#ifndef LIBAV_H
+#define LIBAV_H
 
+#include <algorithm>
+#include <cstdint>
 #include <memory>
 #include <new>
+#include <span>
 #include <stdexcept>
 #include <string>
 
 extern "C" {
 #include <libavcodec/avcodec.h>
-#include <libavformat/avformat.h>
 }
 
-namespace clips {
+namespace libav {
 
-struct LibavDeleter {
+struct Deleter {
   void operator()(AVCodecContext *codec) const { avcodec_free_context(&codec); }
   void operator()(AVFrame *frame) const { av_frame_free(&frame); }
   void operator()(AVPacket *packet) const { av_packet_free(&packet); }
 };
-using CodecContext = std::unique_ptr<AVCodecContext, LibavDeleter>;
-using FrameOwner = std::unique_ptr<AVFrame, LibavDeleter>;
-using PacketOwner = std::unique_ptr<AVPacket, LibavDeleter>;
+using CodecContext = std::unique_ptr<AVCodecContext, Deleter>;
+using FrameOwner = std::unique_ptr<AVFrame, Deleter>;
+using PacketOwner = std::unique_ptr<AVPacket, Deleter>;
 
 /// Passes an object on. Throws std::bad_alloc for null.
 template <typename Object>
@@ -41,6 +44,15 @@ inline int checked(int result, const std::string &what) {
   throw std::runtime_error(what + ": " + text);
 }
 
-}  // namespace clips
+/// Sends a copy of data to a decoder; `packet` is for the copy. Returns what avcodec_send_packet() does.
+inline int send(AVCodecContext &decoder, AVPacket &packet, std::span<const std::uint8_t> data) {
+  checked(av_new_packet(&packet, static_cast<int>(data.size())), "cannot decode");
+  std::ranges::copy(data, packet.data);
+  const int result = avcodec_send_packet(&decoder, &packet);
+  av_packet_unref(&packet);
+  return result;
+}
+
+}  // namespace libav
 
 #endif
