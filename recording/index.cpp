@@ -80,8 +80,8 @@ std::vector<IndexEntry> read_index(const std::string &path) {
 }
 
 std::string index_path(const std::string &recording_path) {
-  const std::size_t dot = recording_path.ends_with(".rec") ? recording_path.size() - 4 : std::string::npos;
-  return recording_path.substr(0, dot) + ".idx";
+  const bool known = recording_path.ends_with(".rec") || recording_path.ends_with(".aud");
+  return recording_path.substr(0, known ? recording_path.size() - 4 : std::string::npos) + ".idx";
 }
 
 }  // namespace recording

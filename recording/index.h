@@ -1,7 +1,7 @@
 /**
  * @file index.h
- * The index beside a recording: a line of JSON for each intra frame and for each event. Readers of recordings
- * work without it.
+ * The index beside a recording: a line of JSON for each intra frame of video, for each second of audio, and
+ * for each event. Readers of recordings work without it.
  */
 #ifndef RECORDING_INDEX_H
 #define RECORDING_INDEX_H
@@ -17,7 +17,7 @@ namespace recording {
 /// One line of an index.
 struct IndexEntry {
   enum class Kind {
-    intra,     ///< an intra frame; the counts are those of the group that it ends
+    intra,     ///< an intra frame or audio block; the counts are those of the group that it ends
     start,     ///< first line of a file: standard, rate, fields, audio
     stop,      ///< last line of a file; the counts of the last group
     gap,       ///< no frame came for `ms` milliseconds; `time` is when the frame after the gap came
@@ -27,9 +27,9 @@ struct IndexEntry {
   };
   Kind kind = Kind::intra;
   std::int64_t time = 0;    ///< wall clock, milliseconds since 1970
-  std::int64_t offset = 0;  ///< byte offset in the recording; the first frame is at 32, behind the header
+  std::int64_t offset = 0;  ///< byte offset in the recording, with the header of video
 
-  std::int64_t frames = 0;  ///< since the last intra frame of this file, with that frame; 0 for the first
+  std::int64_t frames = 0;  ///< or blocks, since the last intra line of this file; 0 for the first
   std::int64_t bytes = 0;   ///< the same for bytes
   std::int64_t motion = 0;  ///< how many of these frames have motion
   std::int64_t lost = 0;    ///< how many of these frames have no video signal
@@ -54,7 +54,7 @@ std::optional<IndexEntry> parse_line(std::string_view line);
 /// cannot be read.
 std::vector<IndexEntry> read_index(const std::string &path);
 
-/// Returns the path of the index that belongs to a recording: ".idx" instead of ".rec".
+/// Returns the path of the index that belongs to a recording: ".idx" instead of ".rec" or ".aud".
 std::string index_path(const std::string &recording_path);
 
 }  // namespace recording

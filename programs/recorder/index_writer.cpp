@@ -60,7 +60,8 @@ void IndexWriter::add_frame(const Frame &frame, std::int64_t offset, std::uint32
     event.ms = frame.gap_ms;
     add(event);
   }
-  if (frame.intra) add(Kind::intra, frame.time, offset);
+  const bool anew = group_.frames == 0 || group_.frames >= least_group_ || lost > 0 || frame.gap_ms > 0;
+  if (frame.intra && anew) add(Kind::intra, frame.time, offset);
   ++group_.frames;
   group_.bytes += frame.length;
   group_.motion += frame.motion ? 1 : 0;

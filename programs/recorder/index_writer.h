@@ -1,6 +1,6 @@
 /**
  * @file index_writer.h
- * Writes the index beside a video file while the file grows.
+ * Writes the index beside a recording while the recording grows.
  */
 #ifndef RECORDER_INDEX_WRITER_H
 #define RECORDER_INDEX_WRITER_H
@@ -16,8 +16,10 @@ namespace recorder {
 
 class IndexWriter {
  public:
-  /// `start` describes the recording.
-  explicit IndexWriter(recording::IndexEntry start) : start_(std::move(start)) {}
+  /// `start` describes the recording. A group has at least `least_group` frames, unless a loss or a gap ends
+  /// it.
+  IndexWriter(recording::IndexEntry start, std::int64_t least_group)
+      : start_(std::move(start)), least_group_(least_group) {}
 
   /// Begins the index of a new file with the frame that it begins with. Takes the descriptor over.
   void begin(int file, std::int64_t time, std::int64_t offset);
@@ -37,10 +39,11 @@ class IndexWriter {
   void add(const recording::IndexEntry &entry);
 
   recording::IndexEntry start_;
+  const std::int64_t least_group_;
   int file_ = -1;
   std::string text_;                          ///< lines that are not yet in the file
   std::vector<recording::IndexEntry> early_;  ///< events that came while there was no index
-  recording::IndexEntry group_;               ///< the counts since the last intra frame
+  recording::IndexEntry group_;               ///< the counts since the last intra line
 };
 
 }  // namespace recorder

@@ -44,6 +44,13 @@ recording::IndexEntry start_entry(const Options &options) {
   return start;
 }
 
+/// How many frames an index counts in a line at least: audio, where every block is intra, has about a line a
+/// second.
+std::int64_t least_group(unsigned stream) {
+  constexpr std::int64_t kBlocksASecond = 62;
+  return is_video(stream) ? 1 : kBlocksASecond;
+}
+
 /// Writes all pieces. Returns 0 or an errno, and how many bytes were written.
 int write_all(int file, std::span<iovec> pieces, std::size_t &written) {
   while (!pieces.empty()) {
@@ -79,7 +86,7 @@ Hour hour_of(std::int64_t time) {
 }
 
 StreamFiles::StreamFiles(const Options &options, unsigned stream)
-    : options_(options), stream_(stream), index_(start_entry(options)) {}
+    : options_(options), stream_(stream), index_(start_entry(options), least_group(stream)) {}
 
 StreamFiles::~StreamFiles() {
   retire(0);
@@ -115,20 +122,24 @@ int StreamFiles::change_file(const Frame &first) {
   hour_ = hour_of(first.time);
   if (const int error = create_part()) return error;
   replace_ = false;
-  offset_ = 0;
-  if (!is_video(stream_)) return 0;
-  const auto header = recording::make_header(
-      options_.codec, recording::picture_size(options_.scale, options_.standard, options_.width),
-      rate_label(options_), stream_);
-  offset_ = sizeof header;
-  errno = ENOSPC;
-  const bool whole = ::write(file_, &header, sizeof header) == sizeof header;
-  const int error = whole ? create_index(first.time) : errno;
+  const int error = begin_file(first.time);
   if (error == 0) return 0;
   unlink(path_.c_str());
   close(file_);
   file_ = -1;
   return error;
+}
+
+/// Writes the header of a new file, if it is video, and creates the index.
+int StreamFiles::begin_file(std::int64_t time) {
+  offset_ = 0;
+  if (!is_video(stream_)) return create_index(time);
+  const auto header = recording::make_header(
+      options_.codec, recording::picture_size(options_.scale, options_.standard, options_.width),
+      rate_label(options_), stream_);
+  offset_ = sizeof header;
+  errno = ENOSPC;
+  return ::write(file_, &header, sizeof header) == sizeof header ? create_index(time) : errno;
 }
 
 /// Creates the first part of the hour that does not exist. Never opens a file that exists.
@@ -139,7 +150,7 @@ int StreamFiles::create_part() {
   bool folders_made = false;
   for (unsigned part = 0;;) {
     path_ = folder + "/" + recording::file_name(kind, hour_.local, part);
-    const bool has_index = is_video(stream_) && access(recording::index_path(path_).c_str(), F_OK) == 0;
+    const bool has_index = access(recording::index_path(path_).c_str(), F_OK) == 0;
     file_ = has_index ? -1 : create_new(path_);
     if (file_ >= 0) break;
     if (has_index || errno == EEXIST) {

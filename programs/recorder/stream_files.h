@@ -1,6 +1,6 @@
 /**
  * @file stream_files.h
- * The files of a stream: one an hour, with its index if it is video. Belongs to the writer's thread.
+ * The files of a stream: one an hour, with its index. Belongs to the writer's thread.
  */
 #ifndef RECORDER_STREAM_FILES_H
 #define RECORDER_STREAM_FILES_H
@@ -71,6 +71,7 @@ class StreamFiles {
   bool belongs_here(const Frame &frame) const;
   int change_file(const Frame &first);
   int create_part();
+  int begin_file(std::int64_t time);
   int create_index(std::int64_t time);
   int write_batch();
   void skip_group();

@@ -224,7 +224,7 @@ case $1 in
     expect_equal "first and last word to the service" 'READY=1 STOPPING=1' \
       "$(grep -xE 'READY=1|STOPPING=1' "$FOLDER/notified" | paste -sd ' ')"
     expect "no gap in the index" test "$(index_sum ms '"gap"')" -ge 4000
-    expect_equal "files" 5 "$(find "$ROOT" -type f ! -name '.*' | wc -l)"
+    expect_equal "files" 6 "$(find "$ROOT" -type f ! -name '.*' | wc -l)"
     for wrong in '--rate 29' '--bps 3M --qp 4' '--min-free 0' '--standard pal --rate 30' 'word'; do
       status=0
       # shellcheck disable=SC2086 # options are words

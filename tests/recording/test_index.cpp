@@ -56,6 +56,7 @@ TEST(Index, StrangeLinesAreSkipped) {
 
 TEST(Index, StandsBesideItsRecording) {
   EXPECT_EQ(index_path("/a.rec/20261125-14.1.rec"), "/a.rec/20261125-14.1.idx");
+  EXPECT_EQ(index_path("20261125-14.aud"), "20261125-14.idx");
 }
 
 }  // namespace
