@@ -69,6 +69,15 @@ std::int64_t whole_seconds(std::int64_t picture) {
   return picture * kTimeBase.num / kTimeBase.den;
 }
 
+/// Marks the frame as two fields, the upper one first. Later versions of the library have flags for it.
+void mark_interlaced(AVFrame &frame) {
+#ifdef AV_FRAME_FLAG_INTERLACED
+  frame.flags |= AV_FRAME_FLAG_INTERLACED | AV_FRAME_FLAG_TOP_FIELD_FIRST;
+#else
+  frame.interlaced_frame = frame.top_field_first = 1;
+#endif
+}
+
 constexpr std::array<u8, 4> kPictureStart{0, 0, 1, 0xB6};
 /// Offset in bits of modulo_time_base, behind start code and picture type: one 1 bit for each second begun.
 constexpr std::size_t kSecondsBit = 34;
@@ -122,7 +131,7 @@ Mpeg4Frame Mpeg4Encoder::encode(const EncodedPicture &picture) {
   frame.width = encoder_->width;
   frame.height = encoder_->height;
   frame.pts = count_;
-  frame.interlaced_frame = frame.top_field_first = settings_.size.interlaced ? 1 : 0;
+  if (settings_.size.interlaced) mark_interlaced(frame);
   frame.quality = encoder_->global_quality;
   const std::array<const u8 *, 3> planes{picture.y.data(), picture.cb.data(), picture.cr.data()};
   for (std::size_t i = 0; i < planes.size(); ++i) {
