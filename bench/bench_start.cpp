@@ -1,5 +1,5 @@
-// From the start of the program to its dialog shown, on the virtual card, offscreen, against an empty
-// QDialog.
+// Measures the time from the start of the program until its dialog is shown (virtual card, offscreen), and
+// compares it with that of an empty QDialog.
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
 #include <spawn.h>

@@ -1,4 +1,4 @@
-// What the SDK's video thread costs a frame, against a bare loop of the same driver calls on the same
+// What the SDK's video thread costs per frame, against a bare loop of the same driver calls on the same
 // ready-made frames; what it copies; what it allocates.
 #include <benchmark/benchmark.h>
 

@@ -72,8 +72,8 @@ double bare_ns(std::uint64_t frames, bool mjpeg) {
   return cost;
 }
 
-/// Writes `frames` frames of the supply, all channels together, as sixteen files with the header the SDK
-/// would have put in front.
+/// Writes sixteen files, one for each channel, with `frames` frames of the supply in total, and with the
+/// stream headers that the SDK puts in front.
 void write_streams(const fs::path &folder, std::uint64_t frames, bool mjpeg, const Program &program) {
   program(folder, frames, mjpeg, false);
   int number = 0;

@@ -1,5 +1,5 @@
-/// What the benchmarks of recording programs share: the frames, a bare loop of driver calls and ffmpeg on the
-/// other side, and the comparison with them.
+/// What the benchmarks of recording programs share: the frames, and the two things a program is compared
+/// with, a bare loop of driver calls and ffmpeg.
 #ifndef BENCH_RECORDINGS_H
 #define BENCH_RECORDINGS_H
 

@@ -1,4 +1,4 @@
-// The least a Qt dialog costs at its start: an empty one, shown, and out.
+// Shows an empty Qt dialog and ends: the least time that a program with a dialog needs to start.
 #include <QApplication>
 #include <QDialog>
 #include <QTimer>

@@ -141,11 +141,11 @@ int zv_SetResolution(HANDLE handle, u32 resolution);
 u32 zv_GetVideoStandard(HANDLE handle);
 
 /**
- * Sets the video standard of inputs, encoder and display. If the display is running (from the first
- * zv_Start() at the latest), opens it again as zv_display_open() does: reads the new size, turns zoom
- * off and applies the stored preview mode. While a picture-in-picture is on, or zoom is on and the
- * stored mode is not the 1-picture layout, zoom stays as it is and the stored mode is not applied: the
- * windows keep the places they had.
+ * Sets the video standard of inputs, encoder and display. If the display is running (the first zv_Start() at
+ * the latest starts it), opens it again as zv_display_open() does: reads the new size, turns zoom off and
+ * applies the stored preview mode. While a picture-in-picture is on, or zoom is on and the stored mode is not
+ * the 1-picture layout, zoom stays as it is and the stored mode is not applied: the windows keep the places
+ * they had.
  *
  * @param handle    the open card
  * @param standard  a ZV_VIDEO_STANDARD, 0 or 1
@@ -203,8 +203,9 @@ int zv_CheckVideoEncodeConfig(HANDLE handle);
  * @param mask    channels, bits 0-15
  * @return ZV_OK; ZV_ERR_PARAM for a bad handle; ZV_ERR_CHANNEL when a bit above 15 is set; ZV_ERR_CONFIG
  *         when a channel of the mask has no scale (prints a line) or zv_CheckVideoEncodeConfig()
- *         refuses: nothing is sent; `enable` stays set and other channels stay wiped, up to the channel
- *         that has no scale
+ *         refuses: nothing is sent, but the stored settings stay changed (`enable` set on the channels of the
+ *         mask, the others wiped): on all channels if zv_CheckVideoEncodeConfig() refuses, else on those up
+ * to the channel without a scale
  *
  * Context: control thread; open. Blocks about 10 ms.
  */

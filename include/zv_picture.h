@@ -74,8 +74,9 @@ int zv_SetPreviewMode(HANDLE handle, u32 mode);
 u32 zv_GetFocusChannel(HANDLE handle);
 
 /**
- * Swaps a channel with the channel in the first display position. The routing changes at once. The card gets
- * the new window records with the next zv_SetPreviewMode(); the preview shows the swap no later than then.
+ * Swaps a channel with the channel in the first display position. The routing in the card changes at once;
+ * depending on the card, the preview shows the swap at once or only with the next zv_SetPreviewMode(), which
+ * sends the new window records.
  *
  * @param handle   the open card
  * @param channel  0-15

@@ -109,8 +109,9 @@ typedef enum ZV_TWOFIELD_MODE { TWOFIELD_DISABLE = 0, TWOFIELD_ENABLE = 1 } ZV_T
 typedef enum ZV_JPEG_QUALITY {
   JPEG_QP_ZV_LOW = 0,
   JPEG_QP_ZV_MEDIUM = 1,
-  JPEG_QP_ZV_HIGH = 2,     /**< the same as medium */
-  JPEG_QP_ZV_UNSUPPORT = 3 /**< the quality of the Motion-JPEG channel before, else medium */
+  JPEG_QP_ZV_HIGH = 2, /**< the same as medium */
+  /** The quality of the nearest Motion JPEG channel with a lower number that has one; medium if none has. */
+  JPEG_QP_ZV_UNSUPPORT = 3
 } ZV_JPEG_QUALITY;
 
 /** Frame rate of a channel, in frames a second. NTSC and PAL names share the same numbers. */
@@ -169,7 +170,7 @@ typedef struct ZV_VIDEO_PROPERTY {
 typedef struct ZV_VIDEO_CONFIG {
   ZV_VIDEO_CODEC mjpeg;       /**< codec of the channel */
   ZV_SCALE_VALUE scale;       /**< picture size; SCALE_ZV_NO_ENCODE: the channel is not encoded */
-  u32 gop;                    /**< MPEG-4: frames from one intra frame to the next, from 1 */
+  u32 gop;                    /**< MPEG-4: frames from one intra frame to the next, at least 1 */
   u32 qp;                     /**< MPEG-4: quantiser, 1 to 31 */
   ZV_INTERVAL_VALUE interval; /**< frame rate */
   ZV_TWOFIELD_MODE twofield;  /**< whether to encode both fields at half height; needs interval 0 */

@@ -4,7 +4,7 @@
  * read counters. Programs that only use the card do not need this header.
  *
  * All functions may be called from any thread. The first use of a device node or of this interface creates
- * the card of this process, with the options of the environment variable ZARVO_VIRTUAL_CARD. Channels count
+ * the card of this process, with the items of the environment variable ZARVO_VIRTUAL_CARD. Channels count
  * from 0 to 15, audio inputs and decoder chips from 0 to 3; items, here and in the environment variable,
  * count from 1. A channel, input or chip that does not exist throws std::out_of_range; ready-made frames may
  * name any channel.
@@ -26,9 +26,10 @@ namespace virtual_card {
 
 // --- Power -------------------------------------------------------------------------------------
 
-/// Puts the card into its power-up state: initial registers, all cameras plugged and moving, real-time
-/// clock, empty queues, no faults, no log of calls, counters zero, no items. What the items log and control
-/// started goes on. While a device node is open, prints a line on standard error and does nothing.
+/// Puts the card into its power-up state: initial registers, all cameras plugged and moving, real-time clock,
+/// empty queues, no faults, no log of calls, counters zero, no items. A log file and a control socket that
+/// the items `log` and `control` have opened stay in use. While a device node is open, prints a line on
+/// standard error and does nothing.
 void reset();
 
 /// Return the number of descriptors of device nodes and the number of mappings of their regions in use.

@@ -16,13 +16,15 @@ struct ControlText {
   const char *counts;
 };
 
-constexpr char kAtNextPreview[] = QT_TRANSLATE_NOOP("DemoDialog", "Counts at the next start of the preview.");
-constexpr char kAtOnce[] = QT_TRANSLATE_NOOP("DemoDialog", "Counts at once.");
-constexpr char kAtRecordStart[] = QT_TRANSLATE_NOOP("DemoDialog", "Counts at the next start of a recording.");
-constexpr char kWithSet[] = QT_TRANSLATE_NOOP("DemoDialog", "Counts when Set is pressed.");
-constexpr char kWithChange[] = QT_TRANSLATE_NOOP("DemoDialog", "Counts when Change is pressed.");
+constexpr char kAtNextPreview[] =
+    QT_TRANSLATE_NOOP("DemoDialog", "Takes effect at the next start of the preview.");
+constexpr char kAtOnce[] = QT_TRANSLATE_NOOP("DemoDialog", "Takes effect at once.");
+constexpr char kAtRecordStart[] =
+    QT_TRANSLATE_NOOP("DemoDialog", "Takes effect at the next start of a recording.");
+constexpr char kWithSet[] = QT_TRANSLATE_NOOP("DemoDialog", "Takes effect when Set is pressed.");
+constexpr char kWithChange[] = QT_TRANSLATE_NOOP("DemoDialog", "Takes effect when Change is pressed.");
 constexpr char kWithSetQp[] =
-    QT_TRANSLATE_NOOP("DemoDialog", "Counts when Set QP is pressed, for the next recording.");
+    QT_TRANSLATE_NOOP("DemoDialog", "Takes effect when Set QP is pressed, for the next recording.");
 constexpr char kForSetAndGet[] = QT_TRANSLATE_NOOP("DemoDialog", "Set and Get use this channel.");
 constexpr char kChannels[] = QT_TRANSLATE_NOOP("DemoDialog", "channel, 1 to 16");
 constexpr char kPixelsAcross[] = QT_TRANSLATE_NOOP("DemoDialog", "pixels from the left, 0 to 720 or 704");
@@ -88,7 +90,7 @@ constexpr ControlText kTexts[] = {
     {"comboQPvalue", T("QP: quantiser"), T("1 (best picture) to 30; excludes a bit rate"), kAtRecordStart},
     {"comboGOPValue", T("GOP: group of pictures"), T("frames from one whole picture to the next"),
      kAtRecordStart},
-    {"edtQPMax", T("MAX: highest quantiser"), T("1 to 59"), kWithSetQp},
+    {"edtQPMax", T("MAX: highest quantiser"), T("1 to 29; with 30 or more no limits are sent"), kWithSetQp},
     {"edtQPMin", T("MIN: lowest quantiser"), T("1 or more, less than MAX"), kWithSetQp},
     {"btnSetQPMinMax", T("Set QP"),
      T("keeps the limits of the quantiser; without a valid pair there are none"), kAtRecordStart},
@@ -111,7 +113,7 @@ constexpr ControlText kTexts[] = {
     {"edtDiskLimit", T("Disk space limited"), T("percent, 10 to 100; with less free space recording stops"),
      kWithChange},
     {"edtTime", T("Check period"), T("seconds, 1 to 59, from check to check of disk space and hour"),
-     T("Counts when Change is pressed, for the next recording.")},
+     T("Takes effect when Change is pressed, for the next recording.")},
     {"edtRecordPath", T("Path"), T("folder of the recordings; it must exist"), kWithChange},
     {"btnFolder", T("Change record settings"), T("takes path, disk space and check period"), kAtOnce},
     {"btnRecordStart", T("Start recording"),

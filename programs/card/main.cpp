@@ -24,7 +24,7 @@ constexpr const char *kUsage = R"(Usage: zarvo_card [OPTION...] ITEM...
 Changes, breaks and watches the virtual card of a running program. The card listens if ZARVO_VIRTUAL_CARD
 held the item control=SOCKET when the program was started.
 
-  ITEM                      e.g. lost=3; "lost=" undoes it. With a time, counted from now, in one word:
+  ITEM                      e.g. lost=3; "lost=" undoes it. With a time, counted from now (quote it):
                             "@5-8 lost=3", "@12 lost=3", "@every 10 for 0.5 stall=mpeg4"
   reset                     undoes all items but those of power-up
   state                     cameras, inputs, encoders, layout and watchdog
@@ -36,7 +36,7 @@ held the item control=SOCKET when the program was started.
   --list                    lists the items: usage, values, effect on the program
   --json                    state and counters as JSON
   --only NODE               log: only encoder, display, audio or video_input
-  --no-reads                log: without reads and the request and release of each frame
+  --no-reads                log: leaves out reads, and commands that request or release a frame
   -h, --help                shows this text
   --version                 shows the version
 

@@ -211,9 +211,10 @@ void add_boundary(Checks &checks) {
   checks.push_back({"boundary.accepts.VIN_IOC_SET_MOTION_MAP",
                     "The command succeeds and touches no byte behind its record.",
                     "Motion thresholds cannot be set (status 16).", true, accepts_motion_map});
-  checks.push_back({"boundary.motion-map.pointer",
-                    "The pointer of a motion map is where this machine has it.",
-                    "Motion detection uses random thresholds.", true, motion_map_layout});
+  checks.push_back(
+      {"boundary.motion-map.pointer",
+       "The driver reads the pointer in a motion map at the offset that this machine's compiler gives it.",
+       "Motion detection uses random thresholds.", true, motion_map_layout});
   checks.push_back({"boundary.motion-levels.size",
                     "Motion levels have 32 bytes, although the command code says 2.",
                     "A program sees wrong motion thresholds after a start.", true, motion_levels_size});

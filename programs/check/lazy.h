@@ -1,6 +1,6 @@
 /**
  * @file lazy.h
- * A value that the first check that needs it makes; the others share it.
+ * A value that several checks share. The first check that needs it makes it.
  */
 #ifndef CONTRACT_LAZY_H
 #define CONTRACT_LAZY_H

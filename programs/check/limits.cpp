@@ -135,8 +135,9 @@ void add_reads(Checks &checks) {
                                {"audio-of-192-bytes", kAudio, 192},
                                {"preview-of-3-bytes", kDisplay, 3}};
   for (const Count &row : kCounts)
-    checks.push_back({words("boundary.read.", row.name, "-is-EINVAL"), "A read of another count is refused.",
-                      "A wrong program reads parts of frames.", true, [row](Bench &bench) {
+    checks.push_back({words("boundary.read.", row.name, "-is-EINVAL"),
+                      "A read with a wrong byte count is refused.", "A wrong program reads parts of frames.",
+                      true, [row](Bench &bench) {
                         std::vector<u8> bytes(0x200000);
                         const ssize_t result = read(bench.nodes().fd(row.node), bytes.data(), row.count);
                         return expect(result < 0 && errno == EINVAL, "EINVAL",

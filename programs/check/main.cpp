@@ -28,8 +28,9 @@ pictures. Prints TAP 14. In the end the card has the settings that it had before
   --only GLOB      runs these checks only, e.g. 'mpeg4.*'; may be given more than once
   --skip GLOB      leaves these checks out; may be given more than once
   --quick          runs the quick checks only: less than a minute
-  --seconds N      how long the load lasts: 1 to 3600, else 10
-  --watchdog       also runs the checks of the watchdog. A board that breaks its promise resets the machine
+  --seconds N      how long the load checks run: 1 to 3600 seconds (10)
+  --watchdog       also runs the checks of the watchdog. A board that does not obey the command to
+                   stop its watchdog resets the machine
   --json           prints one JSON document instead of TAP
   -h, --help       shows this text
   --version        shows the version

@@ -134,7 +134,7 @@ constexpr CheckRow kRows[] = {
     {"descriptor.channel", "Frames come from all encoded channels and from no others.",
      "Pictures of one camera are in the recording of another one.",
      [](Bench &bench) { return channels_seen(bench.capture(), bench.capture().mpeg4); }},
-    {"descriptor.type", "The descriptor names intra frames, and only them.",
+    {"descriptor.type", "The descriptor marks every intra frame as intra, and no other frame.",
      "Recordings do not play from their start: the header stands before the wrong frames.", types},
     {"start.intra", "The first frame of each channel is an intra frame.",
      "The first second of a recording is grey.", starts_with_intra},

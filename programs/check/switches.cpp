@@ -1,4 +1,4 @@
-// Theme switches: another standard or width, during nothing and during preview.
+// Theme switches: changing standard or width while nothing runs, and during preview.
 #include "bench.h"
 #include "check.h"
 #include "decode.h"

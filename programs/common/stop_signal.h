@@ -1,6 +1,6 @@
 /**
  * @file stop_signal.h
- * Ends a program by a signal at a moment of its own choice.
+ * Lets a signal ask the program to end; the program ends at a moment that it chooses.
  */
 #ifndef STOP_SIGNAL_H
 #define STOP_SIGNAL_H

@@ -1,6 +1,6 @@
 /**
  * @file audio_reader.h
- * Reads the blocks of an audio input by the time of the wall clock.
+ * Reads the blocks of an audio input, and says at what wall-clock time each was recorded.
  */
 #ifndef EXPORT_AUDIO_READER_H
 #define EXPORT_AUDIO_READER_H

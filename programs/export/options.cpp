@@ -22,7 +22,7 @@ Makes a clip of recordings without encoding the pictures again, or lists what is
   --to TIME       the same; the day may be left out
   --audio N       adds an audio input, 1 to 4; a clip in mp4 gets it as AAC
   --motion        only the stretches with motion, with 2 seconds before and after each
-  --two-fields    both fields of a frame are a picture each, where no index tells it
+  --two-fields    recordings without an index hold both fields of each frame
   --check         decodes every frame and skips those that are damaged; slower
   --force         overwrites OUT
 
@@ -32,7 +32,8 @@ Makes a clip of recordings without encoding the pictures again, or lists what is
   -h, --help      this text
   --version       the version
 
-Exit status: 0 done, 1 no clip, 2 wrong use, 3 the clip is whole, but the lines on standard error say what it lacks.
+Exit status: 0 done, 1 no clip, 2 wrong use, 3 the clip is written and plays,
+but lacks what the lines on standard error name.
 )";
 
 enum Letter { root = 1, channel, from, to, audio, motion, two_fields, check, force, list, json, svg };

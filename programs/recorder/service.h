@@ -1,6 +1,7 @@
 /**
  * @file service.h
- * What makes the program a service: word to systemd, and one recorder a root.
+ * What makes the program a service: it reports its state to systemd, and a lock allows only one recorder in
+ * each root.
  */
 #ifndef RECORDER_SERVICE_H
 #define RECORDER_SERVICE_H

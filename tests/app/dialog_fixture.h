@@ -1,7 +1,7 @@
 /**
  * @file dialog_fixture.h
- * The dialog on the virtual card, offscreen. Each test starts with the card and the module state as
- * built, and leaves no descriptor and no mapping behind.
+ * The dialog on the virtual card, offscreen. Each test starts with a card at power-up and with the module
+ * state of a new program, and leaves no descriptor and no mapping behind.
  */
 #ifndef DIALOG_FIXTURE_H
 #define DIALOG_FIXTURE_H

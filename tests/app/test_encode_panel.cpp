@@ -27,7 +27,7 @@ TEST_F(EncodePanel, QualityAndFieldModeDecideTheChannels) {
   }
 }
 
-// Choosing a quantiser or a bit rate puts the other back.
+// Choosing a quantiser resets the bit rate, and choosing a bit rate resets the quantiser.
 TEST_F(EncodePanel, ItemsStandForTheirValues) {
   const auto stored = [] { return std::tuple(zv_config.qp, zv_config.CBREnable, zv_config.CBRValue); };
   for (int n = 1; n < dialog->comboCBRValue->count(); ++n) {

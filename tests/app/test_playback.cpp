@@ -17,7 +17,8 @@ class Playback : public RecordingTest {
     fs::permissions(path, fs::perms::owner_all);
   }
 
-  /// Presses Open and chooses a file, types its name, or cancels the choice for an empty one.
+  /// Presses Open, then selects `file` in the chooser, or types its name if `typed`. If `file` is empty,
+  /// cancels the chooser.
   std::string play(const std::string &file, bool typed = false) {
     QTimer::singleShot(0, dialog.get(), [&] {
       auto *const chooser = qobject_cast<QFileDialog *>(QApplication::activeModalWidget());

@@ -65,8 +65,8 @@ TEST_F(Recording, HeaderTellsWhatThePanelShows) {
   }
 }
 
-// Faults: a buffered stream would keep what a callback was given from the disk until the stop; a pipe in a
-// file's place would hold the dialog.
+// Catches: a buffered stream, which writes a callback's data only at the stop; a pipe in the place of a file,
+// which blocks the dialog.
 TEST_F(Recording, CallbacksWriteOnlyOpenFilesAndMeterTheMpeg4Rate) {
   g_record_ch = 3;
   dialog->CheckFolder(g_filepath);

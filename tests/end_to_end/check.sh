@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # zarvo_check on the virtual card.
-#   check.sh run      the quick checks hold, prove and JSON agree; the list in the documentation; when it cannot run
+#   check.sh run      all quick checks hold; TAP, read by the program `prove`, and JSON give the same results; the
+#                     table in the document is right; message and status when zarvo_check cannot run
 #   check.sh faults   each fault of the card makes checks of the right theme fail
 #   check.sh short    checks that need no speed: for the builds with a sanitizer, which ends the program on a fault
 #   check.sh kill     killed at random moments, it leaves the card as it was. ZARVO_KILLS is the number of kills (6).

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Clicks Start and Stop of the preview 50 times as fast as xdotool can. Catches: a lost Stop, or a second
-# thread in SDL, which leaves a window, hangs the dialog or crashes the program.
+# Clicks Start and Stop of the preview 50 times, as fast as xdotool can click. Catches: a lost Stop, or a
+# second thread in SDL, which leaves a window, hangs the dialog or crashes the program.
 . "$(dirname "$0")/common.sh"
 
 open_program

@@ -1,4 +1,5 @@
-// How zarvo_export splits files: byte by byte, with what a disk leaves of them.
+// How zarvo_export splits files into frames: correct files, torn files, and files in which blocks of the disk
+// are missing.
 #include <gmock/gmock.h>
 
 #include <cstdio>

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Puts includes into a copy of the tree, one at a time. Catches: an arrow that tools/check-arrows does not guard,
-# a spelling of an include that it does not see, an include in order that it refuses.
+# Puts includes into a copy of the tree, one at a time. Catches: an arrow that tools/check-arrows does not
+# guard, a spelling of an include that it does not see, a correct include that it refuses.
 set -euo pipefail
 cd "$(dirname "${BASH_SOURCE[0]}")/../.."
 COPY=$(mktemp -d)

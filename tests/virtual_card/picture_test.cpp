@@ -1,4 +1,4 @@
-// The engine of the picture side's tests, and the decoders of a host.
+// For the tests of the picture side: drives an engine, and decodes its frames as a host does.
 #include "picture_test.h"
 
 #include <cstdlib>

@@ -1,4 +1,4 @@
-// The field before a field, and the clock text of a field.
+// Returns the field that precedes a field, and builds the clock text that a field shows.
 #include "field.h"
 
 #include <ctime>
