@@ -21,8 +21,7 @@ constexpr int kCannotRun = 2;
 
 constexpr const char *kUsage = R"(Usage: zarvo_check [OPTION...]
 
-Asks the card of this machine and its driver whether they keep the contract with the SDK, and looks into the
-pictures. Prints TAP 14. In the end the card has the settings that it had before.
+Tests whether the card of this machine and its driver behave as the SDK expects, and examines the pictures. Prints TAP 14. In the end the card has the settings that it had before.
 
   --list           lists the checks and what each proves
   --only GLOB      runs these checks only, e.g. 'mpeg4.*'; may be given more than once
@@ -143,7 +142,7 @@ int run(const Options &options) {
   const std::string left = bench.restore();
   report.end(bail_out);
   if (!left.empty())
-    std::fprintf(stderr, "zarvo_check: the card does not have its old settings again: %s\n", left.c_str());
+    std::fprintf(stderr, "zarvo_check: some settings of the card could not be restored: %s\n", left.c_str());
   return !bail_out.empty() ? kCannotRun : report.all_hold() && left.empty() ? 0 : kNotAllHold;
 }
 

@@ -28,7 +28,7 @@ constexpr char kHelp[] =
     "  --bps LABEL         mpeg4: constant bit rate instead of --qp: 64k, 128k, 256k, 512k, 1M to 10M\n"
     "  --min-free PERCENT  how much of the disk stays free, 1 to 99 (5)\n"
     "  --when-full NAME    what to do when less is free: stop, or delete-oldest (stop)\n"
-    "  --sync SECONDS      how much a power cut may cost, 1 to 3600 (1)\n"
+    "  --sync SECONDS      how many seconds a power cut may cost, 1 to 3600 (1)\n"
     "  --buffer MIB        memory for what the disk does not take in time, 1 to 4096 (64)\n"
     "  --quiet             no status line each minute\n"
     "  -h, --help          this text\n"
