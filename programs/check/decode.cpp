@@ -80,7 +80,7 @@ class Taker {
       decoded_.one_size = false;
     decoded_.width = width;
     decoded_.height = height;
-    decoded_.interlaced = frame.interlaced_frame != 0;
+    decoded_.interlaced = libav::is_interlaced(frame);
     ++decoded_.pictures;
     decoded_.last = image_of(frame);
   }

@@ -36,6 +36,15 @@ Object *allocated(Object *object) {
   return object;
 }
 
+/// Whether a decoded picture consists of two fields. Later versions of the library have a flag for it.
+inline bool is_interlaced(const AVFrame &frame) {
+#ifdef AV_FRAME_FLAG_INTERLACED
+  return (frame.flags & AV_FRAME_FLAG_INTERLACED) != 0;
+#else
+  return frame.interlaced_frame != 0;
+#endif
+}
+
 /// Throws if a call has failed, for example "clip.mkv.part: No space left on device".
 inline int checked(int result, const std::string &what) {
   if (result >= 0) return result;

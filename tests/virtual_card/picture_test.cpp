@@ -5,6 +5,7 @@
 #include <cstring>
 
 #include "picture/encoded_picture.h"
+#include "programs/common/libav.h"
 #include "zv_lib/stream_headers.h"
 
 extern "C" {
@@ -134,7 +135,7 @@ std::vector<Frame> PictureTest::take(card::FrameQueue &stream) {
     }
     frame.width = static_cast<u32>(picture->width);
     frame.height = static_cast<u32>(picture->height);
-    frame.interlaced = picture->interlaced_frame != 0;
+    frame.interlaced = libav::is_interlaced(*picture);
     frame.samples.resize(std::size_t{frame.width} * frame.height * 3 / 2);
     av_image_copy_to_buffer(frame.samples.data(), static_cast<int>(frame.samples.size()), picture->data,
                             picture->linesize, AV_PIX_FMT_YUV420P, picture->width, picture->height, 1);
