@@ -44,6 +44,12 @@ std::optional<ZV_VIDEO_CODEC> codec_of(const RECORD_FILE_HEADER &header) {
   return std::nullopt;
 }
 
+std::string_view intra_start(ZV_VIDEO_CODEC codec) {
+  using namespace std::string_view_literals;
+  // The MPEG-4 stream header begins with the start codes of an object and of a layer.
+  return codec == VIDEO_CODEC_ZV_MJPEG ? "\xFF\xD8\xFF"sv : "\0\0\1\0\0\0\1\x20"sv;
+}
+
 ZV_VIDEO_STANDARD standard_of(const RECORD_FILE_HEADER &header) {
   return header.record_height % 240 == 0 ? VIDEO_STANDARD_ZV_NTSC : VIDEO_STANDARD_ZV_PAL;
 }

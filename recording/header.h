@@ -10,6 +10,7 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <string_view>
 
 #include "zv_type.h"
 
@@ -42,6 +43,8 @@ RECORD_FILE_HEADER make_header(ZV_VIDEO_CODEC codec, PictureSize size, const std
 std::optional<RECORD_FILE_HEADER> read_header(int file);
 /// Returns the codec of a header; none for an unknown tag: the file is then not a recording.
 std::optional<ZV_VIDEO_CODEC> codec_of(const RECORD_FILE_HEADER &header);
+/// Returns the bytes that each intra frame of a recording begins with.
+std::string_view intra_start(ZV_VIDEO_CODEC codec);
 std::string label_of(const RECORD_FILE_HEADER &header);
 /// Returns the standard that the picture's height tells.
 ZV_VIDEO_STANDARD standard_of(const RECORD_FILE_HEADER &header);

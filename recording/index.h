@@ -57,6 +57,16 @@ std::vector<IndexEntry> read_index(const std::string &path);
 /// Returns the path of the index that belongs to a recording: ".idx" instead of ".rec" or ".aud".
 std::string index_path(const std::string &recording_path);
 
+/// As much of an index as fits its recording: the dialog overwrites a recording but not its index.
+struct FittingIndex {
+  std::vector<IndexEntry> entries;
+  /// The offset of the first entry that does not fit; that and all behind it are left out. If no entry is
+  /// left, the index is that of another recording.
+  std::optional<std::int64_t> misfit;
+};
+/// Reads the index beside a recording. A recording that cannot be read has all of its index.
+FittingIndex fitting_index(const std::string &recording_path);
+
 }  // namespace recording
 
 #endif

@@ -6,7 +6,6 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
 #include <cstring>
 
@@ -18,13 +17,9 @@ constexpr std::size_t kChunk = 1 << 18;
 // The last byte of MPEG-4 start codes 00 00 01 xx. The stream header in front of an intra frame begins with
 // kObject.
 constexpr int kObject = 0x00;
-constexpr int kLayer = 0x20;
 constexpr int kPicture = 0xB6;
 constexpr int kZeros = -1;  ///< three zero bytes: no frame contains them
 constexpr int kEnd = -2;
-
-constexpr std::array<std::uint8_t, 8> kIntraStart{0, 0, 1, kObject, 0, 0, 1, kLayer};
-constexpr std::array<std::uint8_t, 3> kJpegStart{0xFF, 0xD8, 0xFF};
 
 // Second bytes of JPEG markers.
 constexpr int kEndOfImage = 0xD9;
@@ -55,6 +50,7 @@ StreamReader::StreamReader(const std::string &path) : path_(path), header_(), co
   }
   header_ = *header;
   codec_ = *codec;
+  intra_ = recording::intra_start(codec_);
   seek(sizeof header_);
 }
 
@@ -107,26 +103,19 @@ bool StreamReader::next(Group &group) {
 }
 
 bool StreamReader::at_intra() {
-  const auto matches = [this](const auto &pattern) {
-    return has(start_ + pattern.size() - 1) &&
-           std::equal(pattern.begin(), pattern.end(), buffer_.begin() + static_cast<std::ptrdiff_t>(start_));
-  };
-  return codec_ == VIDEO_CODEC_ZV_MJPEG ? matches(kJpegStart) : matches(kIntraStart);
+  return has(start_ + intra_.size() - 1) &&
+         std::memcmp(buffer_.data() + start_, intra_.data(), intra_.size()) == 0;
 }
 
 /// Returns where the next intra frame begins, or the end of the data.
 std::size_t StreamReader::find_intra(std::size_t at) {
-  const auto search = [&](const auto &pattern) {
-    while (has(at + pattern.size() - 1)) {
-      const auto end = buffer_.begin() + static_cast<std::ptrdiff_t>(filled_);
-      const auto found =
-          std::search(buffer_.begin() + static_cast<std::ptrdiff_t>(at), end, pattern.begin(), pattern.end());
-      if (found != end) return static_cast<std::size_t>(found - buffer_.begin());
-      at = filled_ - (pattern.size() - 1);
-    }
-    return filled_;
-  };
-  return codec_ == VIDEO_CODEC_ZV_MJPEG ? search(kJpegStart) : search(kIntraStart);
+  while (has(at + intra_.size() - 1)) {
+    const std::string_view data(reinterpret_cast<const char *>(buffer_.data()), filled_);
+    const std::size_t found = data.find(intra_, at);
+    if (found != std::string_view::npos) return found;
+    at = filled_ - (intra_.size() - 1);
+  }
+  return filled_;
 }
 
 /// Moves `at` to the next start code and returns its last byte, or kZeros, or kEnd.
@@ -156,7 +145,7 @@ int StreamReader::find_start_code(std::size_t &at) {
 
 /// Finds the frames of the group that begins at start_. Returns its end.
 std::size_t StreamReader::split_mpeg4(Group &group) {
-  std::size_t at = start_ + kIntraStart.size();
+  std::size_t at = start_ + intra_.size();
   std::size_t frame = start_;        // where the current frame begins
   std::optional<std::size_t> whole;  // how many frames come before the first damaged one
   bool has_picture = false;          // in the current frame

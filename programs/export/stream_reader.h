@@ -11,6 +11,7 @@
 #include <span>
 #include <stdexcept>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "recording/header.h"
@@ -64,6 +65,7 @@ class StreamReader {
   std::string path_;
   RECORD_FILE_HEADER header_;
   ZV_VIDEO_CODEC codec_;
+  std::string_view intra_;  ///< what an intra frame begins with
   int file_;
   bool ended_ = false;
   std::vector<std::uint8_t> buffer_;

@@ -17,7 +17,7 @@ const char *stream_format(ZV_VIDEO_CODEC codec) {
 /// Returns the pictures a second, as ffplay reads them; empty when unknown. The index beside a recording
 /// tells the rate without doubt, and whether both fields of a frame are a picture each.
 std::string picture_rate(const RECORD_FILE_HEADER &header, const std::string &file) {
-  for (const recording::IndexEntry &entry : recording::read_index(recording::index_path(file))) {
+  for (const recording::IndexEntry &entry : recording::fitting_index(file).entries) {
     if (entry.kind != recording::IndexEntry::Kind::start) continue;
     if (entry.fields != 2) return entry.rate;
     char twice[32];
