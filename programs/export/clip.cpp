@@ -15,6 +15,8 @@ namespace {
 constexpr std::size_t kStreamHeader = 20;
 /// A clip that misses less than this at its ends has what was asked for.
 constexpr Milliseconds kNear = 1000;
+/// The offset of the first frame of a recording.
+constexpr std::int64_t kFirstFrame = sizeof(RECORD_FILE_HEADER);
 
 /// Returns the offset of the last intra frame at or before a time; 0 without an index.
 std::int64_t intra_before(const Recording &recording, Milliseconds time) {
@@ -76,8 +78,8 @@ void Clip::add_group(const Recording &recording, Group &group) {
   }
   const std::string stray = std::exchange(stray_, "");
   place_frames(group);
-  const Milliseconds begin = timeline_->time_of(periods_.front());
-  const Milliseconds end = timeline_->time_of(periods_.back() + 1);
+  const Milliseconds begin = timeline_->time_of(places_.front().period);
+  const Milliseconds end = timeline_->time_of(places_.back().period + 1);
   while (stretch_ < stretches_.size() && stretches_[stretch_].to <= begin) {
     ++stretch_;
     writing_ = false;
@@ -93,28 +95,45 @@ void Clip::add_group(const Recording &recording, Group &group) {
   if (!stray.empty()) report_.skipped(stray);
   check_frames(recording, group);
   if (group.sizes.empty()) return;
+  // Files that the user names follow each other, whatever is between them.
+  const bool joined = writing_ && (options_.files.empty() || group.offset > kFirstFrame);
   if (!writing_) begin_stretch(recording, group);
-  std::size_t at = 0;
-  for (std::size_t frame = 0; frame < group.sizes.size(); at += group.sizes[frame++]) {
-    const Milliseconds time = timeline_->time_of(periods_[frame]);
-    if (time >= stretch.to) break;
-    write_audio(time);
-    next_ = periods_[frame] - shift_;
-    muxer_->write_video(group.data.subspan(at, group.sizes[frame]), next_++, frame == 0);
-  }
+  write_frames(group, stretch.to, joined);
   show_progress();
 }
 
+/// Writes the frames in front of a time. `joined`: the clip should have no hole in front of them.
+void Clip::write_frames(const Group &group, Milliseconds until, bool joined) {
+  std::size_t at = 0;
+  for (std::size_t frame = 0; frame < group.sizes.size(); at += group.sizes[frame++]) {
+    const Timeline::Place &place = places_[frame];
+    const Milliseconds time = timeline_->time_of(place.period);
+    if (time >= until) break;
+    if (place.hole > 0 && (joined || frame > 0)) report_hole(place);
+    write_audio(time);
+    next_ = place.period - shift_;
+    muxer_->write_video(group.data.subspan(at, group.sizes[frame]), next_++, frame == 0);
+  }
+}
+
+void Clip::report_hole(const Timeline::Place &place) {
+  char seconds[32];
+  std::snprintf(seconds, sizeof seconds, "%.2f",
+                static_cast<double>(timeline_->length_of(place.hole)) / 1000);
+  report_.skipped("no pictures from " + local_text(timeline_->time_of(place.period - place.hole)) + " to " +
+                  local_text(timeline_->time_of(place.period)) + ", for " + seconds + " seconds");
+}
+
 void Clip::place_frames(const Group &group) {
-  periods_.clear();
+  places_.clear();
   std::int64_t offset = group.offset;
   for (const std::size_t size : group.sizes) {
-    periods_.push_back(timeline_->place(offset));
+    places_.push_back(timeline_->place(offset));
     offset += static_cast<std::int64_t>(size);
   }
   std::size_t lost = group.lost;
-  if (periods_.empty()) {
-    periods_.push_back(timeline_->place(group.offset));
+  if (places_.empty()) {
+    places_.push_back(timeline_->place(group.offset));
     --lost;
   }
   timeline_->skip(lost);
@@ -139,9 +158,9 @@ void Clip::check_frames(const Recording &recording, Group &group) {
 
 /// The stretch begins with the intra frame of a group; it follows the stretch before without a gap.
 void Clip::begin_stretch(const Recording &recording, const Group &group) {
-  const Milliseconds begin = timeline_->time_of(periods_.front());
+  const Milliseconds begin = timeline_->time_of(places_.front().period);
   if (audio_ != nullptr && muxer_ != nullptr) write_audio(timeline_->time_of(next_ + shift_));
-  shift_ = periods_.front() - next_;
+  shift_ = places_.front().period - next_;
   audio_shift_ = begin - timeline_->length_of(next_);
   if (audio_ != nullptr) audio_->seek(begin);
   writing_ = true;
@@ -168,7 +187,7 @@ void Clip::write_audio(Milliseconds until) {
 
 void Clip::finish() {
   if (stopping) throw std::runtime_error("stopped; no clip is written");
-  if (muxer_ == nullptr) throw std::runtime_error("nothing is recorded there; no clip is written");
+  if (muxer_ == nullptr) throw std::runtime_error("no picture is recorded there; no clip is written");
   write_audio(timeline_->time_of(next_ + shift_));
   muxer_->finish();
   output_.commit();

@@ -36,6 +36,8 @@ class Clip {
   bool accept(const Recording &recording, const StreamReader &reader);
   void add_group(const Recording &recording, Group &group);
   void place_frames(const Group &group);
+  void write_frames(const Group &group, Milliseconds until, bool joined);
+  void report_hole(const Timeline::Place &place);
   void check_frames(const Recording &recording, Group &group);
   void begin_stretch(const Recording &recording, const Group &group);
   void write_audio(Milliseconds until);
@@ -55,14 +57,14 @@ class Clip {
   OutputFile output_;
   std::unique_ptr<Muxer> muxer_;
 
-  std::vector<std::int64_t> periods_;  ///< of the frames of the current group
-  std::string stray_;                  ///< says which bytes in front of the current group belong to none
-  bool writing_ = false;               ///< a part of the current stretch is written
-  std::int64_t shift_ = 0;             ///< period of the recordings that is period 0 of the clip
-  std::int64_t next_ = 0;              ///< where the clip ends, in its periods
-  Milliseconds begin_ = 0;             ///< when the first frame of the clip was recorded
-  Milliseconds audio_shift_ = 0;       ///< the same shift in time
-  Milliseconds shown_ = -1;            ///< the progress on the terminal
+  std::vector<Timeline::Place> places_;  ///< of the frames of the current group
+  std::string stray_;                    ///< says which bytes in front of the current group belong to none
+  bool writing_ = false;                 ///< a part of the current stretch is written
+  std::int64_t shift_ = 0;               ///< period of the recordings that is period 0 of the clip
+  std::int64_t next_ = 0;                ///< where the clip ends, in its periods
+  Milliseconds begin_ = 0;               ///< when the first frame of the clip was recorded
+  Milliseconds audio_shift_ = 0;         ///< the same shift in time
+  Milliseconds shown_ = -1;              ///< the progress on the terminal
 };
 
 }  // namespace clips

@@ -32,7 +32,7 @@ void Timeline::meet(Milliseconds time, Milliseconds tolerance) {
     next_ += std::llround(static_cast<double>(late) * rate_.numerator / rate_.denominator / 1000);
 }
 
-std::int64_t Timeline::place(std::int64_t offset) {
+Timeline::Place Timeline::place(std::int64_t offset) {
   using Kind = recording::IndexEntry::Kind;
   std::optional<Milliseconds> time = start_;
   start_.reset();
@@ -42,8 +42,13 @@ std::int64_t Timeline::place(std::int64_t offset) {
     gap = gap || entry.kind == Kind::gap || entry.kind == Kind::buffer;
     if (gap || (entry.kind == Kind::intra && entry.offset == offset)) time = entry.time;
   }
-  if (time) meet(*time, gap ? length_of(1) / 2 : std::max(kJitter, length_of(2)));
-  return next_++;
+  const std::int64_t expected = next_;
+  const Milliseconds jitter = std::max(kJitter, length_of(2));
+  if (time) meet(*time, gap ? length_of(1) / 2 : jitter);
+  const std::int64_t period = next_++;
+  // A small step without an event is the clock, which drifts against that of the card.
+  const bool missing = gap || length_of(period - expected) > 2 * jitter;
+  return {period, missing ? period - expected : 0};
 }
 
 }  // namespace clips

@@ -23,8 +23,12 @@ class Timeline {
   /// recorded, if known.
   void begin_file(const std::vector<recording::IndexEntry> &index, std::optional<Milliseconds> start);
 
-  /// Returns the number of the period that shows the next frame, which is at an offset of the file.
-  std::int64_t place(std::int64_t offset);
+  struct Place {
+    std::int64_t period;  ///< the number of the period that shows the frame
+    std::int64_t hole;    ///< how many periods in front of it have no frame, since frames are missing
+  };
+  /// Places the next frame, which is at an offset of the file.
+  Place place(std::int64_t offset);
   /// Leaves out the periods of frames that are lost.
   void skip(std::size_t frames) { next_ += static_cast<std::int64_t>(frames); }
 

@@ -61,10 +61,10 @@ TEST(ExportTimes, OnlyWhatIsNoJitterMovesAFrame) {
     const std::vector<IndexEntry> index = {entry(Kind::intra, 5000, 0), entry(row.kind, 5000 + row.time, 20)};
     Timeline timeline({30000, 1001});
     timeline.begin_file(index, 5000);
-    EXPECT_EQ(timeline.place(0), 0);
-    EXPECT_EQ(timeline.place(10), 1);
-    EXPECT_EQ(timeline.place(20), row.period) << row.what;
-    EXPECT_EQ(timeline.place(30), row.period + 1) << row.what;
+    EXPECT_EQ(timeline.place(0).period, 0);
+    EXPECT_EQ(timeline.place(10).period, 1);
+    EXPECT_EQ(timeline.place(20).period, row.period) << row.what;
+    EXPECT_EQ(timeline.place(30).period, row.period + 1) << row.what;
     EXPECT_EQ(timeline.time_of(0), 5000);
   }
 }
@@ -78,7 +78,7 @@ TEST(ExportTimes, FilesFollowEachOther) {
   for (const std::optional<Milliseconds> start :
        {std::optional<Milliseconds>(1000), {1100}, {}, {3000}, {2000}}) {
     timeline.begin_file(none, start);
-    periods.push_back(timeline.place(32));
+    periods.push_back(timeline.place(32).period);
     timeline.skip(1);  // a damaged frame
   }
   EXPECT_THAT(periods, ElementsAre(0, 2, 4, 50, 52));
