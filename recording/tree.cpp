@@ -77,7 +77,7 @@ std::optional<NamedHour> parse_file_name(const std::string &name) {
   const std::string_view text = name;
   if (text.size() < kHour || text[kDay] != '-') return std::nullopt;
   const auto day = number_in(text.substr(0, kDay)), hour = number_in(text.substr(kDay + 1, 2));
-  if (!day || !hour) return std::nullopt;
+  if (!day || !hour || *hour > 23) return std::nullopt;
   NamedHour named;
   named.hour.tm_year = static_cast<int>(*day / 10000) - 1900;
   named.hour.tm_mon = static_cast<int>(*day / 100 % 100) - 1;
