@@ -17,7 +17,8 @@ inline constexpr std::int64_t kHour = 3600000;
 std::tm local_fields(std::int64_t time);
 /// Returns the start of the local clock hour.
 std::int64_t hour_begin(std::int64_t time);
-/// Returns, for example, "2026-11-25 14:58:00".
+/// Returns, for example, "2026-11-25 14:58:00". In an hour that comes twice the difference to UTC follows:
+/// "2026-10-25 02:30:00 +0100".
 std::string local_text(std::int64_t time);
 
 }  // namespace recording

@@ -13,68 +13,106 @@ constexpr Milliseconds kBlockLength = kBlockSamples * 1000 / kSampleRate;
 /// of the samples is not that of the wall.
 constexpr Milliseconds kSameRun = 2000;
 
-Milliseconds start_of(const Recording &audio, const std::vector<Recording> &video) {
-  for (const Recording &beside : video)
-    if (beside.hour == audio.hour && beside.part == audio.part) return beside.start.value_or(*audio.hour);
-  return *audio.hour;
-}
+/// A time in the index is when a block reached the recorder. It may be off by this much without a gap.
+constexpr Milliseconds kJitter = 200;
 
 std::int64_t blocks_of(const Recording &audio) {
   return static_cast<std::int64_t>(std::filesystem::file_size(audio.path) / kBlockBytes);
 }
 
+/// Returns when the audio of a file without an index begins.
+Milliseconds start_of(const Recording &audio, const std::vector<Recording> &video) {
+  for (const Recording &beside : video)
+    if (beside.hour && beside.hour->overlaps(*audio.hour) && beside.part == audio.part)
+      return beside.start.value_or(audio.hour->from);
+  return audio.hour->from;
+}
+
+/// Adds the runs that an index tells. Like pictures, they never go back in time, even if the clock did.
+void add_runs(const Recording &audio, std::size_t file, std::vector<AudioRun> &runs) {
+  using Kind = recording::IndexEntry::Kind;
+  AudioRun run{file};
+  bool begun = false, gap = false;
+  const auto end_run = [&](std::int64_t block) {
+    run.blocks = block - run.block;
+    if (run.blocks > 0) runs.push_back(run);
+  };
+  for (const recording::IndexEntry &entry : audio.index) {
+    gap = gap || entry.kind == Kind::gap || entry.kind == Kind::buffer;
+    if (entry.kind != Kind::intra) continue;
+    const std::int64_t block = entry.offset / static_cast<std::int64_t>(kBlockBytes);
+    // The time is that of the block's end.
+    const Milliseconds start = entry.time - kBlockLength;
+    const Milliseconds late = start - run.start - (block - run.block) * kBlockLength;
+    if (begun && !gap && late <= kJitter) continue;
+    if (begun) end_run(block);
+    run = {file, block, 0, runs.empty() ? start : std::max(start, runs.back().end())};
+    begun = true;
+    gap = false;
+  }
+  end_run(blocks_of(audio));
+}
+
 }  // namespace
 
-std::vector<Stretch> audio_stretches(const std::vector<Recording> &audio,
-                                     const std::vector<Recording> &video) {
-  std::vector<Stretch> stretches;
-  const Recording *before = nullptr;
-  for (const Recording &recording : audio) {
+Milliseconds AudioRun::end() const {
+  return start + blocks * kBlockLength;
+}
+
+std::vector<AudioRun> audio_runs(const std::vector<Recording> &audio, const std::vector<Recording> &video) {
+  std::vector<AudioRun> runs;
+  for (std::size_t file = 0; file < audio.size(); ++file) {
+    const Recording &recording = audio[file];
+    if (!recording.index.empty()) {
+      add_runs(recording, file, runs);
+      continue;
+    }
     // A video file begins with an intra frame, so the audio of a new hour is there first.
-    const bool goes_on = recording.part == 0 && before != nullptr && before->number == recording.number &&
-                         std::abs(stretches.back().to - *recording.hour) <= kSameRun;
-    const Milliseconds start = goes_on ? *recording.hour : start_of(recording, video);
-    stretches.push_back({start, start + blocks_of(recording) * kBlockLength});
-    before = &recording;
+    const bool goes_on = recording.part == 0 && !runs.empty() &&
+                         audio[runs.back().file].number == recording.number &&
+                         std::abs(runs.back().end() - recording.hour->from) <= kSameRun;
+    runs.push_back(
+        {file, 0, blocks_of(recording), goes_on ? recording.hour->from : start_of(recording, video)});
   }
-  return stretches;
+  return runs;
 }
 
 AudioReader::AudioReader(const std::vector<Recording> &audio, const std::vector<Recording> &video,
-                         Milliseconds from, Report &report) {
-  const std::vector<Stretch> stretches = audio_stretches(audio, video);
-  for (std::size_t i = 0; i < audio.size(); ++i) {
-    if (stretches[i].to <= from) continue;
-    files_.push_back({audio[i].path, stretches[i], blocks_of(audio[i])});
-    if (std::filesystem::file_size(audio[i].path) % kBlockBytes != 0)
-      report.skipped(audio[i].path + ": the last block is torn: skipped");
+                         Milliseconds from, Report &report)
+    : runs_(audio_runs(audio, video)) {
+  std::erase_if(runs_, [from](const AudioRun &run) { return run.end() <= from; });
+  for (std::size_t file = 0; file < audio.size(); ++file) {
+    paths_.push_back(audio[file].path);
+    const auto needs_it = [file](const AudioRun &run) { return run.file == file; };
+    if (std::ranges::any_of(runs_, needs_it) && std::filesystem::file_size(paths_.back()) % kBlockBytes != 0)
+      report.skipped(paths_.back() + ": the last block is torn: skipped");
   }
 }
 
 void AudioReader::seek(Milliseconds time) {
-  file_ = 0;
-  while (file_ < files_.size() && files_[file_].recorded.to <= time) ++file_;
-  const Milliseconds into =
-      file_ < files_.size() ? std::max<Milliseconds>(time - files_[file_].recorded.from, 0) : 0;
+  run_ = 0;
+  while (run_ < runs_.size() && runs_[run_].end() <= time) ++run_;
+  const Milliseconds into = run_ < runs_.size() ? std::max<Milliseconds>(time - runs_[run_].start, 0) : 0;
   block_ = (into + kBlockLength - 1) / kBlockLength;
   stream_.close();
 }
 
 bool AudioReader::next(AudioBlock &block, Milliseconds until) {
-  while (file_ < files_.size() && block_ >= files_[file_].blocks) {
-    ++file_;
+  while (run_ < runs_.size() && block_ >= runs_[run_].blocks) {
+    ++run_;
     block_ = 0;
     stream_.close();
   }
-  if (file_ == files_.size()) return false;
-  const File &file = files_[file_];
-  block.time = file.recorded.from + block_ * kBlockLength;
+  if (run_ == runs_.size()) return false;
+  const AudioRun &run = runs_[run_];
+  block.time = run.start + block_ * kBlockLength;
   if (block.time >= until) return false;
   if (!stream_.is_open()) {
-    stream_.open(file.path, std::ios::binary);
-    stream_.seekg(block_ * static_cast<std::streamoff>(kBlockBytes));
+    stream_.open(paths_[run.file], std::ios::binary);
+    stream_.seekg((run.block + block_) * static_cast<std::streamoff>(kBlockBytes));
   }
-  if (!stream_.read(block.data.data(), kBlockBytes)) throw std::runtime_error(file.path + ": cannot be read");
+  if (!stream_.read(block.data.data(), kBlockBytes))
+    throw std::runtime_error(paths_[run.file] + ": cannot be read");
   ++block_;
   return true;
 }

@@ -15,10 +15,16 @@
 
 namespace clips {
 
-/// Returns when each audio file was recorded. They have no index: the video files of the same hour tell when
-/// one begins, its length when it ends. The audio files are in order.
-std::vector<Stretch> audio_stretches(const std::vector<Recording> &audio,
-                                     const std::vector<Recording> &video);
+/// Blocks of a file that follow each other without a gap.
+struct AudioRun {
+  std::size_t file;                    ///< its number in the list of recordings
+  std::int64_t block = 0, blocks = 0;  ///< the number of the first, and how many
+  Milliseconds start = 0;              ///< when the first one begins
+  Milliseconds end() const;
+};
+/// Returns the runs of audio files, which are in order. The index of a file tells when they were recorded.
+/// Without one, the video of the same hour tells when the file begins, its length when it ends.
+std::vector<AudioRun> audio_runs(const std::vector<Recording> &audio, const std::vector<Recording> &video);
 
 struct AudioBlock {
   Milliseconds time = 0;
@@ -27,7 +33,7 @@ struct AudioBlock {
 
 class AudioReader {
  public:
-  /// See audio_stretches(). Leaves out the files that end before `from`. Reports blocks that are torn.
+  /// See audio_runs(). Leaves out what ends before `from`. Reports blocks that are torn.
   AudioReader(const std::vector<Recording> &audio, const std::vector<Recording> &video, Milliseconds from,
               Report &report);
 
@@ -37,16 +43,11 @@ class AudioReader {
   bool next(AudioBlock &block, Milliseconds until);
 
  private:
-  struct File {
-    std::string path;
-    Stretch recorded;
-    std::int64_t blocks;
-  };
-
-  std::vector<File> files_;
-  std::size_t file_ = 0;    ///< the file of the next block
-  std::int64_t block_ = 0;  ///< its number in the file
-  std::ifstream stream_;    ///< the file, open behind its first block that was read
+  std::vector<std::string> paths_;
+  std::vector<AudioRun> runs_;
+  std::size_t run_ = 0;     ///< the run of the next block
+  std::int64_t block_ = 0;  ///< its number in the run
+  std::ifstream stream_;    ///< the file of the run, open behind its first block that was read
 };
 
 }  // namespace clips

@@ -18,21 +18,29 @@ Recording named(const fs::path &path) {
   if (const auto channel = recording::parse_channel_folder(path.parent_path().filename()))
     recording.number = *channel + 1;
   if (const auto name = recording::parse_file_name(path.filename())) {
-    recording.hour = from_local(name->hour);
+    recording.hour = {from_local(name->hour, Pass::first), from_local(name->hour, Pass::second) + kHour};
     recording.part = name->part;
   }
   return recording;
 }
 
 void read_index_of(Recording &recording) {
-  if (recording.path.ends_with(".rec"))
-    recording.index = recording::read_index(recording::index_path(recording.path));
+  auto [index, misfit] = recording::fitting_index(recording.path);
+  if (misfit)
+    recording.doubt =
+        recording.path + (index.empty() ? ": its index belongs to another recording: not used"
+                                        : ": its index does not fit from byte " + std::to_string(*misfit) +
+                                              " on: not used from there");
   // Without an intra frame it tells no time of a frame.
-  if (std::ranges::none_of(recording.index,
-                           [](const IndexEntry &entry) { return entry.kind == Kind::intra; }))
-    recording.index.clear();
-  else
-    recording.start = recording.index.front().time;
+  if (std::ranges::none_of(index, [](const IndexEntry &entry) { return entry.kind == Kind::intra; })) return;
+  recording.start = index.front().time;
+  const Milliseconds hour = recording::hour_begin(*recording.start);
+  recording.hour = {hour, hour + kHour};
+  recording.index = std::move(index);
+}
+
+bool may_overlap(const Recording &recording, const Stretch &stretch) {
+  return recording.hour && stretch.overlaps({recording.hour->from, recording.hour->to + kLateChange});
 }
 
 std::vector<fs::path> entries_of(const fs::path &folder) {
@@ -63,18 +71,18 @@ std::vector<Recording> find_recordings(const std::string &root, recording::Kind 
       for (const fs::path &file : entries_of(channel)) {
         if (file.extension() != recording::extension_of(kind)) continue;
         Recording recording = named(file);
-        if (!recording.hour) continue;
-        if (stretch.overlaps({*recording.hour, *recording.hour + kHour + kLateChange}))
-          found.push_back(std::move(recording));
+        if (!may_overlap(recording, stretch)) continue;
+        read_index_of(recording);
+        if (may_overlap(recording, stretch)) found.push_back(std::move(recording));
       }
     }
   }
-  for (Recording &recording : found) read_index_of(recording);
-  std::ranges::sort(found, {}, [](const Recording &r) {
-    return std::tuple(r.number, r.index.empty() ? *r.hour : recording::hour_begin(r.index.front().time),
-                      r.part);
-  });
+  std::ranges::sort(found, {}, [](const Recording &r) { return std::tuple(r.number, r.hour->from, r.part); });
   return found;
+}
+
+void note_doubt(const Recording &recording, Report &report) {
+  if (!recording.doubt.empty()) report.note(recording.doubt);
 }
 
 Contents contents_of(const std::vector<IndexEntry> &index) {
@@ -82,13 +90,19 @@ Contents contents_of(const std::vector<IndexEntry> &index) {
   contents.recorded = {index.front().time, index.front().time};
   Milliseconds group = index.front().time;  // its start
   Milliseconds length = 0;                  // of the last whole group
+  std::int64_t gap = -1;                    // where the last gap is
   bool ended = false;
   for (const IndexEntry &entry : index) {
-    if (entry.kind == Kind::gap) append(contents.gaps, {entry.time - entry.ms, entry.time});
+    if (entry.kind == Kind::gap) {
+      append(contents.gaps, {entry.time - entry.ms, entry.time});
+      gap = entry.offset;
+    }
     if (entry.kind == Kind::buffer) contents.lost_frames += entry.frames;
     if (entry.kind != Kind::intra && entry.kind != Kind::stop) continue;
-    if (entry.motion > 0) append(contents.motion, {group, entry.time});
-    length = entry.time - group;
+    // A group in front of a gap ends where the gap begins.
+    const Milliseconds end = gap == entry.offset ? std::max(group, contents.gaps.back().from) : entry.time;
+    if (entry.motion > 0) append(contents.motion, {group, end});
+    length = end - group;
     group = entry.time;
     ended = entry.kind == Kind::stop;
   }

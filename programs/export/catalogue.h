@@ -11,6 +11,7 @@
 
 #include "recording/index.h"
 #include "recording/tree.h"
+#include "report.h"
 #include "wall_time.h"
 
 namespace clips {
@@ -21,10 +22,13 @@ inline constexpr Milliseconds kLateChange = 60000;
 /// A recording: a part of a clock hour of a channel or of an audio input.
 struct Recording {
   std::string path;
-  unsigned number = 0;                       ///< channel or input, from 1
-  std::optional<Milliseconds> hour;          ///< the clock hour of its name; none for another name
+  unsigned number = 0;  ///< channel or input, from 1
+  /// The clock hour that the index tells, or the name: of a name two hours, if the hour comes twice in
+  /// autumn. None for another name.
+  std::optional<Stretch> hour;
   unsigned part = 0;                         ///< 0 for the first file of the hour
   std::vector<recording::IndexEntry> index;  ///< empty if there is none
+  std::string doubt;                         ///< says which part of the index does not fit; mostly empty
   std::optional<Milliseconds> start;         ///< when the first frame was recorded, by the index
 };
 
@@ -35,6 +39,9 @@ Recording recording_at(const std::string &path);
 /// all for 0, whose hour overlaps a stretch. Throws std::runtime_error if the root cannot be read.
 std::vector<Recording> find_recordings(const std::string &root, recording::Kind kind, unsigned number,
                                        const Stretch &stretch);
+
+/// Says if the index of a recording is not used, or only a part of it.
+void note_doubt(const Recording &recording, Report &report);
 
 /// What an index tells.
 struct Contents {

@@ -56,8 +56,9 @@ void draw_axis(Drawing &drawing, const Stretch &span, double bottom) {
   const Milliseconds step = found == std::end(kSteps) ? *std::prev(found) : *found;
   std::string day;
   // Midnight of the first day, so that the lines are at whole days and hours of the local clock.
-  const std::string midnight = local_text(span.from).substr(0, 10) + " 00:00";
-  for (Milliseconds time = parse_time("", midnight); time <= span.to; time += step) {
+  std::tm midnight = recording::local_fields(span.from);
+  midnight.tm_hour = midnight.tm_min = midnight.tm_sec = 0;
+  for (Milliseconds time = from_local(midnight, Pass::first); time <= span.to; time += step) {
     if (time < span.from) continue;
     const std::string text = local_text(time);
     drawing.line(time, bottom);

@@ -1,6 +1,7 @@
 // Prints what is recorded as a table or as JSON.
 #include "listing.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <filesystem>
 #include <iostream>
@@ -22,11 +23,6 @@ Json as_json(const std::vector<Stretch> &stretches) {
   return list;
 }
 
-ListedRecording listed(const Recording &recording) {
-  if (!recording.index.empty()) return {recording, true, contents_of(recording.index)};
-  return {recording, true, {{*recording.hour, *recording.hour + kHour}, {}, {}}};
-}
-
 /// Returns the length of all stretches together.
 Milliseconds total(const std::vector<Stretch> &stretches) {
   Milliseconds sum = 0;
@@ -36,16 +32,23 @@ Milliseconds total(const std::vector<Stretch> &stretches) {
 
 }  // namespace
 
-std::vector<ListedRecording> list_recordings(const Options &options) {
+std::vector<ListedRecording> list_recordings(const Options &options, Report &report) {
   using recording::Kind;
   const auto video = find_recordings(options.root, Kind::video, options.channel, options.range);
   std::vector<ListedRecording> rows;
   rows.reserve(video.size());
-  for (const Recording &recording : video) rows.push_back(listed(recording));
+  for (const Recording &recording : video) rows.push_back({recording, true, {*recording.hour, {}, {}}});
   if (options.channel == 0 && std::filesystem::is_directory(options.root + "/Audio")) {
     const auto audio = find_recordings(options.root, Kind::audio, 0, options.range);
-    const auto stretches = audio_stretches(audio, video);
-    for (std::size_t i = 0; i < audio.size(); ++i) rows.push_back({audio[i], false, {stretches[i], {}, {}}});
+    const auto runs = audio_runs(audio, video);
+    for (std::size_t file = 0; file < audio.size(); ++file) {
+      const auto run = std::ranges::find(runs, file, &AudioRun::file);
+      if (run != runs.end()) rows.push_back({audio[file], false, {{run->start, run->end()}, {}, {}}});
+    }
+  }
+  for (ListedRecording &row : rows) {
+    note_doubt(row.recording, report);
+    if (!row.recording.index.empty()) row.contents = contents_of(row.recording.index);
   }
   std::erase_if(rows, [&](const auto &row) { return !row.contents.recorded.overlaps(options.range); });
   return rows;
@@ -63,7 +66,7 @@ void print_table(const std::vector<ListedRecording> &rows) {
     if (row.recording.index.empty())
       std::printf("%9s %6s %9s", "", "", "");
     else
-      std::printf("%9s %6zu %9s", length_text(total(motion)).c_str(), gaps.size(),
+      std::printf("%9s %6zu %9s", row.video ? length_text(total(motion)).c_str() : "", gaps.size(),
                   length_text(total(gaps)).c_str());
     std::printf("  %s%s\n", row.recording.path.c_str(),
                 lost > 0 ? (", " + std::to_string(lost) + " frames lost").c_str() : "");
@@ -76,11 +79,11 @@ void print_json(const std::vector<ListedRecording> &rows) {
     Json item;
     item[row.video ? "channel" : "audio"] = row.recording.number;
     item["file"] = row.recording.path;
-    if (row.video) item["index"] = !row.recording.index.empty();
+    item["index"] = !row.recording.index.empty();
     item["from"] = local_text(row.contents.recorded.from);
     item["to"] = local_text(row.contents.recorded.to);
     if (!row.recording.index.empty()) {
-      item["motion"] = as_json(row.contents.motion);
+      if (row.video) item["motion"] = as_json(row.contents.motion);
       item["gaps"] = as_json(row.contents.gaps);
       item["lost_frames"] = row.contents.lost_frames;
     }

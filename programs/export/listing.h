@@ -10,6 +10,7 @@
 
 #include "catalogue.h"
 #include "options.h"
+#include "report.h"
 
 namespace clips {
 
@@ -25,7 +26,8 @@ struct ListedRecording {
   bool is_known() const { return !video || !recording.index.empty(); }
 };
 
-std::vector<ListedRecording> list_recordings(const Options &options);
+/// Reports indexes that are not used.
+std::vector<ListedRecording> list_recordings(const Options &options, Report &report);
 
 void print_table(const std::vector<ListedRecording> &rows);
 void print_json(const std::vector<ListedRecording> &rows);

@@ -19,7 +19,8 @@ Makes a clip of recordings without encoding the pictures again, or lists what is
   --channel N     the camera, 1 to 16
   --from TIME     local time, e.g. "2026-11-25 14:58" or "2026-11-25 14:58:30"; the clip begins with the intra
                   frame at or before it
-  --to TIME       the same; the day may be left out
+  --to TIME       the same; the day may be left out. In the hour that comes twice in autumn, --from means the first
+                  and --to the second; "2026-10-25 02:30 +0100", with the difference to UTC, leaves no doubt
   --audio N       adds an audio input, 1 to 4; a clip in mp4 gets it as AAC
   --motion        only the stretches with motion, with 2 seconds before and after each
   --two-fields    recordings without an index hold both fields of each frame
@@ -87,8 +88,8 @@ void set_option(int letter, Options &options, Times &times) {
 
 void set_range(const Times &times, Options &options) {
   std::optional<Milliseconds> begin;
-  if (times.from) options.range.from = *(begin = parse_time("--from", *times.from));
-  if (times.to) options.range.to = parse_time("--to", *times.to, begin);
+  if (times.from) options.range.from = *(begin = parse_time("--from", *times.from, Pass::first));
+  if (times.to) options.range.to = parse_time("--to", *times.to, Pass::second, begin);
   if (options.range.from >= options.range.to) throw UsageError("--to is not behind --from");
 }
 

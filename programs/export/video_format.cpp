@@ -44,14 +44,14 @@ std::optional<Milliseconds> start_by_file_time(const Recording &recording, bool 
   struct stat info {};
   if (!recording.hour || stat(recording.path.c_str(), &info) != 0) return std::nullopt;
   const Milliseconds end = Milliseconds{info.st_mtim.tv_sec} * 1000 + info.st_mtim.tv_nsec / 1000000;
-  if (end < *recording.hour || end > *recording.hour + kHour + kLateChange) return std::nullopt;
+  if (end < recording.hour->from || end > recording.hour->to + kLateChange) return std::nullopt;
   StreamReader reader(recording.path);
   const recording::FrameRate rate = format_of(reader, recording, two_fields).rate;
   std::size_t frames = 0;
   for (Group group; reader.next(group);) frames += group.sizes.size() + group.lost;
   const Milliseconds start =
       end - static_cast<Milliseconds>(frames) * 1000 * rate.denominator / rate.numerator;
-  return start >= *recording.hour - kEarly ? std::optional(start) : std::nullopt;
+  return start >= recording.hour->from - kEarly ? std::optional(start) : std::nullopt;
 } catch (const RecordingError &) {
   return std::nullopt;
 }

@@ -30,12 +30,15 @@ struct Stretch {
 /// Adds a stretch, to the last one if they touch.
 void append(std::vector<Stretch> &stretches, const Stretch &stretch);
 
+/// Which one of two equal local times: when the clock goes back in autumn, an hour comes twice.
+enum class Pass { first, second };
 /// Returns the time of local date and time.
-Milliseconds from_local(std::tm fields);
+Milliseconds from_local(std::tm fields, Pass pass);
 
-/// Reads "2026-11-25 14:58" or "2026-11-25 14:58:30", local time. With `after`, the day may be left out: it
-/// is then the first such time behind `after`. Throws UsageError.
-Milliseconds parse_time(const std::string &option, const std::string &text,
+/// Reads "2026-11-25 14:58" or "2026-11-25 14:58:30", local time, or with a difference to UTC behind it:
+/// "2026-10-25 02:30 +0100". With `after`, the day may be left out: it is then the first such time behind
+/// `after`. Throws UsageError.
+Milliseconds parse_time(const std::string &option, const std::string &text, Pass pass,
                         std::optional<Milliseconds> after = std::nullopt);
 
 std::string utc_text(Milliseconds time);       ///< "2026-11-25T13:58:00.120000Z"

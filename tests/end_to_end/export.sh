@@ -44,7 +44,7 @@ part() { { header "${HEADER[@]}"; bytes "$2" "$3"; } >"$VIDEO/$1.rec"; }
 index() {
   local at=$((10#$(date -d "2026-11-25 $4" +%s) * 1000)) group offset frames=0 moved=0
   {
-    echo "{\"event\":\"start\",\"time\":$at,\"offset\":32,\"standard\":\"ntsc\",\"rate\":\"30\",\"fields\":${FIELDS:-1},\"audio\":[2]}"
+    echo "{\"event\":\"start\",\"time\":$at,\"offset\":32,\"standard\":\"ntsc\",\"rate\":\"30\",\"fields\":1,\"audio\":[2]}"
     for ((group = $2; group <= $3; group++)); do
       offset=$((32 + GROUPS_AT[group] - GROUPS_AT[$2]))
       [ "$group" -lt "$3" ] && echo -n '{"intra":true' || echo -n '{"event":"stop"'
@@ -93,7 +93,8 @@ case $1 in
     for hour in 13 14 14.1 15; do head -c 6000 "$RECORDED/audio2.g726" >"$AUDIO/20261125-$hour.aud"; done
     for type in mkv mp4; do
       clip=$FOLDER/clip.$type
-      export_clip 0 "${RANGE[@]}" 15:30 --audio 2 "$clip"
+      export_clip 3 "${RANGE[@]}" 15:30 --audio 2 "$clip"
+      says 'no pictures from 2026-11-25 14:00:02 to 2026-11-25 14:00:06, for 4.00 seconds'
       expect_equal "frames of $type" "$(source_hashes 0 8)" "$(hashes -i "$clip")"
       expect_equal "errors of $type" '' "$(ffmpeg -nostdin -v error -i "$clip" -f null - 2>&1)"
       expect_equal "shape of $type" 4:3 "$(entry v stream=display_aspect_ratio "$clip")"
@@ -116,7 +117,7 @@ case $1 in
     done <<<$'9 loud\n100 silent\n3603 loud'
 
     # From the intra frame at or before --from, up to --to.
-    export_clip 0 --root "$ROOT" --channel 3 --from '2026-11-25 14:00:01' --to 14:00:07 "$FOLDER/short.mkv"
+    export_clip 3 --root "$ROOT" --channel 3 --from '2026-11-25 14:00:01' --to 14:00:07 "$FOLDER/short.mkv"
     expect_equal "frames of six seconds" "$(source_hashes 2 5)" "$(hashes -i "$FOLDER/short.mkv")"
 
     # Recordings by name, without indexes: one after the other.
@@ -204,7 +205,7 @@ TABLE
     rm -r "$VIDEO" && mkdir "$VIDEO"
     hour_tree
     export_clip 1 "${RANGE[@]}" 15:30 --motion "$FOLDER/still.mp4"
-    says 'nothing moves there'
+    says 'there is no motion'
     rm "$VIDEO"/*.idx
     export_clip 1 "${RANGE[@]}" 15:30 --motion "$FOLDER/still.mp4"
     says '15.rec: no index tells of motion'

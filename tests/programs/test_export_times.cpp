@@ -28,17 +28,27 @@ TEST(ExportTimes, AreLocalAndTheDayOfTheSecondMayBeLeftOut) {
   setenv("TZ", "Europe/Berlin", 1);
   tzset();
   const auto read = [](const char *from, const char *to) {
-    const Milliseconds begin = parse_time("--from", from);
-    return utc_text(begin) + " " + utc_text(parse_time("--to", to, begin));
+    const Milliseconds begin = parse_time("--from", from, Pass::first);
+    return utc_text(begin) + " " + utc_text(parse_time("--to", to, Pass::second, begin));
   };
   EXPECT_EQ(read("2026-11-25 14:58", "15:03"), "2026-11-25T13:58:00.000000Z 2026-11-25T14:03:00.000000Z");
   EXPECT_EQ(read("2026-12-31 23:59:30", "00:01"), "2026-12-31T22:59:30.000000Z 2026-12-31T23:01:00.000000Z");
   EXPECT_EQ(read("2026-10-24 12:00", "2026-10-25 12:00"),
             "2026-10-24T10:00:00.000000Z 2026-10-25T11:00:00.000000Z");
-  for (const char *wrong : {"", "14", "2026-11-25", "2026-11-25 14:58x", "15:03 "})
-    EXPECT_THROW(parse_time("--to", wrong, Milliseconds{0}), UsageError) << wrong;
-  EXPECT_THROW(parse_time("--from", "14:58"), UsageError);
-  EXPECT_EQ(length_text(parse_time("--to", "15:03", hour_begin(1795618800000)) % kHour), "0:03:00");
+  // The clock shows 02:30 twice.
+  EXPECT_EQ(read("2026-10-25 02:30", "2026-10-25 02:30"),
+            "2026-10-25T00:30:00.000000Z 2026-10-25T01:30:00.000000Z");
+  EXPECT_EQ(read("2026-10-25 02:30 +0100", "02:40+02:00"),
+            "2026-10-25T01:30:00.000000Z 2026-10-26T00:40:00.000000Z");
+  EXPECT_EQ(read("2026-10-25T03:00", "00:30 Z"), "2026-10-25T02:00:00.000000Z 2026-10-26T00:30:00.000000Z");
+  EXPECT_EQ(read("2026-03-29 02:30", "02:30"), "2026-03-29T01:30:00.000000Z 2026-03-30T00:30:00.000000Z");
+  EXPECT_EQ(local_text(parse_time("", "2026-10-25 02:59:59", Pass::second)), "2026-10-25 02:59:59 +0100");
+  EXPECT_EQ(local_text(parse_time("", "2026-10-25 03:00", Pass::first)), "2026-10-25 03:00:00");
+  for (const char *wrong : {"", "14", "2026-11-25", "2026-11-25 14:58x", "15:03 ", "15:03 +x"})
+    EXPECT_THROW(parse_time("--to", wrong, Pass::second, Milliseconds{0}), UsageError) << wrong;
+  EXPECT_THROW(parse_time("--from", "14:58", Pass::first), UsageError);
+  EXPECT_EQ(length_text(parse_time("--to", "15:03", Pass::second, hour_begin(1795618800000)) % kHour),
+            "0:03:00");
   unsetenv("TZ");
   tzset();
 }
@@ -67,6 +77,7 @@ TEST(ExportTimes, OnlyWhatIsNoJitterMovesAFrame) {
     EXPECT_EQ(timeline.place(30).period, row.period + 1) << row.what;
     EXPECT_EQ(timeline.time_of(0), 5000);
   }
+  EXPECT_EQ(Timeline({30000, 1001}).time_of(107892), 3599996);
 }
 
 // Catches: frames of the next file on top of those before; a gap between files that closes; a part without a
