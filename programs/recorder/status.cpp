@@ -10,14 +10,9 @@ namespace recorder {
 namespace {
 
 constexpr double kMiB = 1 << 20;
-constexpr std::uint64_t kOnTheirWay = 2;  ///< the first and the last frame of a minute
 
 double seconds_of(Clock::duration time) {
   return std::chrono::duration<double>(time).count();
-}
-
-std::uint64_t short_of(std::uint64_t expected, std::uint64_t frames) {
-  return expected - std::min(expected, frames);
 }
 
 template <typename... Values>
@@ -54,18 +49,15 @@ void Status::look_for_overrun(Messages &messages) {
   overrun_ = overrun;
 }
 
+Shortfall::Counts Status::counts(unsigned stream) const {
+  return {recorder_.intake().arrivals(stream).frames, recorder_.intake().expected(stream, Clock::now())};
+}
+
 void Status::compare_with_expected(Messages &messages) {
-  const Clock::time_point now = Clock::now();
   for (unsigned stream = 0; stream < kStreams; ++stream) {
     if (!recorder_.intake().records(stream)) continue;
-    const Minute before = minute_[stream];
-    Minute &at_end = minute_[stream];
-    at_end = {recorder_.intake().arrivals(stream).frames, recorder_.intake().expected(stream, now)};
-    const std::uint64_t expected = at_end.expected - before.expected;
-    const std::uint64_t missing = short_of(expected, at_end.frames - before.frames);
-    if (missing > kOnTheirWay && missing * 100 > expected)
-      messages.add(stream_name(stream) + format(": %ju of %ju were missing in the last minute",
-                                                std::uintmax_t{missing}, std::uintmax_t{expected}));
+    if (const std::string text = shortfalls_[stream].end_minute(counts(stream)); !text.empty())
+      messages.add(stream_name(stream) + ": " + text);
   }
 }
 
@@ -98,15 +90,15 @@ std::string Status::table() const {
   for (unsigned stream = 0; stream < kStreams; ++stream) {
     if (!recorder_.intake().records(stream)) continue;
     const Arrivals &arrivals = recorder_.intake().arrivals(stream);
-    const std::uintmax_t frames = arrivals.frames, expected = recorder_.intake().expected(stream, now);
-    const std::uintmax_t missing = short_of(expected, frames);
+    const Shortfall::Counts due = counts(stream);
+    const std::uintmax_t missing = shortfalls_[stream].missing(due);
     const std::uintmax_t lost = arrivals.lost + recorder_.writer().dropped(stream);
     const double kilobits =
         static_cast<double>(arrivals.bytes) * 8 / 1000 / seconds_of(now - recorder_.start_time());
     text += format("%-14s %12ju %12ju %9ju %9ju %6ju %10ju %8.0f %9ju %9ju\n", stream_name(stream).c_str(),
-                   frames, expected, missing > kOnTheirWay ? missing : 0, lost, std::uintmax_t{arrivals.gaps},
-                   std::uintmax_t{arrivals.longest_gap_ms}, kilobits, std::uintmax_t{arrivals.motion},
-                   std::uintmax_t{arrivals.no_signal});
+                   std::uintmax_t{due.frames}, std::uintmax_t{due.expected}, missing, lost,
+                   std::uintmax_t{arrivals.gaps}, std::uintmax_t{arrivals.longest_gap_ms}, kilobits,
+                   std::uintmax_t{arrivals.motion}, std::uintmax_t{arrivals.no_signal});
   }
   return text;
 }

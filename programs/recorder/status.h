@@ -9,6 +9,7 @@
 #include <string>
 
 #include "recorder.h"
+#include "shortfall.h"
 
 namespace recorder {
 
@@ -20,7 +21,8 @@ class Status {
   void look_for_silence(Messages &messages);
   /// Call it once a second. Says at once, not only when the disk takes frames again, that the buffer is full.
   void look_for_overrun(Messages &messages);
-  /// Call it once a minute. Says how many frames a stream is short of in this minute.
+  /// Call it once a minute. Says how many frames a stream is short of in this minute, and each hour, in this
+  /// hour.
   void compare_with_expected(Messages &messages);
 
   /// Returns the state in a line.
@@ -29,16 +31,13 @@ class Status {
   std::string table() const;
 
  private:
-  struct Minute {
-    std::uint64_t frames = 0;
-    std::uint64_t expected = 0;
-  };
+  Shortfall::Counts counts(unsigned stream) const;
 
   const Recorder &recorder_;
   std::array<bool, kStreams> silent_{};
   std::uint64_t lost_ = 0;  ///< what the buffer had no space for, a second ago
   bool overrun_ = false;
-  std::array<Minute, kStreams> minute_{};  ///< the counts when the last minute ended
+  std::array<Shortfall, kStreams> shortfalls_;
 };
 
 }  // namespace recorder
