@@ -4,18 +4,11 @@
 #include <algorithm>
 #include <cstring>
 
-#include "recording/frame_rates.h"
-
 namespace recorder {
 namespace {
 
 /// The share of the audio buffer: 32 times as small, which is longer in time than that of CIF video.
 constexpr std::size_t kAudioShare = 32;
-
-double frame_rate(const Options &options) {
-  const auto rate = recording::exact_frame_rate(options.standard, options.rate).value();
-  return static_cast<double>(rate.numerator) / rate.denominator;
-}
 
 /// Returns whether an MPEG-4 frame is intra. Its picture start code is at the beginning, or behind the 20
 /// bytes of the stream header; the two bits behind the code are 0 for an intra picture.
@@ -37,7 +30,8 @@ void add(std::atomic<std::uint64_t> &count, std::uint64_t more) {
 Intake::Intake(const Options &options)
     : chosen_(options.channels | options.audio << ZV_CHANNELS),
       mpeg4_(options.codec == VIDEO_CODEC_ZV_MPEG4),
-      video_rate_(frame_rate(options)),
+      video_rate_(stream_rate(options, 0)),
+      audio_rate_(stream_rate(options, ZV_CHANNELS)),
       memory_(std::make_unique<std::byte[]>(options.buffer)),
       video_({memory_.get(), options.buffer - options.buffer / kAudioShare}),
       audio_({memory_.get() + video_.capacity(), options.buffer / kAudioShare}) {}

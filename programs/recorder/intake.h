@@ -40,7 +40,7 @@ class Intake {
 
   bool records(unsigned stream) const { return chosen_ >> stream & 1u; }
   /// Returns frames or audio blocks a second.
-  double rate(unsigned stream) const { return is_video(stream) ? video_rate_ : kAudioRate; }
+  double rate(unsigned stream) const { return is_video(stream) ? video_rate_ : audio_rate_; }
   const Arrivals &arrivals(unsigned stream) const { return arrivals_[stream]; }
   /// Returns how many frames are due at a time, counted from the first.
   std::uint64_t expected(unsigned stream, Clock::time_point now) const;
@@ -54,8 +54,6 @@ class Intake {
   Clock::duration gap_limit(unsigned stream) const;
 
  private:
-  static constexpr double kAudioRate = 8000.0 / 128;
-
   /// What the next frame of a stream tells of those before it. Belongs to the thread of the SDK.
   struct Loss {
     bool skipping = false;  ///< a frame is lost, and no intra frame has come since
@@ -67,7 +65,7 @@ class Intake {
 
   u32 chosen_;  ///< mask of streams
   bool mpeg4_;
-  double video_rate_;
+  double video_rate_, audio_rate_;
   std::unique_ptr<std::byte[]> memory_;
   Ring video_, audio_;
   std::array<Arrivals, kStreams> arrivals_;

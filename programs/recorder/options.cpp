@@ -1,8 +1,9 @@
 // Parses the command line of zarvo_recorder.
 #include "options.h"
 
-#include <optional>
+#include <bit>
 
+#include "frame.h"
 #include "programs/common/command_line.h"
 #include "recording/frame_rates.h"
 #include "recording/tree.h"
@@ -20,6 +21,8 @@ constexpr char kHelp[] =
     "  --audio LIST        audio inputs, e.g. 1-4, or none (1-4)\n"
     "  --codec NAME        mpeg4 or mjpeg (mpeg4)\n"
     "  --scale NAME        cif, half-d1 or d1 (cif)\n"
+    "  --two-fields        encode both fields of each frame, twice as many pictures a second;\n"
+    "                      at the full rate, 8 cif or 4 half-d1 channels at most\n"
     "  --standard NAME     ntsc or pal (ntsc)\n"
     "  --width PIXELS      720 or 704, of half-d1 and d1 (720)\n"
     "  --rate LABEL        frames a second, e.g. 15 or 7.5 (30; pal: 25)\n"
@@ -36,23 +39,16 @@ constexpr char kHelp[] =
     "SIGUSR1 prints a table of all channels.\n"
     "Status: 0 ended by a signal; 1 failed; 2 wrong option; 3 ended by a signal, but frames are lost\n";
 
-const option kOptions[] = {{"root", required_argument, nullptr, 'o'},
-                           {"channels", required_argument, nullptr, 'c'},
-                           {"audio", required_argument, nullptr, 'a'},
-                           {"codec", required_argument, nullptr, 'v'},
-                           {"scale", required_argument, nullptr, 'z'},
-                           {"standard", required_argument, nullptr, 't'},
-                           {"width", required_argument, nullptr, 'w'},
-                           {"rate", required_argument, nullptr, 'r'},
-                           {"gop", required_argument, nullptr, 'g'},
-                           {"qp", required_argument, nullptr, 'q'},
-                           {"bps", required_argument, nullptr, 'b'},
-                           {"min-free", required_argument, nullptr, 'm'},
-                           {"when-full", required_argument, nullptr, 'f'},
-                           {"sync", required_argument, nullptr, 's'},
-                           {"buffer", required_argument, nullptr, 'u'},
-                           {"quiet", no_argument, nullptr, 'Q'},
-                           COMMON_OPTIONS};
+const option kOptions[] = {
+    {"root", required_argument, nullptr, 'o'},     {"channels", required_argument, nullptr, 'c'},
+    {"audio", required_argument, nullptr, 'a'},    {"codec", required_argument, nullptr, 'v'},
+    {"scale", required_argument, nullptr, 'z'},    {"two-fields", no_argument, nullptr, 'F'},
+    {"standard", required_argument, nullptr, 't'}, {"width", required_argument, nullptr, 'w'},
+    {"rate", required_argument, nullptr, 'r'},     {"gop", required_argument, nullptr, 'g'},
+    {"qp", required_argument, nullptr, 'q'},       {"bps", required_argument, nullptr, 'b'},
+    {"min-free", required_argument, nullptr, 'm'}, {"when-full", required_argument, nullptr, 'f'},
+    {"sync", required_argument, nullptr, 's'},     {"buffer", required_argument, nullptr, 'u'},
+    {"quiet", no_argument, nullptr, 'Q'},          COMMON_OPTIONS};
 
 constexpr i32 kKilo = 1024;
 constexpr i32 kMega = 1048576;
@@ -85,6 +81,9 @@ bool take_picture_option(int letter, const std::string &text, Options &options, 
       return true;
     case 'z':
       options.scale = parse_name("--scale", text, scale_names);
+      return true;
+    case 'F':
+      options.two_fields = true;
       return true;
     case 't':
       options.standard = parse_name("--standard", text, standard_names);
@@ -139,6 +138,22 @@ void take_option(int letter, const std::string &text, Options &options) {
   }
 }
 
+/// Returns the channels that the card encodes at the full rate. Two fields count twice.
+u32 most_channels(const Options &options) {
+  const u32 channels = channels_within_budget(options.scale);
+  return options.two_fields ? channels >> std::popcount(channels) / 2 : channels;
+}
+
+void check_two_fields(const Options &options) {
+  if (options.scale == SCALE_ZV_D1) throw UsageError("--two-fields: --scale d1 has both fields in a picture");
+  if (options.rate != 0)
+    throw UsageError("--two-fields: the card encodes both fields only at the full --rate");
+  const int most = std::popcount(most_channels(options)), wanted = std::popcount(options.channels);
+  if (wanted > most)
+    throw UsageError("--two-fields: the card encodes at most " + std::to_string(most) +
+                     " channels of this --scale with two fields, not " + std::to_string(wanted));
+}
+
 void complete(Options &options, const Later &later) {
   if (options.root.empty()) throw UsageError("--root DIR is missing");
   while (options.root.size() > 1 && options.root.back() == '/') options.root.pop_back();
@@ -147,11 +162,20 @@ void complete(Options &options, const Later &later) {
                      " bytes");
   if (later.qp && options.bit_rate != 0) throw UsageError("--qp and --bps exclude each other");
   if (!later.rate.empty()) options.rate = parse_name("--rate", later.rate, rate_names(options.standard));
-  if (options.channels == 0) options.channels = channels_within_budget(options.scale);
-  if (options.gop == 0) options.gop = options.standard == VIDEO_STANDARD_ZV_NTSC ? 30 : 25;
+  if (options.two_fields) check_two_fields(options);
+  if (options.channels == 0) options.channels = most_channels(options);
+  if (options.gop == 0)
+    options.gop = (options.standard == VIDEO_STANDARD_ZV_NTSC ? 30 : 25) * (options.two_fields ? 2 : 1);
 }
 
 }  // namespace
+
+double stream_rate(const Options &options, unsigned stream) {
+  constexpr double kAudioRate = 8000.0 / 128;
+  if (!is_video(stream)) return kAudioRate;
+  const auto rate = recording::exact_frame_rate(options.standard, options.rate).value();
+  return static_cast<double>(rate.numerator) / rate.denominator * (options.two_fields ? 2 : 1);
+}
 
 Options parse_options(int argc, char **argv) {
   Options options;

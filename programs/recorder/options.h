@@ -19,6 +19,7 @@ struct Options {
   u32 audio = (1u << ZV_AUDIO_CHANNELS) - 1;
   ZV_VIDEO_CODEC codec = VIDEO_CODEC_ZV_MPEG4;
   ZV_SCALE_VALUE scale = SCALE_ZV_CIF;
+  bool two_fields = false;  ///< both fields of each frame are encoded, each as a frame of the stream
   ZV_VIDEO_STANDARD standard = VIDEO_STANDARD_ZV_NTSC;
   ZV_RESOLUTION width = RESOLUTION_ZV_720;
   unsigned rate = 0;  ///< index in the list of frame rates of the standard
@@ -31,6 +32,9 @@ struct Options {
   std::size_t buffer = std::size_t{64} << 20;  ///< bytes
   bool quiet = false;
 };
+
+/// Returns the frames or audio blocks a second of a stream.
+double stream_rate(const Options &options, unsigned stream);
 
 /// Throws UsageError.
 Options parse_options(int argc, char **argv);

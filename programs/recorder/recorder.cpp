@@ -21,6 +21,7 @@ void configure(HANDLE card, const Options &options) {
   ZV_VIDEO_CONFIG config{};
   config.mjpeg = options.codec;
   config.scale = options.scale;
+  config.twofield = options.two_fields ? TWOFIELD_ENABLE : TWOFIELD_DISABLE;
   config.gop = options.gop;
   config.qp = options.qp;
   config.interval = static_cast<ZV_INTERVAL_VALUE>(options.rate);

@@ -40,6 +40,7 @@ recording::IndexEntry start_entry(const Options &options) {
   start.standard = options.standard == VIDEO_STANDARD_ZV_NTSC ? "ntsc" : "pal";
   start.rate = rate_label(options);
   for (unsigned input = 0; input < ZV_AUDIO_CHANNELS; ++input)
+  start.fields = options.two_fields ? 2 : 1;
     if (options.audio >> input & 1u) start.audio.push_back(input + 1);
   return start;
 }
