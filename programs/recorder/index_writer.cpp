@@ -35,7 +35,7 @@ void IndexWriter::begin(int file, std::int64_t time, std::int64_t offset) {
   text_.clear();
   group_ = {};
   start_.kind = Kind::start;
-  start_.time = time;
+  start_.time = end_ = time;
   start_.offset = offset;
   add(start_);
   for (IndexEntry &event : early_) {
@@ -66,6 +66,16 @@ void IndexWriter::add_frame(const Frame &frame, std::int64_t offset, std::uint32
   group_.bytes += frame.length;
   group_.motion += frame.motion ? 1 : 0;
   group_.lost += frame.no_signal ? 1 : 0;
+  end_ = frame.time + period_;
+}
+
+void IndexWriter::add_last_gap(std::int64_t time, std::int64_t offset, std::uint32_t gap_ms) {
+  IndexEntry event;
+  event.kind = Kind::gap;
+  event.time = end_ = time;
+  event.offset = offset;
+  event.ms = gap_ms;
+  add(event);
 }
 
 void IndexWriter::add_disk_error(std::int64_t time, std::int64_t offset, const std::string &error) {
@@ -80,9 +90,9 @@ void IndexWriter::add_disk_error(std::int64_t time, std::int64_t offset, const s
     early_.push_back(event);
 }
 
-int IndexWriter::end(std::int64_t time, std::int64_t offset) {
+int IndexWriter::end(std::int64_t offset) {
   if (file_ < 0) return -1;
-  add(Kind::stop, time, offset);
+  add(Kind::stop, end_, offset);
   write();
   return std::exchange(file_, -1);
 }

@@ -42,21 +42,28 @@ Clock::duration Intake::gap_limit(unsigned stream) const {
   return std::chrono::duration_cast<Clock::duration>(std::max(kLeast, two_periods));
 }
 
-std::uint32_t Intake::note_arrival(Arrivals &arrivals, unsigned stream, const Frame &frame) const {
-  const Clock::rep now = Clock::now().time_since_epoch().count();
-  const Clock::rep before = arrivals.last.exchange(now, std::memory_order_relaxed);
-  if (before == 0) arrivals.first.store(now, std::memory_order_relaxed);
+std::uint32_t Intake::silence_ms(unsigned stream, Clock::time_point now) const {
+  const Clock::rep last = arrivals_[stream].last.load(std::memory_order_relaxed);
+  const Clock::duration silence = now.time_since_epoch() - Clock::duration{last};
+  if (last == 0 || silence <= gap_limit(stream)) return 0;
+  return static_cast<std::uint32_t>(std::chrono::duration_cast<std::chrono::milliseconds>(silence).count());
+}
+
+std::uint32_t Intake::note_arrival(const Frame &frame) {
+  Arrivals &arrivals = arrivals_[frame.stream];
+  const Clock::time_point now = Clock::now();
+  const Clock::rep ticks = now.time_since_epoch().count();
+  const std::uint32_t gap_ms = silence_ms(frame.stream, now);
+  if (arrivals.last.exchange(ticks, std::memory_order_relaxed) == 0)
+    arrivals.first.store(ticks, std::memory_order_relaxed);
   add(arrivals.frames, 1);
   add(arrivals.bytes, frame.length);
   add(arrivals.motion, frame.motion ? 1 : 0);
   add(arrivals.no_signal, frame.no_signal ? 1 : 0);
-  const Clock::duration silence{now - before};
-  if (before == 0 || silence <= gap_limit(stream)) return 0;
-  const auto gap_ms = std::chrono::duration_cast<std::chrono::milliseconds>(silence).count();
+  if (gap_ms == 0) return 0;
   add(arrivals.gaps, 1);
-  arrivals.longest_gap_ms =
-      std::max<std::uint64_t>(arrivals.longest_gap_ms, static_cast<std::uint64_t>(gap_ms));
-  return static_cast<std::uint32_t>(gap_ms);
+  arrivals.longest_gap_ms = std::max<std::uint64_t>(arrivals.longest_gap_ms, gap_ms);
+  return gap_ms;
 }
 
 void Intake::take(unsigned stream, const u8 *data, i32 length, i32 flags) {
@@ -69,9 +76,8 @@ void Intake::take(unsigned stream, const u8 *data, i32 length, i32 flags) {
   frame.motion = (flags & ZV_FLAG_MOTION) != 0;
   frame.no_signal = (flags & ZV_FLAG_VIDEO_LOSS) != 0;
 
-  Arrivals &arrivals = arrivals_[stream];
   Loss &loss = losses_[stream];
-  loss.gap_ms += note_arrival(arrivals, stream, frame);
+  loss.gap_ms += note_arrival(frame);
   frame.gap_ms = loss.gap_ms;
   frame.lost = loss.frames;
   Ring &ring = is_video(stream) ? video_ : audio_;
@@ -80,7 +86,7 @@ void Intake::take(unsigned stream, const u8 *data, i32 length, i32 flags) {
   } else {
     loss.skipping = true;
     ++loss.frames;
-    add(arrivals.lost, 1);
+    add(arrivals_[stream].lost, 1);
   }
 }
 

@@ -52,6 +52,9 @@ class Intake {
 
   /// A silence as long as this is a gap.
   Clock::duration gap_limit(unsigned stream) const;
+  /// Returns how long a stream has been silent, in milliseconds; 0 if that is no gap, and before its first
+  /// frame.
+  std::uint32_t silence_ms(unsigned stream, Clock::time_point now) const;
 
  private:
   /// What the next frame of a stream tells of those before it. Belongs to the thread of the SDK.
@@ -61,7 +64,7 @@ class Intake {
     std::uint32_t gap_ms = 0;
   };
   /// Returns the length of the gap that a frame ends, or 0.
-  std::uint32_t note_arrival(Arrivals &arrivals, unsigned stream, const Frame &frame) const;
+  std::uint32_t note_arrival(const Frame &frame);
 
   u32 chosen_;  ///< mask of streams
   bool mpeg4_;

@@ -66,7 +66,6 @@ void watch(recorder::Recorder &recording, recorder::Status &status) {
 }
 
 int record(const recorder::Options &options) {
-  const recorder::RootLock lock(options.root);
   recorder::Recorder recording(options);
   recorder::Status status(recording);
   catch_table_signal();

@@ -39,7 +39,10 @@ void configure(HANDLE card, const Options &options) {
 }  // namespace
 
 Recorder::Recorder(const Options &options)
-    : options_(options), intake_(options_), writer_(options_, intake_, messages_) {
+    : options_(options),
+      lock_(options_.root),
+      intake_(options_),
+      writer_(options_, lock_, intake_, messages_) {
   configure(card_.handle, options_);
 }
 
@@ -55,6 +58,7 @@ void Recorder::start() {
 }
 
 void Recorder::stop() {
+  writer_.note_end();
   zv_Stop(card_.handle);  // from here on no callback runs
   writer_.finish();
 }

@@ -9,6 +9,7 @@
 #include "messages.h"
 #include "options.h"
 #include "programs/common/card.h"
+#include "service.h"
 #include "writer.h"
 
 namespace recorder {
@@ -16,7 +17,7 @@ namespace recorder {
 /// One at a time, because the SDK's callbacks carry no argument.
 class Recorder {
  public:
-  /// Opens and configures the card. Throws std::runtime_error.
+  /// Locks the root, opens and configures the card. Throws std::runtime_error.
   explicit Recorder(const Options &options);
   ~Recorder() { stop(); }
   Recorder(const Recorder &) = delete;
@@ -38,6 +39,7 @@ class Recorder {
 
  private:
   const Options options_;
+  RootLock lock_;
   Messages messages_;
   Intake intake_;
   Writer writer_;

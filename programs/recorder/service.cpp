@@ -4,6 +4,7 @@
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/socket.h>
+#include <sys/stat.h>
 #include <sys/un.h>
 #include <unistd.h>
 
@@ -29,19 +30,32 @@ void notify(const std::string &lines) {
   close(file);
 }
 
-RootLock::RootLock(const std::string &root) {
-  const std::string path = root + "/.zarvo-recorder.lock";
-  file_ = open(path.c_str(), O_RDWR | O_CREAT | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC, 0666);
-  if (file_ < 0) throw std::runtime_error(path + ": " + std::strerror(errno));
-  if (flock(file_, LOCK_EX | LOCK_NB) == 0) return;
-  const int error = errno;
-  close(file_);
-  throw std::runtime_error(error == EWOULDBLOCK ? "another recorder uses " + root
-                                                : path + ": " + std::strerror(error));
+RootLock::RootLock(const std::string &root) : path_(root + "/.zarvo-recorder.lock") {
+  const int error = hold();
+  if (error == EWOULDBLOCK) throw std::runtime_error("another recorder uses " + root);
+  if (error != 0) throw std::runtime_error(path_ + ": " + std::strerror(error));
 }
 
 RootLock::~RootLock() {
-  close(file_);
+  if (file_ >= 0) close(file_);
+}
+
+int RootLock::hold() {
+  struct stat held {
+  }, there{};
+  if (file_ >= 0 && fstat(file_, &held) == 0 && stat(path_.c_str(), &there) == 0 &&
+      held.st_ino == there.st_ino && held.st_dev == there.st_dev)
+    return 0;
+  const int file = open(path_.c_str(), O_RDWR | O_CREAT | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC, 0666);
+  if (file < 0) return errno;
+  if (flock(file, LOCK_EX | LOCK_NB) != 0) {
+    const int error = errno;
+    close(file);
+    return error;
+  }
+  if (file_ >= 0) close(file_);
+  file_ = file;
+  return 0;
 }
 
 }  // namespace recorder

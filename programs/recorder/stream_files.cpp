@@ -8,6 +8,7 @@
 
 #include <array>
 #include <cerrno>
+#include <cmath>
 #include <cstring>
 #include <span>
 
@@ -39,10 +40,15 @@ recording::IndexEntry start_entry(const Options &options) {
   recording::IndexEntry start;
   start.standard = options.standard == VIDEO_STANDARD_ZV_NTSC ? "ntsc" : "pal";
   start.rate = rate_label(options);
-  for (unsigned input = 0; input < ZV_AUDIO_CHANNELS; ++input)
   start.fields = options.two_fields ? 2 : 1;
+  for (unsigned input = 0; input < ZV_AUDIO_CHANNELS; ++input)
     if (options.audio >> input & 1u) start.audio.push_back(input + 1);
   return start;
+}
+
+/// Returns the time of a frame in milliseconds.
+std::int64_t period_of(const Options &options, unsigned stream) {
+  return std::lround(1000 / stream_rate(options, stream));
 }
 
 /// How many frames an index counts in a line at least: audio, where every block is intra, has about a line a
@@ -86,11 +92,18 @@ Hour hour_of(std::int64_t time) {
   return {begin, begin + recording::kHour, recording::local_fields(time)};
 }
 
-StreamFiles::StreamFiles(const Options &options, unsigned stream)
-    : options_(options), stream_(stream), index_(start_entry(options), least_group(stream)) {}
+std::string error_text(int error) {
+  return error == EWOULDBLOCK ? "another recorder uses the root" : std::strerror(error);
+}
+
+StreamFiles::StreamFiles(const Options &options, RootLock &lock, unsigned stream)
+    : options_(options),
+      lock_(lock),
+      stream_(stream),
+      index_(start_entry(options), period_of(options, stream), least_group(stream)) {}
 
 StreamFiles::~StreamFiles() {
-  retire(0);
+  retire();
   for (const int file : retired_) close(file);
 }
 
@@ -119,7 +132,7 @@ bool StreamFiles::belongs_here(const Frame &frame) const {
 }
 
 int StreamFiles::change_file(const Frame &first) {
-  retire(first.time);
+  retire();
   hour_ = hour_of(first.time);
   if (const int error = create_part()) return error;
   replace_ = false;
@@ -148,6 +161,8 @@ int StreamFiles::create_part() {
   const Kind kind = kind_of(stream_);
   const std::string folder =
       recording::channel_folder(recording::day_folder(options_.root, kind, hour_.local), number_of(stream_));
+  path_ = folder + "/" + recording::file_name(kind, hour_.local);
+  if (const int error = lock_.hold()) return error;
   bool folders_made = false;
   for (unsigned part = 0;;) {
     path_ = folder + "/" + recording::file_name(kind, hour_.local, part);
@@ -203,7 +218,7 @@ int StreamFiles::write_batch() {
 /// Ends the file, and drops what belongs to the group that it ends with: the next file begins with an intra
 /// frame.
 void StreamFiles::skip_group() {
-  retire(queue_.front().frame->time);
+  retire();
   drop_until(oldest());
 }
 
@@ -218,16 +233,16 @@ void StreamFiles::drop_until(std::uint64_t position) {
 }
 
 void StreamFiles::note_disk_error(std::int64_t time, int error) {
-  index_.add_disk_error(time, offset_, std::strerror(error));
+  index_.add_disk_error(time, offset_, error_text(error));
 }
 
 /// Ends the open file. sync() closes it, so that the writer does not wait for the disk at the change of the
 /// hour.
-void StreamFiles::retire(std::int64_t time) {
+void StreamFiles::retire() {
   if (file_ < 0) return;
   retired_.push_back(file_);
   file_ = -1;
-  if (const int index = index_.end(time, offset_); index >= 0) retired_.push_back(index);
+  if (const int index = index_.end(offset_); index >= 0) retired_.push_back(index);
 }
 
 int StreamFiles::sync() {
@@ -249,7 +264,7 @@ int StreamFiles::sync() {
   return error;
 }
 
-int StreamFiles::check_place(std::int64_t time) {
+int StreamFiles::check_place() {
   if (file_ < 0 || replace_) return 0;
   struct stat at_path {
   }, opened{};
@@ -259,7 +274,7 @@ int StreamFiles::check_place(std::int64_t time) {
   if (in_place) return 0;
   // A file that was moved takes the rest of its group. A file that was deleted takes nothing any more.
   replace_ = true;
-  if (opened.st_nlink == 0) retire(time);
+  if (opened.st_nlink == 0) retire();
   return ENOENT;
 }
 
@@ -274,8 +289,9 @@ void StreamFiles::sync_folders() const {
   }
 }
 
-int StreamFiles::finish(std::int64_t time) {
-  retire(time);
+int StreamFiles::finish(std::int64_t time, std::uint32_t silence_ms) {
+  if (is_open() && silence_ms > 0) index_.add_last_gap(time, offset_, silence_ms);
+  retire();
   return sync();
 }
 

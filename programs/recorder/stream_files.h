@@ -15,6 +15,7 @@
 #include "index_writer.h"
 #include "options.h"
 #include "ring.h"
+#include "service.h"
 
 namespace recorder {
 
@@ -27,9 +28,13 @@ struct Hour {
 };
 Hour hour_of(std::int64_t time);
 
+/// Returns what an error of StreamFiles means.
+std::string error_text(int error);
+
 class StreamFiles {
  public:
-  StreamFiles(const Options &options, unsigned stream);
+  /// Holds the lock of the root whenever it creates a file.
+  StreamFiles(const Options &options, RootLock &lock, unsigned stream);
   ~StreamFiles();
   StreamFiles(const StreamFiles &) = delete;
   StreamFiles &operator=(const StreamFiles &) = delete;
@@ -53,11 +58,12 @@ class StreamFiles {
   int sync();
   /// Returns ENOENT, once, if the file is no longer in its folder. The next intra frame then begins a new
   /// file. If the file was deleted, the frames until then are dropped. Call it every second.
-  int check_place(std::int64_t time);
+  int check_place();
   /// Whether a file is open, and stays open at the next intra frame of its hour.
   bool in_place() const { return file_ >= 0 && !replace_; }
-  /// Ends the file. Returns 0 or the errno of the sync.
-  int finish(std::int64_t time);
+  /// Ends the file at a time, when the stream has been silent for so long. Returns 0 or the errno of the
+  /// sync.
+  int finish(std::int64_t time, std::uint32_t silence_ms);
   /// Adds an event to the index.
   void note_disk_error(std::int64_t time, int error);
 
@@ -75,10 +81,11 @@ class StreamFiles {
   int create_index(std::int64_t time);
   int write_batch();
   void skip_group();
-  void retire(std::int64_t time);
+  void retire();
   void sync_folders() const;
 
   const Options &options_;
+  RootLock &lock_;
   const unsigned stream_;
   std::deque<Ring::Taken> queue_;
   bool needs_intra_ = false;  ///< frames were dropped: queue() drops all up to the next intra frame

@@ -7,10 +7,8 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstdio>
-#include <cstring>
 #include <set>
 
-#include "disk_space.h"
 #include "recording/tree.h"
 
 namespace recorder {
@@ -30,11 +28,11 @@ std::string name_of(const Hour &hour) {
 
 }  // namespace
 
-Writer::Writer(const Options &options, Intake &intake, Messages &messages)
-    : options_(options), intake_(intake), messages_(messages) {
+Writer::Writer(const Options &options, RootLock &lock, Intake &intake, Messages &messages)
+    : options_(options), lock_(lock), intake_(intake), messages_(messages) {
   for (unsigned stream = 0; stream < kStreams; ++stream) {
     if (!intake.records(stream)) continue;
-    outputs_.push_back(std::make_unique<Output>(options, stream));
+    outputs_.push_back(std::make_unique<Output>(options, lock, stream));
     by_stream_[stream] = outputs_.back().get();
   }
 }
@@ -52,6 +50,11 @@ void Writer::start() {
   pthread_sigmask(SIG_SETMASK, &all, &before);
   thread_ = std::thread([this] { run(); });
   pthread_sigmask(SIG_SETMASK, &before, nullptr);
+}
+
+void Writer::note_end() {
+  end_ = Clock::now();
+  end_wall_ = wall_ms();
 }
 
 void Writer::finish() {
@@ -74,9 +77,9 @@ void Writer::run() {
 void Writer::pass(Clock::time_point now) {
   if (now >= next_check_) {
     next_check_ = now + kCheck;
-    check_space();
+    check_space(now);
     for (auto &output : outputs_)
-      if (const int error = output->files.check_place(wall_ms())) report_error(*output, error);
+      if (const int error = output->files.check_place()) report_error(*output, error);
   }
   take_frames(intake_.video());
   take_frames(intake_.audio());
@@ -92,17 +95,19 @@ void Writer::pass(Clock::time_point now) {
 void Writer::take_frames(Ring &ring) {
   for (Ring::Taken taken = ring.take(); taken.frame != nullptr; taken = ring.take()) {
     const Frame &frame = *taken.frame;
-    if (frame.gap_ms > 0) {
-      char text[64];
-      std::snprintf(text, sizeof text, ": gap of %.2f s", frame.gap_ms / 1000.0);
-      messages_.add(stream_name(frame.stream) + text, frame.time);
-    }
+    if (frame.gap_ms > 0) tell_gap(frame.stream, frame.gap_ms, frame.time);
     if (frame.lost > 0)
       messages_.add(stream_name(frame.stream) + ": the buffer was full: " + std::to_string(frame.lost) +
                         (is_video(frame.stream) ? " frames" : " blocks") + " are lost",
                     frame.time);
     by_stream_[frame.stream]->files.queue(taken);
   }
+}
+
+void Writer::tell_gap(unsigned stream, std::uint32_t gap_ms, std::int64_t time) {
+  char text[64];
+  std::snprintf(text, sizeof text, ": gap of %.2f s", gap_ms / 1000.0);
+  messages_.add(stream_name(stream) + text, time);
 }
 
 void Writer::write(Output &output, Clock::time_point now) {
@@ -131,7 +136,7 @@ void Writer::report_error(Output &output, int error) {
   if (error == output.error) return;
   output.error = error;
   output.files.note_disk_error(wall_ms(), error);
-  messages_.add(stream_name(output.stream) + ": " + output.files.path() + ": " + std::strerror(error));
+  messages_.add(stream_name(output.stream) + ": " + output.files.path() + ": " + error_text(error));
 }
 
 /// Frames that cannot be written wait in the buffer for the next try, but only in its newer half: the other
@@ -158,10 +163,10 @@ void Writer::sync(Output &output, Clock::time_point now) {
   }
 }
 
-void Writer::check_space() {
+void Writer::check_space(Clock::time_point now) {
   free_ = recorder::free_percent(options_.root).value_or(-1);
   const bool low = free_ >= 0 && free_ < options_.min_free;
-  const bool full = low && !(options_.delete_oldest && delete_oldest());
+  const bool full = low && !(options_.delete_oldest && make_space(now));
   if (full == full_) return;
   full_ = full;
   if (full)
@@ -172,24 +177,29 @@ void Writer::check_space() {
   messages_.add(text);
 }
 
-/// Deletes the recordings of an hour. Returns false if there is none that may be deleted.
-bool Writer::delete_oldest() {
+/// Deletes the recordings of an hour, unless an earlier deletion can still free space. Returns false if there
+/// is none that may be deleted.
+bool Writer::make_space(Clock::time_point now) {
+  if (!pause_.is_over(now, free_)) return true;
+  if (lock_.hold() != 0) return false;
   std::set<std::string> kept{name_of(hour_of(wall_ms()))};
   for (const auto &output : outputs_)
     if (output->files.is_open()) kept.insert(name_of(output->files.hour()));
   const std::string hour = delete_oldest_hour(options_.root, kept);
   if (hour.empty()) return false;
+  pause_ = {now + kRetry, free_};
   messages_.add("deleted the recordings of hour " + hour + " to make room");
   return true;
 }
 
 void Writer::end_files() {
-  const std::int64_t time = wall_ms();
   for (auto &output : outputs_) {
     output->files.drop_until(~std::uint64_t{0});
     dropped_[output->stream] = output->files.dropped();
     tell_dropped(*output);
-    if (const int error = output->files.finish(time)) report_error(*output, error);
+    const std::uint32_t silence_ms = intake_.silence_ms(output->stream, end_);
+    if (silence_ms > 0) tell_gap(output->stream, silence_ms, end_wall_);
+    if (const int error = output->files.finish(end_wall_, silence_ms)) report_error(*output, error);
   }
 }
 

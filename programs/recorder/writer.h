@@ -12,6 +12,7 @@
 #include <thread>
 #include <vector>
 
+#include "disk_space.h"
 #include "intake.h"
 #include "messages.h"
 #include "options.h"
@@ -21,12 +22,14 @@ namespace recorder {
 
 class Writer {
  public:
-  Writer(const Options &options, Intake &intake, Messages &messages);
+  Writer(const Options &options, RootLock &lock, Intake &intake, Messages &messages);
   ~Writer() { finish(); }
   Writer(const Writer &) = delete;
   Writer &operator=(const Writer &) = delete;
 
   void start();
+  /// The recording ends now: silence from here on is no gap.
+  void note_end();
   /// Writes all that is in the buffer, ends the files and joins the thread. Call it when no callback runs any
   /// more.
   void finish();
@@ -39,7 +42,8 @@ class Writer {
  private:
   /// A stream that is recorded.
   struct Output {
-    Output(const Options &options, unsigned number) : stream(number), files(options, number) {}
+    Output(const Options &options, RootLock &lock, unsigned number)
+        : stream(number), files(options, lock, number) {}
 
     unsigned stream;
     StreamFiles files;
@@ -57,17 +61,22 @@ class Writer {
   void make_room(Ring &ring, bool video);
   void sync(Output &output, Clock::time_point now);
   void report_error(Output &output, int error);
-  void check_space();
-  bool delete_oldest();
+  void tell_gap(unsigned stream, std::uint32_t gap_ms, std::int64_t time);
+  void check_space(Clock::time_point now);
+  bool make_space(Clock::time_point now);
   void end_files();
 
   const Options &options_;
+  RootLock &lock_;
   Intake &intake_;
   Messages &messages_;
   std::vector<std::unique_ptr<Output>> outputs_;
   std::array<Output *, kStreams> by_stream_{};
   Clock::time_point next_check_;
   bool full_ = false;  ///< less is free than must stay free
+  DeletionPause pause_;
+  Clock::time_point end_;  ///< of the recording
+  std::int64_t end_wall_ = 0;
   std::array<std::atomic<std::uint64_t>, kStreams> dropped_{};
   std::atomic<double> free_{-1};
   std::atomic<bool> ending_{false};
