@@ -193,6 +193,21 @@ case $1 in
     expect "an old folder stays" test ! -e "$ROOT/Video/20261120"
     expect_equal "recordings" 16 "$(files rec | wc -l)"
     ;;
+  # Both fields of each frame. Catches: a clip that plays at half the speed.
+  fields)
+    start --two-fields --channels 1-2 --audio none
+    goes_on
+    stop
+    expect_whole
+    expect_equal "indexes that tell both fields" 2 "$(files idx | xargs grep -l '"fields":2' | wc -l)"
+    "$ZARVO_EXPORT" "$ROOT/Video/$DAY/CH02/$DAY-14.rec" "$FOLDER/clip.mp4" 2>"$ERR"
+    of_clip() { ffprobe -v error -select_streams v -show_entries "$1" -of default=nw=1:nk=1 "$FOLDER/clip.mp4"; }
+    expect_equal "rate of the clip" 60000/1001 "$(of_clip stream=r_frame_rate)"
+    read -r begun ended < <(grep -oE '(start|stop)","time":[0-9]+' "$ROOT/Video/$DAY/CH02/$DAY-14.idx" |
+      grep -oE '[0-9]+$' | paste -sd ' ')
+    expect "a clip of $(of_clip format=duration) s of $((ended - begun)) ms" \
+      awk -v clip="$(of_clip format=duration)" -v ms=$((ended - begun)) 'BEGIN { exit !(clip > ms / 1100 && clip < ms / 900) }'
+    ;;
   # What systemd sees; a second recorder; streams that stop and go on.
   service)
     perl -MIO::Socket::UNIX -e '
@@ -218,9 +233,18 @@ case $1 in
     wait_told 'audio input 2: gap of '
     kill -USR1 "$RECORDER"
     expect "no table" wait_until 20 grep -qE '^channel 2 +[0-9]+ +[0-9]+ ' "$OUT"
+    "$ZARVO_CARD_PROGRAM" stall=mpeg4 stall=audio
+    silent_again() { [ "$(grep -c 'channel 2: nothing has come for' "$ERR")" -gt 1 ]; }
+    expect "the second silence is not told" wait_until 60 silent_again
     kill -TERM "$RECORDER"
     wait "$RECORDER"
     kill "$listener"
+    # Catches: a silence at the end that looks recorded.
+    expect "a gap is not told" test "$(grep -cE '(channel|input) 2: gap of' "$ERR")" -ge 4
+    for index in $(files idx); do
+      expect "no gap at the end of $(tail -n 3 "$index")" \
+        grep -qzP '"gap","time":(\d+),"offset":(\d+),"ms":\d{4,}\}\n\{"event":"stop","time":\1,"offset":\2,' "$index"
+    done
     expect_equal "first and last word to the service" 'READY=1 STOPPING=1' \
       "$(grep -xE 'READY=1|STOPPING=1' "$FOLDER/notified" | paste -sd ' ')"
     expect "no gap in the index" test "$(index_sum ms '"gap"')" -ge 4000

@@ -1,44 +1,32 @@
-// Parts of the recorder: buffer, loss of groups, files of a stream, deletion.
+// Parts of the recorder: buffer, loss of groups, what is missing, options, lock, deletion.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <stdlib.h>
-#include <sys/resource.h>
+#include <sys/socket.h>
+#include <sys/un.h>
 
-#include <csignal>
 #include <filesystem>
 #include <fstream>
 #include <memory>
 #include <random>
+#include <sstream>
 #include <thread>
+#include <tuple>
 #include <vector>
 
+#include "programs/common/command_line.h"
 #include "programs/recorder/disk_space.h"
 #include "programs/recorder/intake.h"
-#include "programs/recorder/stream_files.h"
+#include "programs/recorder/service.h"
+#include "programs/recorder/shortfall.h"
+#include "recorder_test.h"
+#include "recording/frame_rates.h"
 
 namespace recorder {
 namespace {
 
 namespace fs = std::filesystem;
-using recording::IndexEntry;
 using testing::ElementsAre;
-
-constexpr std::int64_t kHourMs = 3600000;
-constexpr std::int64_t kTwoOClock = 1764079200000;  // 2025-11-25 14:00 UTC
-
-// An MPEG-4 frame of a size; the byte at its end tells it apart.
-std::vector<u8> frame_data(bool intra, std::size_t size, u8 mark = 0) {
-  std::vector<u8> data(size, 0x55);
-  constexpr u8 kIntra[] = {0,  0,  1,  0x20, 1,  2,  3,  4, 5, 6, 7,    8,   9,
-                           10, 11, 12, 13,   14, 15, 16, 0, 0, 1, 0xB6, 0x10};
-  constexpr u8 kOther[] = {0, 0, 1, 0xB6, 0x50};
-  if (intra)
-    std::copy(std::begin(kIntra), std::end(kIntra), data.begin());
-  else
-    std::copy(std::begin(kOther), std::end(kOther), data.begin());
-  data.back() = mark;
-  return data;
-}
 
 // Catches: a frame that is torn at the end of the memory, that overtakes another, or that the producer
 // overwrites while the consumer reads it.
@@ -70,6 +58,220 @@ TEST(RecorderRing, FramesComeOutAsTheyWentIn) {
     if (++n % 3 == 0) ring.release(ring.taken());
   }
   producer.join();
+}
+
+// Catches: a buffer that is full one frame too early or too late, and one that stays full.
+TEST(RecorderRing, TakesAFrameThatFillsIt) {
+  alignas(Frame) std::byte memory[256];
+  const std::vector<u8> data(sizeof memory, 7);
+  Ring ring(memory);
+  Frame frame{};
+  for (const auto &[length, fits] :
+       {std::pair(sizeof memory - sizeof(Frame), true), std::pair(std::size_t{0}, false),
+        std::pair(sizeof memory - sizeof(Frame) + 1, false)}) {
+    frame.length = static_cast<std::uint32_t>(length);
+    EXPECT_EQ(ring.push(frame, data.data()), fits) << length;
+    if (length != 0) continue;
+    EXPECT_EQ(ring.used(), sizeof memory);
+    EXPECT_EQ(ring.take().frame->length, sizeof memory - sizeof(Frame));
+    EXPECT_EQ(ring.take().frame, nullptr);
+    ring.release(ring.taken());
+    EXPECT_EQ(ring.used(), 0u);
+  }
+}
+
+// Catches: a file that begins with a frame that is no intra frame, and flags that get mixed up.
+TEST(RecorderIntake, KnowsIntraFramesAndFlags) {
+  struct Row {
+    ZV_VIDEO_CODEC codec;
+    unsigned stream;
+    std::vector<u8> data;
+    i32 flags;
+    bool intra;
+  };
+  std::vector<u8> late(200, 0);
+  late[197] = 1, late[198] = 0xB6, late[199] = 0x10;
+  for (const Row &row :
+       {Row{VIDEO_CODEC_ZV_MPEG4, 0, frame_data(true, 99), ZV_FLAG_MOTION, true},
+        {VIDEO_CODEC_ZV_MPEG4, 0, frame_data(false, 99), ZV_FLAG_VIDEO_LOSS, false},
+        {VIDEO_CODEC_ZV_MPEG4, 0, {0, 0, 1, 0xB6, 0x3F}, 0, true},
+        {VIDEO_CODEC_ZV_MPEG4, 0, {0, 0, 1, 0xB6, 0xC0}, 0, false},
+        {VIDEO_CODEC_ZV_MPEG4, 0, {0, 0, 1, 0xB6}, 0, false},
+        {VIDEO_CODEC_ZV_MPEG4, 0, {}, 0, false},
+        {VIDEO_CODEC_ZV_MPEG4, 0, late, 0, false},
+        {VIDEO_CODEC_ZV_MPEG4, ZV_CHANNELS, {1, 2, 3}, 0, true},
+        {VIDEO_CODEC_ZV_MJPEG, 0, {0xFF, 0xD8}, ZV_FLAG_MOTION | ZV_FLAG_VIDEO_LOSS, true}}) {
+    Options options;
+    options.channels = 1;
+    options.codec = row.codec;
+    options.buffer = 1 << 20;
+    Intake intake(options);
+    intake.take(row.stream, row.data.data(), static_cast<i32>(row.data.size()), row.flags);
+    intake.take(1, row.data.data(), 0, 0);  // a channel that is not recorded
+    const Frame *const frame = (row.stream == 0 ? intake.video() : intake.audio()).take().frame;
+    ASSERT_NE(frame, nullptr);
+    EXPECT_EQ(frame->intra, row.intra) << testing::PrintToString(row.data);
+    EXPECT_EQ(frame->motion, (row.flags & ZV_FLAG_MOTION) != 0);
+    EXPECT_EQ(frame->no_signal, (row.flags & ZV_FLAG_VIDEO_LOSS) != 0);
+    EXPECT_EQ(intake.video().take().frame, nullptr);
+  }
+}
+
+// Catches: a gap that is told too early at a low rate, one that is never told, and a wrong number of frames
+// that are due.
+TEST(RecorderIntake, SilenceAndFramesDueFollowTheRate) {
+  struct Row {
+    unsigned rate;
+    bool two_fields;
+    int limit_ms;
+    std::uint64_t due;  ///< in the ten seconds behind the first frame
+  };
+  for (const Row &row : {Row{0, false, 200, 300}, {0, true, 200, 600}, {14, false, 1668, 12}}) {
+    Options options;
+    options.channels = 1;
+    options.rate = row.rate;
+    options.two_fields = row.two_fields;
+    options.buffer = 1 << 20;
+    Intake intake(options);
+    EXPECT_EQ(intake.silence_ms(0, Clock::now()), 0u);
+    EXPECT_EQ(intake.expected(0, Clock::now()), 0u);
+    intake.take(0, nullptr, 0, 0);
+    const Clock::time_point last(Clock::duration(intake.arrivals(0).last));
+    EXPECT_EQ(intake.silence_ms(0, last - std::chrono::seconds(1)), 0u);
+    EXPECT_EQ(intake.silence_ms(0, last + std::chrono::milliseconds(row.limit_ms)), 0u);
+    EXPECT_EQ(intake.silence_ms(0, last + std::chrono::milliseconds(row.limit_ms + 1)), row.limit_ms + 1u);
+    EXPECT_EQ(intake.expected(0, last + std::chrono::seconds(10)), row.due);
+  }
+}
+
+// Catches: a slow loss that nobody hears of, and clocks that differ, or frames that come late, taken for a
+// loss.
+TEST(RecorderShortfall, TellsLossFromDrift) {
+  struct Row {
+    double missing_share;  ///< of all frames
+    unsigned silent_minute, late_minute;
+    std::size_t texts;  ///< in three hours
+    std::uint64_t missing;
+  };
+  constexpr double kRate = 30000.0 / 1001;
+  constexpr unsigned kNever = 1000;
+  for (const Row &row : {Row{0.0002, kNever, kNever, 0, 0},
+                         {-0.0002, kNever, kNever, 0, 0},
+                         {0.005, kNever, kNever, 3, 1619},
+                         {0.02, kNever, kNever, 180, 6474},
+                         {0, 70, kNever, 1, 1798},
+                         {0.0002, 70, kNever, 1, 1798},
+                         {0, kNever, 70, 1, 0}}) {
+    Shortfall shortfall;
+    std::vector<std::string> texts;
+    double frames = 1;
+    Shortfall::Counts now;
+    for (unsigned minute = 1; minute <= 180; ++minute) {
+      frames += minute == row.silent_minute ? 0 : kRate * 60 * (1 - row.missing_share);
+      const double late = minute == row.late_minute ? 900 : 0;
+      now = {static_cast<std::uint64_t>(frames - late), static_cast<std::uint64_t>(kRate * 60 * minute) + 1};
+      if (const std::string text = shortfall.end_minute(now); !text.empty()) texts.push_back(text);
+    }
+    EXPECT_EQ(texts.size(), row.texts) << row.missing_share << ": " << testing::PrintToString(texts);
+    EXPECT_NEAR(static_cast<double>(shortfall.missing(now)), static_cast<double>(row.missing), 2);
+    if (row.silent_minute == 70) {
+      EXPECT_EQ(texts.at(0).substr(4), " of 1799 were missing in the last minute");
+    } else if (row.texts == 3) {
+      EXPECT_THAT(texts.at(1),
+                  testing::MatchesRegex("5[34][0-9] of 10789[0-9] were missing in the last hour"));
+    }
+  }
+}
+
+// Catches: an option that sets another, a default that does not follow the others, and a choice that the card
+// refuses only when it records.
+TEST(RecorderOptions, AreTakenOrRefusedWithALine) {
+  const auto parse = [](const std::string &text) {
+    std::vector<std::string> words{"zarvo_recorder"};
+    std::istringstream stream(text);
+    for (std::string word; stream >> word;) words.push_back(word);
+    std::vector<char *> arguments;
+    for (std::string &word : words) arguments.push_back(word.data());
+    arguments.push_back(nullptr);
+    optind = 0;
+    return parse_options(static_cast<int>(words.size()), arguments.data());
+  };
+  const Options plain = parse("--root /rec///");
+  EXPECT_EQ(plain.root, "/rec");
+  EXPECT_EQ(std::tuple(plain.channels, plain.audio, plain.gop), std::tuple(0xFFFFu, 0xFu, 30u));
+  const Options fields = parse("--two-fields --root / --standard pal --scale half-d1 --audio none");
+  EXPECT_EQ(std::tuple(fields.root, fields.channels, fields.audio, fields.gop),
+            std::tuple("/", 0xFu, 0u, 50u));
+  EXPECT_EQ(stream_rate(fields, 3), 50);
+  const Options many =
+      parse("--root r --rate 7.5 --bps 1M --buffer 2 --sync 9 --when-full delete-oldest --gop 7");
+  EXPECT_EQ(recording::frame_rate_list(many.standard)[many.rate], std::string("7.5"));
+  EXPECT_EQ(std::tuple(many.bit_rate, many.buffer, many.sync.count(), many.delete_oldest, many.gop),
+            std::tuple(1 << 20, 2u << 20, 9, true, 7u));
+  for (const auto &[words, reason] : std::vector<std::pair<std::string, std::string>>{
+           {"--quiet", "--root DIR is missing"},
+           {"--root " + std::string(220, 'r'), "at most 219 bytes"},
+           {"--root r --two-fields --channels 1-9",
+            "at most 8 channels of this --scale with two fields, not 9"},
+           {"--root r --two-fields --channels 1-5 --scale half-d1", "at most 4 channels"},
+           {"--root r --two-fields --rate 15", "only at the full --rate"},
+           {"--root r --scale d1 --two-fields", "--scale d1"},
+           {"--root r --rate 29", "'29' is unknown"}}) {
+    try {
+      parse(words);
+      ADD_FAILURE() << words;
+    } catch (const UsageError &error) {
+      EXPECT_THAT(error.what(), testing::HasSubstr(reason));
+    }
+  }
+}
+
+// Catches: a service manager in a container, whose socket has no file, that hears nothing.
+TEST(RecorderService, TellsASocketWithoutAFile) {
+  const std::string name = "@zarvo_recorder_" + std::to_string(getpid());
+  sockaddr_un address{};
+  address.sun_family = AF_UNIX;
+  name.copy(address.sun_path + 0, name.size());
+  address.sun_path[0] = '\0';
+  const int file = socket(AF_UNIX, SOCK_DGRAM, 0);
+  ASSERT_EQ(bind(file, reinterpret_cast<const sockaddr *>(&address),
+                 static_cast<socklen_t>(offsetof(sockaddr_un, sun_path) + name.size())),
+            0);
+  setenv("NOTIFY_SOCKET", name.c_str(), 1);
+  notify("READY=1");
+  unsetenv("NOTIFY_SOCKET");
+  notify("STOPPING=1");
+  char text[64] = {};
+  EXPECT_EQ(recv(file, text, sizeof text - 1, MSG_DONTWAIT), 7);
+  EXPECT_STREQ(text, "READY=1");
+  EXPECT_LT(recv(file, text, sizeof text - 1, MSG_DONTWAIT), 0);
+  close(file);
+}
+
+// Catches: a second recorder where the lock file was deleted under the first.
+TEST(RecorderService, LockFileThatWasDeletedIsMadeAnew) {
+  char folder[] = "/tmp/zarvo_recorder_XXXXXX";
+  const fs::path root = mkdtemp(folder);
+  RootLock lock(root);
+  EXPECT_THROW(RootLock{root}, std::runtime_error);
+  fs::remove(root / ".zarvo-recorder.lock");
+  EXPECT_EQ(lock.hold(), 0);
+  EXPECT_THROW(RootLock{root}, std::runtime_error);
+  fs::remove_all(root);
+  EXPECT_EQ(lock.hold(), ENOENT);
+}
+
+// Catches: an hour deleted each second while a reader holds the space, and a disk that stays full because
+// nothing more is deleted.
+TEST(RecorderDiskSpace, WaitsForTheSpaceOfADeletion) {
+  const Clock::time_point now = Clock::now();
+  DeletionPause pause;
+  EXPECT_TRUE(pause.is_over(now, 3));
+  pause = {now + std::chrono::seconds(10), 3};
+  EXPECT_FALSE(pause.is_over(now + std::chrono::milliseconds(9999), 3));
+  EXPECT_FALSE(pause.is_over(now + std::chrono::seconds(1), 2.9));
+  EXPECT_TRUE(pause.is_over(now + std::chrono::seconds(1), 3.1));
+  EXPECT_TRUE(pause.is_over(now + std::chrono::seconds(10), 2.9));
 }
 
 // Catches: a group that goes on behind a lost frame, and a count that misses frames.
@@ -106,168 +308,6 @@ TEST(RecorderIntake, FullBufferLosesWholeGroups) {
   EXPECT_EQ(intake.video().take().frame->lost, 0u);
 }
 
-class StreamFilesTest : public testing::Test {
- protected:
-  StreamFilesTest() {
-    setenv("TZ", "UTC", 1);
-    tzset();
-    char folder[] = "/tmp/zarvo_recorder_XXXXXX";
-    options.root = mkdtemp(folder);
-    options.audio = 0b1001;
-    files = std::make_unique<StreamFiles>(options, 2);
-  }
-  ~StreamFilesTest() override { fs::remove_all(options.root); }
-
-  // Gives the files a frame of 100 bytes that came at a time.
-  void give(std::int64_t time, bool intra, u8 mark, std::uint32_t lost = 0, std::uint32_t gap_ms = 0) {
-    const std::vector<u8> data = frame_data(intra, 100, mark);
-    Frame frame{};
-    frame.time = time;
-    frame.length = 100;
-    frame.intra = intra;
-    frame.motion = !intra;
-    frame.lost = lost;
-    frame.gap_ms = gap_ms;
-    ASSERT_TRUE(ring.push(frame, data.data()));
-    files->queue(ring.take());
-  }
-
-  std::string path(const std::string &name) const { return options.root + "/Video/20251125/CH03/" + name; }
-
-  // The marks of the frames in a file.
-  std::vector<int> marks(const std::string &name) const {
-    std::ifstream file(path(name), std::ios::binary);
-    const std::string bytes{std::istreambuf_iterator<char>(file), {}};
-    std::vector<int> result;
-    for (std::size_t end = 32 + 100; end <= bytes.size(); end += 100) result.push_back(bytes[end - 1]);
-    EXPECT_EQ((bytes.size() - 32) % 100, 0u);
-    return result;
-  }
-
-  Options options;
-  std::unique_ptr<std::byte[]> memory = std::make_unique<std::byte[]>(1 << 16);
-  Ring ring{{memory.get(), 1 << 16}};
-  std::unique_ptr<StreamFiles> files;
-};
-
-// Catches: a frame that goes to the wrong side of the hour, an hour that is overwritten, by a second start or
-// by a clock that goes back, and counts of the index that belong to another group or file.
-TEST_F(StreamFilesTest, NewHourBeginsWithItsFirstIntraFrame) {
-  give(kTwoOClock - 80, true, 1);
-  give(kTwoOClock - 40, false, 2);
-  give(kTwoOClock, false, 3);
-  EXPECT_EQ(files->write(), 0);
-  give(kTwoOClock + 40, true, 4, 7, 250);
-  give(kTwoOClock + 80, false, 5);
-  give(kTwoOClock - 20, true, 6);  // the clock has gone back
-  give(kTwoOClock + 20, true, 7);
-  give(kTwoOClock + 60, true, 8);
-  EXPECT_EQ(files->write(), 0);
-  EXPECT_EQ(files->finish(kTwoOClock + 100), 0);
-  EXPECT_THAT(marks("20251125-13.rec"), ElementsAre(1, 2, 3));
-  EXPECT_THAT(marks("20251125-14.rec"), ElementsAre(4, 5));
-  EXPECT_THAT(marks("20251125-13.1.rec"), ElementsAre(6));
-  EXPECT_THAT(marks("20251125-14.1.rec"), ElementsAre(7, 8));
-
-  const std::vector<IndexEntry> old = recording::read_index(path("20251125-13.idx"));
-  ASSERT_EQ(old.size(), 3u);
-  EXPECT_EQ(to_line(old[0]),
-            "{\"event\":\"start\",\"time\":1764079199920,\"offset\":32,\"standard\":\"ntsc\",\"rate\":\"30\","
-            "\"fields\":1,"
-            "\"audio\":[1,4]}\n");
-  EXPECT_EQ(old[1].frames, 0);
-  EXPECT_EQ(to_line(old[2]),
-            "{\"event\":\"stop\",\"time\":1764079200040,\"offset\":332,\"frames\":3,\"bytes\":300,\"motion\":"
-            "2,\"lost\":0}\n");
-  std::vector<std::pair<IndexEntry::Kind, std::int64_t>> seen;
-  for (const IndexEntry &entry : recording::read_index(path("20251125-14.idx")))
-    seen.emplace_back(entry.kind, entry.kind == IndexEntry::Kind::gap ? entry.ms : entry.frames);
-  using Kind = IndexEntry::Kind;
-  EXPECT_THAT(seen,
-              ElementsAre(std::pair(Kind::start, 0), std::pair(Kind::buffer, 7), std::pair(Kind::gap, 250),
-                          std::pair(Kind::intra, 0), std::pair(Kind::stop, 2)));
-
-  files = std::make_unique<StreamFiles>(options, 2);  // a second start
-  give(kTwoOClock + kHourMs / 2, true, 9);
-  EXPECT_EQ(files->write(), 0);
-  EXPECT_THAT(marks("20251125-14.2.rec"), ElementsAre(9));
-}
-
-// Catches: in autumn, two hours in one file.
-TEST_F(StreamFilesTest, RepeatedHourIsAnotherPart) {
-  setenv("TZ", "Europe/Berlin", 1);
-  tzset();
-  constexpr std::int64_t kSummerEnds = 1761440400000;  // 2025-10-26 01:00 UTC, 3:00 becomes 2:00
-  for (int n = 0; n < 4; ++n) give(kSummerEnds - kHourMs + n * kHourMs / 2, true, static_cast<u8>(n));
-  EXPECT_EQ(files->write(), 0);
-  const fs::path folder = options.root + "/Video/20251026/CH03";
-  for (const char *name : {"20251026-02.rec", "20251026-02.1.rec"})
-    EXPECT_EQ(fs::file_size(folder / name), 232u) << name;
-}
-
-// Catches: a torn frame where the disk was full, a frame that is written twice or not at all afterwards, and
-// a file that takes no more bytes but is tried for ever.
-TEST_F(StreamFilesTest, WriteErrorKeepsWholeFrames) {
-  std::signal(SIGXFSZ, SIG_IGN);
-  give(kTwoOClock, true, 1);
-  give(kTwoOClock + 40, false, 2);
-  ASSERT_EQ(files->write(), 0);
-  rlimit limit{};
-  getrlimit(RLIMIT_FSIZE, &limit);
-  const rlim_t before = std::exchange(limit.rlim_cur, 32 + 350);
-  setrlimit(RLIMIT_FSIZE, &limit);
-  give(kTwoOClock + 80, false, 3);
-  give(kTwoOClock + 120, false, 4);
-  give(kTwoOClock + 160, false, 5);
-  EXPECT_EQ(files->write(), EFBIG);
-  give(kTwoOClock + 200, false, 6);
-  give(kTwoOClock + 240, true, 7);
-  limit.rlim_cur = before;
-  setrlimit(RLIMIT_FSIZE, &limit);
-  files->note_disk_error(kTwoOClock + 200, EFBIG);
-  EXPECT_EQ(files->write(), 0);
-  EXPECT_EQ(files->dropped(), 3u);
-  EXPECT_THAT(marks("20251125-14.rec"), ElementsAre(1, 2, 3));
-  EXPECT_THAT(marks("20251125-14.1.rec"), ElementsAre(7));
-  const auto index = recording::read_index(path("20251125-14.1.idx"));
-  ASSERT_GE(index.size(), 3u);
-  EXPECT_EQ(index[1].error, "File too large");
-  EXPECT_EQ(index[2].frames, 3);
-}
-
-// Catches: frames that go on to a file that nobody can reach, and a root that the recorder makes anew under a
-// mount point that is empty.
-TEST_F(StreamFilesTest, VanishedRootIsToldAndComesBack) {
-  give(kTwoOClock, true, 1);
-  ASSERT_EQ(files->write(), 0);
-  ASSERT_EQ(files->check_place(kTwoOClock), 0);
-  fs::rename(options.root, options.root + ".away");
-  EXPECT_EQ(files->check_place(kTwoOClock), ENOENT);
-  EXPECT_EQ(files->check_place(kTwoOClock), 0);  // told once
-  give(kTwoOClock + 40, true, 2);
-  EXPECT_EQ(files->write(), ENOENT);
-  EXPECT_FALSE(fs::exists(options.root));
-  fs::rename(options.root + ".away", options.root);
-  give(kTwoOClock + 80, false, 3);
-  EXPECT_EQ(files->write(), 0);
-  EXPECT_THAT(marks("20251125-14.rec"), ElementsAre(1));
-  EXPECT_THAT(marks("20251125-14.1.rec"), ElementsAre(2, 3));
-}
-
-// Catches: frames that are counted as recorded although their file has been deleted.
-TEST_F(StreamFilesTest, FramesForADeletedFileAreCountedAsDropped) {
-  give(kTwoOClock, true, 1);
-  ASSERT_EQ(files->write(), 0);
-  fs::remove(path("20251125-14.rec"));
-  EXPECT_EQ(files->check_place(kTwoOClock), ENOENT);
-  give(kTwoOClock + 40, false, 2);
-  files->drop_until(0);
-  EXPECT_EQ(files->dropped(), 1u);
-  give(kTwoOClock + 80, true, 3);
-  EXPECT_EQ(files->write(), 0);
-  EXPECT_THAT(marks("20251125-14.1.rec"), ElementsAre(3));
-}
-
 // Catches: a file that is no recording, or an hour that is being recorded, among the deleted ones.
 TEST(RecorderDiskSpace, DeletesTheOldestHourAlone) {
   char folder[] = "/tmp/zarvo_recorder_XXXXXX";
@@ -285,6 +325,7 @@ TEST(RecorderDiskSpace, DeletesTheOldestHourAlone) {
       "Video/20251125/CH01/20251125-00.rec",   "Video/keep/CH01/20251101-10.rec",
       "Video/20251101/kept/20251101-10.rec",   ".zarvo-recorder.lock"};
   for (const std::string &other : others) make(other);
+  fs::create_directories(root / "Video/20251110/CH01/20251110-10.rec/full");  // cannot be deleted
   EXPECT_EQ(delete_oldest_hour(root, {"20251125-00"}), "20251124-23");
   EXPECT_FALSE(fs::exists(root / "Video/20251124"));
   EXPECT_FALSE(fs::exists(root / "Audio/20251124"));
