@@ -5,6 +5,7 @@
 #include <sys/socket.h>
 #include <sys/un.h>
 
+#include <algorithm>
 #include <filesystem>
 #include <fstream>
 #include <memory>
@@ -26,8 +27,6 @@ namespace recorder {
 namespace {
 
 namespace fs = std::filesystem;
-using testing::ElementsAre;
-
 // Catches: a frame that is torn at the end of the memory, that overtakes another, or that the producer
 // overwrites while the consumer reads it.
 TEST(RecorderRing, FramesComeOutAsTheyWentIn) {
@@ -123,7 +122,7 @@ TEST(RecorderIntake, SilenceAndFramesDueFollowTheRate) {
   struct Row {
     unsigned rate;
     bool two_fields;
-    int limit_ms;
+    unsigned limit_ms;
     std::uint64_t due;  ///< in the ten seconds behind the first frame
   };
   for (const Row &row : {Row{0, false, 200, 300}, {0, true, 200, 600}, {14, false, 1668, 12}}) {
@@ -139,7 +138,7 @@ TEST(RecorderIntake, SilenceAndFramesDueFollowTheRate) {
     const Clock::time_point last(Clock::duration(intake.arrivals(0).last));
     EXPECT_EQ(intake.silence_ms(0, last - std::chrono::seconds(1)), 0u);
     EXPECT_EQ(intake.silence_ms(0, last + std::chrono::milliseconds(row.limit_ms)), 0u);
-    EXPECT_EQ(intake.silence_ms(0, last + std::chrono::milliseconds(row.limit_ms + 1)), row.limit_ms + 1u);
+    EXPECT_EQ(intake.silence_ms(0, last + std::chrono::milliseconds(row.limit_ms + 1)), row.limit_ms + 1);
     EXPECT_EQ(intake.expected(0, last + std::chrono::seconds(10)), row.due);
   }
 }
@@ -190,9 +189,8 @@ TEST(RecorderOptions, AreTakenOrRefusedWithALine) {
     std::vector<std::string> words{"zarvo_recorder"};
     std::istringstream stream(text);
     for (std::string word; stream >> word;) words.push_back(word);
-    std::vector<char *> arguments;
-    for (std::string &word : words) arguments.push_back(word.data());
-    arguments.push_back(nullptr);
+    std::vector<char *> arguments(words.size() + 1);
+    std::ranges::transform(words, arguments.begin(), [](std::string &word) { return word.data(); });
     optind = 0;
     return parse_options(static_cast<int>(words.size()), arguments.data());
   };
