@@ -136,6 +136,18 @@ TEST_F(WriterTest, LongErrorDropsOldGroups) {
   EXPECT_TRUE(given[0].ends_with(bytes.substr(bytes.size() - 100000)));
   EXPECT_THAT(told(),
               HasSubstr("channel 1: " + std::to_string(writer->dropped(0)) + " could not be written"));
+  EXPECT_EQ(count(text, "No such file or directory"), 3u) << text;
+}
+
+// Catches: frames that are in no file at the end and in no count.
+TEST_F(WriterTest, RootThatStaysAwayIsCounted) {
+  start();
+  fs::remove_all(options.root);
+  feed();
+  writer->finish();
+  EXPECT_EQ(writer->dropped(0), 5u);
+  EXPECT_THAT(told(), testing::AllOf(HasSubstr("channel 4: 5 could not be written and are lost"),
+                                     HasSubstr("audio input 2: 5 could not be written and are lost")));
 }
 
 // Catches: a full disk that costs the frames that the buffer still holds at the end, and a pause that nobody
