@@ -20,8 +20,8 @@ class Shortfall {
   };
 
   /// Call it once a minute. Returns a text, such as "90 of 1798 were missing in the last minute", if more
-  /// than 1 % were missing in this minute, or more than 0.05 % in an hour that ends, without what such minutes
-  /// told.
+  /// than 1 % were missing in this minute, or more than 0.05 % in an hour that ends, without what such
+  /// minutes told.
   std::string end_minute(Counts now);
 
   /// Returns how many frames are missing in all.
