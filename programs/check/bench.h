@@ -25,7 +25,7 @@ class Bench {
  public:
   /// Opens the card and notes what it has. Throws CannotRun.
   Bench(bool quick, unsigned seconds);
-  ~Bench();
+  virtual ~Bench();
   Bench(const Bench &) = delete;
   Bench &operator=(const Bench &) = delete;
 
@@ -37,17 +37,17 @@ class Bench {
   /// The SDK with a standard and a width; throws if the SDK refuses them.
   HANDLE sdk(u32 standard, u32 resolution);
 
+  // The evidence that many checks judge. A test prepares its own.
   /// Each of these is recorded when a check asks for it first.
-  const Recording &recording(const std::string &name);
-  const DriverCapture &capture();      ///< four channels
-  const DriverCapture &full_load();    ///< all channels, for the time of --seconds
-  const DriverCapture &after_pause();  ///< with a pause of the host
+  virtual const Recording &recording(const std::string &name);
+  virtual const DriverCapture &capture();      ///< four channels
+  virtual const DriverCapture &full_load();    ///< all channels, for the time of --seconds
+  virtual const DriverCapture &after_pause();  ///< with a pause of the host
+  virtual u32 cameras();                       ///< channels with a picture
+  virtual u32 sounds();                        ///< audio inputs with a signal
 
   /// To be called before a check changes windows without the SDK, which always changes them.
   void touch_layout() { layout_touched_ = true; }
-
-  u32 cameras();  ///< channels with a picture
-  u32 sounds();   ///< audio inputs with a signal
 
   /// Puts everything back. Returns what could not be put back, or an empty text.
   std::string restore();

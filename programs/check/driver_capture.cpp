@@ -89,29 +89,14 @@ class Reader {
     nodes_.issue(kEncoder, driver::ENC_IOC_MPEG4_REQUEST);
     const long result = read_frame(driver::kMpeg4ReadSize);
     if (result < 0) capture_.errors[0] = errno;
-    if (result > 0) {
-      const u8 *const area = stream_.bytes();
-      const driver::Mpeg4Head head = driver::unpacked_head(word_at(area));
-      const double stamp =
-          word_at(area + driver::kMpeg4TimeSeconds) + word_at(area + driver::kMpeg4TimeMicroseconds) * 1e-6;
-      capture_.mpeg4.push_back({monotonic_seconds(), wall_seconds(), result, head, stamp,
-                                picture_type(area + driver::kMpeg4DescriptorSize, head.length)});
-    }
+    if (result > 0) capture_.mpeg4.push_back(mpeg4_read(stream_.bytes(), result));
     nodes_.issue(kEncoder, driver::ENC_IOC_MPEG4_DONE);
   }
 
   void read_mjpeg() {
     const long result = read_frame(driver::kMjpegReadSize);
     if (result < 0) capture_.errors[1] = errno;
-    if (result <= 0) return;
-    const u8 *const area = stream_.bytes() + driver::kMjpegAreaOffset;
-    MjpegRead taken{monotonic_seconds(), result, {}, false};
-    std::memcpy(&taken.descriptor, area + driver::kMjpegDescriptorOffset, sizeof taken.descriptor);
-    if (result > static_cast<long>(driver::kMjpegDescriptorSize) &&
-        result <= static_cast<long>(driver::kMjpegReadSize))
-      taken.ends_with_eoi = ends_with_eoi(area + driver::kMjpegDataOffset,
-                                          static_cast<std::size_t>(result) - driver::kMjpegDescriptorSize);
-    capture_.mjpeg.push_back(taken);
+    if (result > 0) capture_.mjpeg.push_back(mjpeg_read(stream_.bytes(), result));
   }
 
   void read_audio() {
@@ -151,6 +136,29 @@ void set_encoders(const Nodes &nodes, u32 channels) {
 }
 
 }  // namespace
+
+Mpeg4Read mpeg4_read(const u8 *region, long result) {
+  const driver::Mpeg4Head head = driver::unpacked_head(word_at(region));
+  const double stamp =
+      word_at(region + driver::kMpeg4TimeSeconds) + word_at(region + driver::kMpeg4TimeMicroseconds) * 1e-6;
+  return {monotonic_seconds(),
+          wall_seconds(),
+          result,
+          head,
+          stamp,
+          picture_type(region + driver::kMpeg4DescriptorSize, head.length)};
+}
+
+MjpegRead mjpeg_read(const u8 *region, long result) {
+  const u8 *const area = region + driver::kMjpegAreaOffset;
+  MjpegRead taken{monotonic_seconds(), result, {}, false};
+  std::memcpy(&taken.descriptor, area + driver::kMjpegDescriptorOffset, sizeof taken.descriptor);
+  if (result > static_cast<long>(driver::kMjpegDescriptorSize) &&
+      result <= static_cast<long>(driver::kMjpegReadSize))
+    taken.ends_with_eoi = ends_with_eoi(area + driver::kMjpegDataOffset,
+                                        static_cast<std::size_t>(result) - driver::kMjpegDescriptorSize);
+  return taken;
+}
 
 DriverCapture capture_at_driver(const Nodes &nodes, const CaptureSetup &setup) {
   DriverCapture capture;

@@ -27,6 +27,10 @@ struct MjpegRead {
   bool ends_with_eoi;  ///< the last byte 0xD9 follows a 0xFF
 };
 
+/// Return what the stream region says behind a read that has returned data.
+Mpeg4Read mpeg4_read(const u8 *region, long result);
+MjpegRead mjpeg_read(const u8 *region, long result);
+
 struct OtherRead {
   double time;
   long result;

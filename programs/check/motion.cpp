@@ -2,18 +2,11 @@
 #include "bench.h"
 #include "check.h"
 #include "lazy.h"
-#include "live.h"
 #include "programs/common/card.h"
+#include "series.h"
 
 namespace contract {
 namespace {
-
-/// What the tags of a camera's frames say under different settings.
-struct Series {
-  bool moves = false;
-  Live::Tags never, always, stopped, excluded, included, other;
-  unsigned status_set = 0, status_reads = 0;
-};
 
 bool scene_moves(const Image &one, const Image &other) {
   constexpr int kClearly = 30;
@@ -21,13 +14,13 @@ bool scene_moves(const Image &one, const Image &other) {
   return changed_pixels(one, other, kClearly) > kPixels;
 }
 
-Series take_series(Bench &bench) {
+MotionSeries take_series(Bench &bench) {
   constexpr double kSettle = 0.5, kLook = 0.4;
   constexpr ZV_RECT kWhole{0, 0, 720, 480};
   HANDLE card = bench.sdk(VIDEO_STANDARD_ZV_NTSC, RESOLUTION_ZV_720);
   const u32 cameras = bench.cameras();
   const u32 camera = first_channel(cameras), other = first_channel(cameras & ~(1u << camera));
-  Series series;
+  MotionSeries series;
   Live live(card, 1u << camera | 1u << other);
   const Image before = live.picture(camera);
   const auto look = [&](u32 channel) {
@@ -72,44 +65,48 @@ struct Row {
   const char *name;
   const char *proves;
   const char *meaning;
-  Result (*run)(const Series &series);
+  Result (*run)(const MotionSeries &series);
 };
 constexpr const char *kMissed = "Motion is not noticed.";
 constexpr const char *kFalse = "Motion is reported where there is none.";
 constexpr Row kRows[] = {
     {"threshold-0xffff", "The threshold 0xFFFF never reports motion.", kFalse,
-     [](const Series &series) { return none(series.never); }},
+     [](const MotionSeries &series) { return none(series.never); }},
     {"threshold-0", "The threshold 0 reports the motion of a moving picture.", kMissed,
-     [](const Series &series) { return most(series.always); }},
+     [](const MotionSeries &series) { return most(series.always); }},
     {"status", "The status word agrees with the flags of the frames.",
      "Live view and recordings mark motion differently.",
-     [](const Series &series) {
+     [](const MotionSeries &series) {
        const bool tagged = series.always.with_motion * 2 > series.always.frames;
        const bool told = series.status_set * 2 > series.status_reads;
        return expect(tagged == told, tagged ? "the bit is set" : "the bit is clear", series.status_set,
                      " of ", series.status_reads, " reads have it");
      }},
     {"excluded", "An excluded area reports no motion.", kFalse,
-     [](const Series &series) { return none(series.excluded); }},
+     [](const MotionSeries &series) { return none(series.excluded); }},
     {"included", "The area reports motion again when it is included.", kMissed,
-     [](const Series &series) { return most(series.included); }},
+     [](const MotionSeries &series) { return most(series.included); }},
     {"stopped", "After the stop no motion is reported.", kFalse,
-     [](const Series &series) { return none(series.stopped); }},
+     [](const MotionSeries &series) { return none(series.stopped); }},
     {"other-camera", "The threshold of a camera does not count for another one.", kFalse,
-     [](const Series &series) { return none(series.other); }},
+     [](const MotionSeries &series) { return none(series.other); }},
 };
 
 }  // namespace
 
-void add_motion(Checks &checks) {
-  const auto taken = std::make_shared<Lazy<Series>>();
+void add_motion_series(Checks &checks, const std::function<MotionSeries(Bench &)> &take) {
+  const auto taken = std::make_shared<Lazy<MotionSeries>>();
   for (const Row &row : kRows)
-    checks.push_back(
-        {words("motion.", row.name), row.proves, row.meaning, true, [taken, run = row.run](Bench &bench) {
-           if (bench.cameras() == 0) return skipped("no camera is plugged in");
-           const Series &series = taken->get([&] { return take_series(bench); });
-           return series.moves ? run(series) : skipped("nothing moves in front of the camera");
-         }});
+    checks.push_back({words("motion.", row.name), row.proves, row.meaning, true,
+                      [taken, take, run = row.run](Bench &bench) {
+                        if (bench.cameras() == 0) return skipped("no camera is plugged in");
+                        const MotionSeries &series = taken->get([&] { return take(bench); });
+                        return series.moves ? run(series) : skipped("nothing moves in front of the camera");
+                      }});
+}
+
+void add_motion(Checks &checks) {
+  add_motion_series(checks, take_series);
 }
 
 }  // namespace contract
