@@ -28,11 +28,14 @@ Result results(Bench &bench) {
 }
 
 Result block_size(Bench &bench) {
+  std::size_t blocks = 0;
   for (const Track &track : bench.recording("settings").audio)
-    for (const Frame &block : track)
+    for (const Frame &block : track) {
       if (block.data.size() != driver::kAudioBlockSize)
         return broken("48 bytes", words(block.data.size(), " bytes"));
-  return held();
+      ++blocks;
+    }
+  return expect(blocks > 0, "blocks", "none");
 }
 
 Result rate(Bench &bench, u32 input) {
@@ -86,7 +89,7 @@ constexpr CheckRow kRows[] = {
     {"start.soon", "The first block comes within half a second.", "The start of each recording is silent.",
      [](Bench &bench) { return starts_soon(bench.capture(), bench.capture().audio); }},
     {"gap", "No pause between blocks is longer than 0.4 seconds.", "Sound stutters.",
-     [](Bench &bench) { return no_gap(bench.capture().audio); }},
+     [](Bench &bench) { return no_gap(bench.capture(), bench.capture().audio); }},
     {"block", "A block has 48 bytes.", "Players do not understand the recording.", block_size},
     {"apart", "The inputs have different sounds.", "Two recordings have the sound of one microphone.", apart},
     {"silence", "An input without a signal is silent.", "The status is wrong, or the input picks up noise.",

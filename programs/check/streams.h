@@ -7,6 +7,7 @@
 
 #include <algorithm>
 #include <map>
+#include <set>
 
 #include "check.h"
 #include "driver_capture.h"
@@ -29,15 +30,6 @@ std::vector<SizeCase> size_cases();
 /// Expects that no read of a stream has failed. The number is the index in DriverCapture::errors.
 Result no_read_error(const DriverCapture &capture, std::size_t stream);
 
-/// Expects the first read with data within half a second.
-template <typename Read>
-Result starts_soon(const DriverCapture &capture, const std::vector<Read> &reads) {
-  constexpr double kSoon = 0.5;
-  if (reads.empty()) return broken("data", "none");
-  const double delay = reads.front().time - capture.start;
-  return expect(delay < kSoon, words("less than ", kSoon, " s"), delay, " s");
-}
-
 inline u32 channel_of(const Mpeg4Read &frame) {
   return frame.head.channel;
 }
@@ -46,6 +38,19 @@ inline u32 channel_of(const MjpegRead &picture) {
 }
 inline u32 channel_of(const OtherRead &) {
   return 0;
+}
+
+/// Expects the first read of each channel within half a second.
+template <typename Read>
+Result starts_soon(const DriverCapture &capture, const std::vector<Read> &reads) {
+  constexpr double kSoon = 0.5;
+  std::set<u32> started;
+  for (const Read &each : reads) {
+    const double delay = each.time - capture.start;
+    if (started.insert(channel_of(each)).second && delay >= kSoon)
+      return broken(words("less than ", kSoon, " s"), words(delay, " s on channel ", channel_of(each) + 1));
+  }
+  return started.empty() ? broken("data", "none") : held();
 }
 
 /// Expects reads from all encoded channels and from no others.
@@ -61,9 +66,9 @@ Result channels_seen(const DriverCapture &capture, const std::vector<Read> &read
                 std::hex, seen);
 }
 
-/// Expects no long pause between the reads of a channel.
+/// Expects no long pause between the reads of a channel, nor behind the last one.
 template <typename Read>
-Result no_gap(const std::vector<Read> &reads) {
+Result no_gap(const DriverCapture &capture, const std::vector<Read> &reads) {
   constexpr double kLongest = 0.4;
   std::map<u32, double> last;
   double longest = 0;
@@ -73,6 +78,7 @@ Result no_gap(const std::vector<Read> &reads) {
     before->second = each.time;
   }
   if (last.empty()) return broken("data", "none");
+  for (const auto &[channel, time] : last) longest = std::max(longest, capture.end - time);
   return expect(longest < kLongest, words("less than ", kLongest, " s"), longest, " s");
 }
 
