@@ -87,15 +87,21 @@ u32 Bench::sounds() {
   return ~zv_GetAudioStatus(sdk()) & 0xF;
 }
 
-std::string Bench::restore() try {
+std::string Bench::restore() {
+  std::string left;
+  // A part that cannot be put back leaves no other part as the checks have it.
+  const auto put_back = [&left](const auto &part) {
+    try {
+      part();
+    } catch (const std::exception &error) {
+      left.append(left.empty() ? "" : "; ").append(error.what());
+    }
+  };
   close_all();
-  if (layout_touched_) found_->restore_layout(sdk());
-  found_->restore(nodes());
+  if (layout_touched_) put_back([&] { found_->restore_layout(sdk()); });
+  put_back([&] { found_->restore(nodes()); });
   close_all();
-  return {};
-} catch (const std::exception &error) {
-  close_all();
-  return error.what();
+  return left;
 }
 
 }  // namespace contract

@@ -29,7 +29,8 @@ Image picture_of(const Nodes &nodes, u32 width, u32 height) {
   for (int attempt = 0; attempt < 200 && image.empty(); ++attempt) {
     u32 index = 0;
     const long size = read_preview(nodes.fd(kDisplay), index);
-    if (size == static_cast<long>(std::size_t{width} * height * 2) && index < driver::kPreviewBuffers &&
+    if (size == static_cast<long>(std::size_t{width} * height * 2) &&
+        size <= static_cast<long>(driver::kPreviewBufferSize) && index < driver::kPreviewBuffers &&
         buffers[index]->bytes() != nullptr)
       image = unpacked(buffers[index]->bytes(), width, height);
     else
@@ -217,7 +218,15 @@ void FoundState::restore(const Nodes &nodes) const {
   nodes.set_standard(standard_);
   nodes.issue(kVideoInput, driver::VIN_IOC_SET_WIDTH, &width);
   if (no_layout_) clear_layout(nodes);
-  for (const auto &undo : undo_) undo(nodes);
+  std::string failure;
+  for (const auto &undo : undo_) {
+    try {
+      undo(nodes);
+    } catch (const std::runtime_error &error) {
+      failure = error.what();
+    }
+  }
+  if (!failure.empty()) throw std::runtime_error(failure);
 }
 
 }  // namespace contract
