@@ -69,8 +69,10 @@ Result routing_read_back(Bench &bench) {
 
 Result decoder_read_back(Bench &bench, u8 chip) {
   const Nodes &nodes = bench.nodes();
-  for (u8 n = 0; n < driver::kChannelsPerChip; ++n) {
-    const auto address = static_cast<u8>(driver::kDecoderProperty + driver::kDecoderChannelStride * n);
+  constexpr u32 kProperties = 4;
+  for (u32 n = 0; n < driver::kChannelsPerChip * kProperties; ++n) {
+    const auto address = static_cast<u8>(driver::kDecoderProperty + n % kProperties +
+                                         driver::kDecoderChannelStride * (n / kProperties));
     const u8 found = nodes.decoder(chip, address);
     for (const u8 value : {u8{0x35}, u8{0xCA}, found}) {
       nodes.write_decoder(chip, address, value);
