@@ -4,6 +4,8 @@
 #include <array>
 #include <cmath>
 #include <cstdlib>
+#include <stdexcept>
+#include <string>
 
 namespace contract {
 namespace {
@@ -16,6 +18,10 @@ double mean_of(const std::vector<u8> &plane, u32 stride, Area area) {
   return count > 0 ? sum / count : 0;
 }
 
+std::string size_of(const Image &image) {
+  return std::to_string(image.width) + " x " + std::to_string(image.height);
+}
+
 Area chroma_area(const Image &image, Area area) {
   const u32 shrink = image.height / image.chroma_height;
   return {area.x_start / 2, area.y_start / shrink, area.x_end / 2, area.y_end / shrink};
@@ -24,6 +30,8 @@ Area chroma_area(const Image &image, Area area) {
 }  // namespace
 
 Tones tones(const Image &image, Area area) {
+  if (image.chroma_height == 0 || area.x_end > image.width || area.y_end > image.height)
+    throw std::runtime_error("a picture of " + size_of(image) + " is too small");
   const Area chroma = chroma_area(image, area);
   Tones found{mean_of(image.y, image.width, area), 0, mean_of(image.cb, image.width / 2, chroma),
               mean_of(image.cr, image.width / 2, chroma)};
@@ -52,7 +60,13 @@ Image unpacked(const u8 *uyvy, u32 width, u32 height) {
   return image;
 }
 
+void require_same_size(const Image &one, const Image &other) {
+  if (one.width != other.width || one.height != other.height)
+    throw std::runtime_error("pictures of " + size_of(one) + " and of " + size_of(other) + " come");
+}
+
 std::size_t changed_pixels(const Image &one, const Image &other, int clearly) {
+  require_same_size(one, other);
   std::size_t changed = 0;
   for (std::size_t at = 0; at < one.y.size(); ++at)
     changed += std::abs(one.y[at] - other.y[at]) > clearly ? 1 : 0;

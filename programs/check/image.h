@@ -27,7 +27,8 @@ struct Image {
   bool empty() const { return y.empty(); }
 };
 
-/// Means over an area. The deviation is the standard deviation of the luma.
+/// Means over an area. The deviation is the standard deviation of the luma. tones() throws std::runtime_error
+/// if the area is not in the picture: a card may deliver another size than it should.
 struct Tones {
   double luma, deviation, cb, cr;
 };
@@ -35,6 +36,9 @@ Tones tones(const Image &image, Area area);
 
 /// Unpacks a UYVY picture.
 Image unpacked(const u8 *uyvy, u32 width, u32 height);
+
+/// Throws std::runtime_error if two pictures do not have the same size.
+void require_same_size(const Image &one, const Image &other);
 
 /// Counts the pixels whose luma differs by more than `clearly` between two pictures of the same size.
 std::size_t changed_pixels(const Image &one, const Image &other, int clearly);
