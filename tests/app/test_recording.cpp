@@ -2,6 +2,7 @@
 #include <sys/stat.h>
 
 #include "recording_fixture.h"
+#include "zv_lib.h"
 
 namespace {
 
@@ -117,6 +118,17 @@ TEST_F(Recording, RefusedStartsLeaveTheDialogIdle) {
   }
   EXPECT_EQ(files().size(), 5u);
   for (const auto &path : files()) EXPECT_EQ(fs::file_size(path), kHeader);
+}
+
+// Catches: a bit rate that is sent although the operator has chosen a quantiser too.
+TEST_F(Recording, AQuantiserWinsOverABitRate) {
+  dialog->comboCBRValue->setCurrentIndex(3);
+  dialog->comboQPvalue->setCurrentIndex(5);
+  start(kCif, 1);
+  ZV_VIDEO_CONFIG sent{};
+  EXPECT_EQ(zv_GetVideoEncodeConfig(zv_handle, 0, &sent), ZV_OK);
+  EXPECT_EQ(std::tuple(sent.qp, sent.CBREnable, dialog->comboCBRValue->currentIndex()),
+            std::tuple(dialog->comboQPvalue->currentText().toUInt(), 0u, 0));
 }
 
 // A second start must leave the running recording alone; a dialog that is left or destroyed while it records

@@ -117,6 +117,16 @@ TEST_F(ItemTest, DropsIntraFramesOnlyAndLimitsTheQueue) {
   EXPECT_EQ(card::counters().mjpeg.lost, 1u);
 }
 
+// Catches: a copy that is copied again, so that the host gets the first frame for ever.
+TEST_F(ItemTest, EachFrameComesTwiceAndNoCopyIsCopied) {
+  card::apply("twice=mpeg4:1");
+  queue_frames(1, 0);
+  queue_frames(1, 1);
+  std::vector<u32> types;
+  while (types.size() < 9 && read_mpeg4() > 0) types.push_back(driver::unpacked_head(word_at(0)).type);
+  EXPECT_THAT(types, testing::ElementsAre(0, 0, 1, 1));
+}
+
 TEST_F(ItemTest, RandomDamageRepeatsWithTheSeed) {
   const auto damaged = [this](const char *line) {
     card::apply(line);

@@ -4,6 +4,7 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <fstream>
 
 #include "node_test.h"
 
@@ -70,6 +71,7 @@ TEST(Preload, OptionsComeFromTheEnvironment) {
                             "[^\n]*\n[^\n]*Invalid argument\n[^\n]*Invalid argument\n"));
   EXPECT_THAT(opened("/dev/zarvo_enc0", "camera2=/no/such.mp4"), HasSubstr("item \"camera2\": "));
   const std::string file = testing::TempDir() + "card_log_" + std::to_string(getpid());
+  std::ofstream(file) << std::string(1000, 'x');  // an earlier log, which the new one replaces
   opened("/dev/zarvo_vin0 /dev/zarvo_dec0", "log=" + file);
   EXPECT_THAT(
       output_of("cat " + file),

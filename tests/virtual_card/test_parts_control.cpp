@@ -2,6 +2,7 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <poll.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
 #include <sys/un.h>
@@ -109,6 +110,22 @@ TEST_F(ControlTest, ALogClientGetsItsLinesAndIsToldWhatItMissed) {
   }
   close(slow);
   while (log.on()) add_call(card::Operation::munmap, card::Device::display);  // ends when the client has gone
+}
+
+TEST_F(ControlTest, ALogClientKeepsItsLinesWhenOthersLeave) {
+  ASSERT_EQ(server.start(path), "");
+  const int watcher = connected(), other = connected();
+  for (const int client : {watcher, other}) {
+    send(client, "log\n", 4, 0);
+    EXPECT_EQ(receive(client), "ok\n");
+  }
+  close(other);
+  for (int n = 0; n < 3; ++n) EXPECT_EQ(ask("after it\n"), "ok\n<after it>");  // it has left by now
+  add_call(card::Operation::open, card::Device::encoder);
+  pollfd readable{watcher, POLLIN, 0};
+  ASSERT_EQ(poll(&readable, 1, 10'000), 1);
+  EXPECT_EQ(receive(watcher), "1.000000 encoder open = 0\n");
+  close(watcher);
 }
 
 TEST_F(ControlTest, RandomRequestsHarmNobody) {
