@@ -86,7 +86,10 @@ TEST_F(PreviewTest, ShowsTheCardsPictureInAWindowOfTheChosenSize) {
     window.captions.clear();
     press(dialog->btnPreviewStart);
     EXPECT_FALSE(dialog->radioPAL->isEnabled());
-    ASSERT_TRUE(eventually([] { return std::lock_guard(window.mutex), window.captions.size() >= 3; }));
+    ASSERT_TRUE(eventually([] {
+      const std::lock_guard lock(window.mutex);
+      return window.captions.size() >= 3;
+    }));
     virtual_card::record_log(true);
     press(dialog->btnPreviewStop);
     join_preview_thread();
