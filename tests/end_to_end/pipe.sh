@@ -13,11 +13,13 @@ expect_equal "frames in the stream and in its line" "$told" "$(decoded_frames "$
 # A reader that has enough ends the recording, and that is no failure.
 "${RECORD[@]}" --seconds 0 2>"$FOLDER/log" | head -c 20000 >"$FOLDER/part" || die "status ${PIPESTATUS[*]}"
 
-# Catches: a recorder that cannot be stopped because it waits for a reader that does not read.
+# Catches: a recorder that waits for ever for a reader that does not read, at SIGTERM or when its time is over.
 mkfifo "$FOLDER/pipe"
 exec 3<>"$FOLDER/pipe"
-"${RECORD[@]}" --codec mjpeg --seconds 0 2>"$FOLDER/log" >"$FOLDER/pipe" &
-recorder=$!
-sleep 2 # until the pipe is full: 64 KiB
-kill -TERM "$recorder"
-expect "SIGTERM does not end the recorder" wait_until 20 process_gone "$recorder"
+for seconds in 0 3; do
+  "${RECORD[@]}" --codec mjpeg --seconds $seconds 2>"$FOLDER/log" >"$FOLDER/pipe" &
+  recorder=$!
+  sleep 2 # until the pipe is full: 64 KiB
+  [ $seconds -gt 0 ] || kill -TERM "$recorder"
+  expect "the recorder does not end" wait_until 20 process_gone "$recorder"
+done
