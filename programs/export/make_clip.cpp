@@ -32,21 +32,22 @@ void report_missing_hours(const std::vector<Recording> &found, const Stretch &ra
 /// Returns the stretches with motion, and what is around them. Takes away the recordings that do not tell.
 std::vector<Stretch> motion_in(std::vector<Recording> &recordings, const Stretch &range, Report &report) {
   std::vector<Stretch> stretches;
-  const char *none = "no index tells of motion there; no clip is written";
+  std::string none = "nothing is recorded there";
   for (const Recording &recording : recordings) {
     if (recording.index.empty()) {
       report.skipped(recording.path + ": no index tells of motion: skipped");
+      none = "no index tells of motion there";
       continue;
     }
     const Contents contents = contents_of(recording.index);
-    if (contents.recorded.overlaps(range)) none = "there is no motion; no clip is written";
+    if (contents.recorded.overlaps(range)) none = "there is no motion";
     for (Stretch stretch : contents.motion) {
       stretch.from = std::max(stretch.from - kAroundMotion, range.from);
       stretch.to = std::min(stretch.to + kAroundMotion, range.to);
       if (stretch.from < stretch.to) append(stretches, stretch);
     }
   }
-  if (stretches.empty()) throw std::runtime_error(none);
+  if (stretches.empty()) throw std::runtime_error(none + "; no clip is written");
   std::erase_if(recordings, [](const Recording &recording) { return recording.index.empty(); });
   return stretches;
 }

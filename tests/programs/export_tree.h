@@ -142,12 +142,14 @@ class ExportTree : public testing::Test {
     entry.fields = fields_;
     Milliseconds end = at(bursts.front().time);
     add(Kind::start, end);
+    int count = 0;
     for (const Burst &burst : bursts) {
       const Milliseconds time = at(burst.time);
       entry.ms = time - end;
       if (time > end) add(Kind::gap, time);
+      if (path.extension() == ".aud") count = 0;  // a line stands behind each gap
       for (int piece = 0; piece < burst.pieces; ++piece) {
-        const bool intra = piece % group == 0;
+        const bool intra = count++ % group == 0;
         if (intra) add(Kind::intra, time + piece * period);
         entry.motion = burst.motion;
         content += make(intra);

@@ -45,15 +45,19 @@ TEST_F(ExportTree, AClipHoldsEachPictureOnceAtItsTime) {
 // the index sends the reader to; frames behind a damaged one that stay, move, or count as a gap.
 TEST_F(ExportTree, AClipBeginsWithTheIntraFrameBeforeItsRange) {
   record("20261125-14", {{"14:00:00", 30}}, 5);
-  EXPECT_EQ(clip("14:00:00.400", "14:00:00.900"), "10-22@0");
-  EXPECT_EQ(clip("14:00:00.399", "14:00:00.900"), "5-22@0");
-  EXPECT_EQ(clip("14:00", "14:00:00.900"), "0-22@0");
+  EXPECT_EQ(clip("14:00:00.400", "14:00:00.920"), "10-22@0");
+  EXPECT_EQ(clip("14:00:00.399", "14:00:00.920"), "5-22@0");
+  EXPECT_EQ(clip("14:00", "14:00:00.920"), "0-22@0");
   std::fstream file(video("20261125-14.rec"), std::ios::in | std::ios::out | std::ios::binary);
   file.seekp(recording::read_index(video("20261125-14.idx"))[2].offset + 45);  // in the second of its group
   file.write("\0\0\0\0", 4).flush();
-  EXPECT_EQ(clip("14:00:00", "14:00:00.900"), "0-5@0 10-22@400 !");
+  EXPECT_EQ(clip("14:00:00", "14:00:00.920"), "0-5@0 10-22@400 !");
   EXPECT_THAT(lines_, HasSubstr("is damaged: 4 frames skipped\n"));
   EXPECT_THAT(lines_, Not(HasSubstr("no pictures")));
+  record("20261125-15", {{"15:00:00", 7}, {"15:00:02", 10}}, 5);  // a gap within a group
+  EXPECT_EQ(clip("15:00", "15:00:02.200"), "30-36@0 37-41@2000 !");
+  EXPECT_THAT(lines_,
+              HasSubstr("no pictures from 2026-11-25 15:00:00 to 2026-11-25 15:00:02, for 1.72 seconds"));
 }
 
 // Catches: pictures of two fields at half their speed; sizes that are not shown as 4:3.
@@ -84,8 +88,10 @@ TEST_F(ExportTree, MotionIsJoinedWithWhatIsAroundIt) {
 TEST_F(ExportTree, SaysWhyThereIsNoMotion) {
   record("20261125-14", {{"14:00:00", 50}});
   record("20261125-15", {{"15:00:00", 50, 1}});
-  const std::pair<const char *, const char *> rows[] = {
-      {"14:00", "there is no motion"}, {"15:00", "no index tells"}, {"17:00", "nothing is recorded there"}};
+  const std::pair<const char *, const char *> rows[] = {{"14:00", "there is no motion"},
+                                                        {"14:30", "nothing is recorded there"},
+                                                        {"15:00", "no index tells"},
+                                                        {"17:00", "nothing is recorded there"}};
   fs::remove(video("20261125-15.idx"));
   for (const auto &[from, line] : rows) {
     EXPECT_EQ(clip(from, from + std::string(":30"), true), " !");
@@ -139,14 +145,22 @@ TEST_F(ExportTree, InAutumnAnHourComesTwice) {
 TEST_F(ExportTree, AudioIsPlacedByTime) {
   record("20261125-14", {{"14:00:00", 100}});
   record("20261125-14.1", {{"14:10:00", 100}});
-  record_audio("20261125-14", {{"14:10:00.016", 62}, {"14:10:02.016", 125}});
+  record_audio("20261125-14", {{"14:10:00.016", 62}, {"14:10:01.108", 62}, {"14:10:03.108", 50}});
   clip("14:10", "14:10:04", false, 2);
-  EXPECT_EQ(audio_, "0-61@0 62-186@2000");
-  clip("14:10:02.400", "14:10:03.200", false, 2);
-  EXPECT_EQ(audio_, "87-136@0");
+  EXPECT_EQ(audio_, "0-61@0 62-123@1092 124-173@3092");
+  clip("14:10:01.400", "14:10:02", false, 2);
+  EXPECT_EQ(audio_, "82-118@12");
+  // Blocks that are missing without an event, and blocks that come late.
+  const auto index = recording::read_index(audio("20261125-14.idx"));
+  std::ofstream without_gaps(audio("20261125-14.idx"));
+  for (const IndexEntry &entry : index)
+    if (entry.kind != Kind::gap) without_gaps << to_line(entry);
+  without_gaps.close();
+  clip("14:10", "14:10:04", false, 2);
+  EXPECT_EQ(audio_, "0-123@0 124-173@3092");
   fs::remove(audio("20261125-14.idx"));
   clip("14:00", "14:00:04", false, 2);
-  EXPECT_EQ(audio_, "0-186@0");
+  EXPECT_EQ(audio_, "0-173@0");
 }
 
 // Catches: a gap that closes in mp4, and samples that are lost at the end.

@@ -43,6 +43,7 @@ TEST(ExportStream, FramesAreSplitWhereTheyBegin) {
   } rows[] = {
       {"MPG4", intra + frame + frame + intra + frame, "21 9 9 |21 9 ."},
       {"MPG4", intra + big + frame + big + intra, "700021 700009 |21 ."},
+      {"MPG4", std::string(262140, 'x') + intra + frame, "|21 9 ."},    // an intra frame across two reads
       {"MPG4", frame + "junk" + intra + frame, "|21 9 ."},              // begins in the middle
       {"MPG4", intra + frame + frame + zeros + intra, "21 9 -1|21 ."},  // a block of the disk is missing
       {"MPG4", intra + frame + zeros + frame + intra, "21 -2|21 ."},    // the frame behind needs it

@@ -59,21 +59,24 @@ TEST(ExportTimes, OnlyWhatIsNoJitterMovesAFrame) {
     const char *what;
     Kind kind;
     Milliseconds time;  // of the third frame, expected at 67 ms
-    std::int64_t period;
-  } rows[] = {{"a frame that is handed over late", Kind::intra, 200, 2},
-              {"the clock set back", Kind::intra, -3600000, 2},
-              {"frames lost without an event", Kind::intra, 1000, 30},
-              {"a short gap", Kind::gap, 134, 4},
-              {"half a period is the nearest one", Kind::gap, 80, 2},
-              {"frames lost by the buffer", Kind::buffer, 167, 5},
-              {"an hour without rounding errors", Kind::gap, 3600000, 107892}};
+    std::int64_t period, hole;
+  } rows[] = {{"a frame that is handed over late", Kind::intra, 200, 2, 0},
+              {"the clock set back", Kind::intra, -3600000, 2, 0},
+              {"the clock drifts", Kind::intra, 300, 9, 0},
+              {"frames lost without an event", Kind::intra, 1000, 30, 28},
+              {"a short gap", Kind::gap, 134, 4, 2},
+              {"half a period is the nearest one", Kind::gap, 80, 2, 0},
+              {"frames lost by the buffer", Kind::buffer, 167, 5, 3},
+              {"an hour without rounding errors", Kind::gap, 3600000, 107892, 107890}};
   for (const auto &row : rows) {
     const std::vector<IndexEntry> index = {entry(Kind::intra, 5000, 0), entry(row.kind, 5000 + row.time, 20)};
     Timeline timeline({30000, 1001});
     timeline.begin_file(index, 5000);
     EXPECT_EQ(timeline.place(0).period, 0);
     EXPECT_EQ(timeline.place(10).period, 1);
-    EXPECT_EQ(timeline.place(20).period, row.period) << row.what;
+    const Timeline::Place third = timeline.place(20);
+    EXPECT_EQ(third.period, row.period) << row.what;
+    EXPECT_EQ(third.hole, row.hole) << row.what;
     EXPECT_EQ(timeline.place(30).period, row.period + 1) << row.what;
     EXPECT_EQ(timeline.time_of(0), 5000);
   }
