@@ -28,7 +28,7 @@ Milliseconds start_of(const Recording &audio, const std::vector<Recording> &vide
   return audio.hour->from;
 }
 
-/// Adds the runs that an index tells. Like pictures, they never go back in time, even if the clock did.
+/// Adds the runs that an index tells.
 void add_runs(const Recording &audio, std::size_t file, std::vector<AudioRun> &runs) {
   using Kind = recording::IndexEntry::Kind;
   AudioRun run{file};
@@ -46,7 +46,7 @@ void add_runs(const Recording &audio, std::size_t file, std::vector<AudioRun> &r
     const Milliseconds late = start - run.start - (block - run.block) * kBlockLength;
     if (begun && !gap && late <= kJitter) continue;
     if (begun) end_run(block);
-    run = {file, block, 0, runs.empty() ? start : std::max(start, runs.back().end())};
+    run = {file, block, 0, start};
     begun = true;
     gap = false;
   }

@@ -55,7 +55,7 @@ TEST_F(ExportTree, AClipBeginsWithTheIntraFrameBeforeItsRange) {
   EXPECT_THAT(lines_, HasSubstr("is damaged: 4 frames skipped\n"));
   EXPECT_THAT(lines_, Not(HasSubstr("no pictures")));
   record("20261125-15", {{"15:00:00", 7}, {"15:00:02", 10}}, 5);  // a gap within a group
-  EXPECT_EQ(clip("15:00", "15:00:02.200"), "30-36@0 37-41@2000 !");
+  EXPECT_EQ(clip("15:00:00.200", "15:00:02.200"), "35-36@0 37-41@1800 !");
   EXPECT_THAT(lines_,
               HasSubstr("no pictures from 2026-11-25 15:00:00 to 2026-11-25 15:00:02, for 1.72 seconds"));
 }
