@@ -78,7 +78,7 @@ constexpr CheckRow kRows[] = {
     {"pause.mpeg4", "No frame is lost when the host does not read for 0.2 seconds.", kPaused,
      [](Bench &bench) {
        const DriverCapture &capture = bench.after_pause();
-       const Result gaps = no_lost_frame(capture);
+       Result gaps = no_lost_frame(capture);
        if (gaps.outcome != Outcome::held) return gaps;
        return complete(capture, capture.mpeg4, capture.channels, kFrames, kOnTheWay);
      }},
