@@ -124,11 +124,12 @@ TEST_F(Playback, PlayersHandTheFileOver) {
     std::string output;
     int status;
   } rows[] = {
-      {VIDEOPLAYER " \"it's.rec\"", " -f m4v" + video + "7.5 -i file:it's.rec ", 0},
+      {VIDEOPLAYER " \"it's.rec\"", " -vf setdar=4/3,setpts=PTS*4 -f m4v" + video + "7.5 -i file:it's.rec ",
+       0},
       {VIDEOPLAYER " pal.rec",
        "Channel 12 - pal.rec -vf setdar=4/3 -f mjpeg" + video + "16.67 -i file:pal.rec ", 0},
       {VIDEOPLAYER " whole.rec", video + "20 -i file:whole.rec ", 0},
-      {VIDEOPLAYER " fields.rec", video + "60 -i file:fields.rec ", 0},
+      {VIDEOPLAYER " fields.rec", "setdar=4/3,setpts=PTS*0.5 -f m4v" + video + "60 -i file:fields.rec ", 0},
       {AUDIOPLAYER " CH02/a.aud",
        "-window_title Audio 2 - a.aud -f g726 -code_size 3 -sample_rate 8000 -i file:CH02/a.aud ", 0},
       {AUDIOPLAYER " a.aud", "-window_title a.aud -f g726 -code_size 3 -sample_rate 8000 -i file:a.aud ", 0},
