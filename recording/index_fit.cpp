@@ -14,8 +14,9 @@ namespace {
 
 using Kind = IndexEntry::Kind;
 
-/// The most bytes of audio, ten seconds, that a power cut leaves behind the last line of an index.
-constexpr std::int64_t kMostBehind = 30000;
+/// The most bytes of audio, a minute, that a power cut leaves behind the last line of an index: the recorder
+/// does not sync indexes, and the system writes them within half a minute.
+constexpr std::int64_t kMostBehind = 180000;
 
 struct Recorded {
   int file;

@@ -83,7 +83,7 @@ TEST_P(IndexFit, IsBelievedAsFarAsTheRecordingAgrees) {
 
 INSTANTIATE_TEST_SUITE_P(Codecs, IndexFit, testing::Values(VIDEO_CODEC_ZV_MPEG4, VIDEO_CODEC_ZV_MJPEG));
 
-// Ten seconds of audio are 30000 bytes.
+// A minute of audio is 180000 bytes.
 TEST_P(IndexFit, OfAudioEndsWhereTheFileEnds) {
   std::vector<IndexEntry> index(3);
   index[0].kind = Kind::start;
@@ -92,8 +92,8 @@ TEST_P(IndexFit, OfAudioEndsWhereTheFileEnds) {
     std::ofstream(audio_) << std::string(size, 'x');
     return believed(audio_, index);
   };
-  EXPECT_EQ(of_size(48000 + 29952), 3);  // killed
-  EXPECT_EQ(of_size(48000 + 30048), 0);
+  EXPECT_EQ(of_size(48000 + 180000), 3);  // killed
+  EXPECT_EQ(of_size(48000 + 180048), 0);
   EXPECT_EQ(of_size(47952), 0);
   index[2].kind = Kind::stop;
   EXPECT_EQ(of_size(48000), 3);
