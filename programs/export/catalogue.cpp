@@ -8,6 +8,9 @@
 namespace clips {
 namespace {
 
+/// The recorder begins a new hour with an intra frame: at one frame a second up to 300 frames late.
+constexpr Milliseconds kLongestGroup = 302000;
+
 namespace fs = std::filesystem;
 using recording::IndexEntry;
 using Kind = IndexEntry::Kind;
@@ -39,8 +42,16 @@ void read_index_of(Recording &recording) {
   recording.index = std::move(index);
 }
 
-bool may_overlap(const Recording &recording, const Stretch &stretch) {
-  return recording.hour && stretch.overlaps({recording.hour->from, recording.hour->to + kLateChange});
+void reduce_index_of(Recording &recording) {
+  if (recording.index.empty()) return;
+  recording.contents = contents_of(recording.index);
+  const auto last =
+      std::ranges::find(recording.index.rbegin(), recording.index.rend(), Kind::intra, &IndexEntry::kind);
+  recording.index = std::vector<IndexEntry>{*last};
+}
+
+bool may_overlap(const Recording &recording, const Stretch &stretch, Milliseconds late) {
+  return recording.hour && stretch.overlaps({recording.hour->from, recording.hour->to + late});
 }
 
 std::vector<fs::path> entries_of(const fs::path &folder) {
@@ -60,9 +71,10 @@ Recording recording_at(const std::string &path) {
 }
 
 std::vector<Recording> find_recordings(const std::string &root, recording::Kind kind, unsigned number,
-                                       const Stretch &stretch) {
+                                       const Stretch &stretch, Indexes indexes) {
   const fs::path folder = recording::kind_folder(root, kind);
-  if (!fs::is_directory(folder)) throw std::runtime_error(folder.string() + " is not a folder");
+  if (kind == recording::Kind::video && !fs::is_directory(folder))
+    throw std::runtime_error(folder.string() + " is not a folder");
   std::vector<Recording> found;
   for (const fs::path &day : entries_of(folder)) {
     for (const fs::path &channel : entries_of(day)) {
@@ -71,9 +83,11 @@ std::vector<Recording> find_recordings(const std::string &root, recording::Kind 
       for (const fs::path &file : entries_of(channel)) {
         if (file.extension() != recording::extension_of(kind)) continue;
         Recording recording = named(file);
-        if (!may_overlap(recording, stretch)) continue;
+        if (!may_overlap(recording, stretch, kLongestGroup)) continue;
         read_index_of(recording);
-        if (may_overlap(recording, stretch)) found.push_back(std::move(recording));
+        if (!may_overlap(recording, stretch, recording.index.empty() ? kLateChange : kLongestGroup)) continue;
+        if (indexes == Indexes::reduced) reduce_index_of(recording);
+        found.push_back(std::move(recording));
       }
     }
   }

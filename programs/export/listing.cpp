@@ -3,7 +3,6 @@
 
 #include <algorithm>
 #include <cstdio>
-#include <filesystem>
 #include <iostream>
 #include <nlohmann/json.hpp>
 
@@ -34,21 +33,25 @@ Milliseconds total(const std::vector<Stretch> &stretches) {
 
 std::vector<ListedRecording> list_recordings(const Options &options, Report &report) {
   using recording::Kind;
-  const auto video = find_recordings(options.root, Kind::video, options.channel, options.range);
+  const auto video =
+      find_recordings(options.root, Kind::video, options.channel, options.range, Indexes::reduced);
   std::vector<ListedRecording> rows;
   rows.reserve(video.size());
   for (const Recording &recording : video) rows.push_back({recording, true, {*recording.hour, {}, {}}});
-  if (options.channel == 0 && std::filesystem::is_directory(options.root + "/Audio")) {
-    const auto audio = find_recordings(options.root, Kind::audio, 0, options.range);
+  if (options.channel == 0) {
+    const auto audio = find_recordings(options.root, Kind::audio, 0, options.range, Indexes::reduced);
     const auto runs = audio_runs(audio, video);
     for (std::size_t file = 0; file < audio.size(); ++file) {
       const auto run = std::ranges::find(runs, file, &AudioRun::file);
-      if (run != runs.end()) rows.push_back({audio[file], false, {{run->start, run->end()}, {}, {}}});
+      if (!audio[file].index.empty())
+        rows.push_back({audio[file], false, {}});
+      else if (run != runs.end())
+        rows.push_back({audio[file], false, {{run->start, run->end()}, {}, {}}});
     }
   }
   for (ListedRecording &row : rows) {
     note_doubt(row.recording, report);
-    if (!row.recording.index.empty()) row.contents = contents_of(row.recording.index);
+    if (!row.recording.index.empty()) row.contents = row.recording.contents;
   }
   std::erase_if(rows, [&](const auto &row) { return !row.contents.recorded.overlaps(options.range); });
   return rows;
