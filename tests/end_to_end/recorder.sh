@@ -208,6 +208,24 @@ case $1 in
     expect "a clip of $(of_clip format=duration) s of $((ended - begun)) ms" \
       awk -v clip="$(of_clip format=duration)" -v ms=$((ended - begun)) 'BEGIN { exit !(clip > ms / 1100 && clip < ms / 900) }'
     ;;
+  # Cameras 1 and 2 move, 3 and 4 stand still. Catches: motion that the index does not tell, or tells where there is
+  # none; a clip of what is still.
+  motion)
+    ZARVO_VIRTUAL_CARD='still=3,4' start --channels 1-4 --audio none
+    goes_on
+    stop
+    for channel in 1 2 3 4; do
+      status=0
+      "$ZARVO_EXPORT" --root "$ROOT" --channel $channel --from '2026-11-25 14:00' --to 15:00 --motion \
+        "$FOLDER/$channel.mp4" 2>"$ERR" || status=$?
+      expect_equal "status for camera $channel ($(cat "$ERR"))" $((channel > 2)) "$status"
+      [ "$channel" -le 2 ] || expect "camera $channel has motion: $(cat "$ERR")" told 'there is no motion'
+    done
+    for channel in 1 2; do
+      clip_frames=$(ffprobe -v error -count_packets -show_entries stream=nb_read_packets -of default=nw=1:nk=1 "$FOLDER/$channel.mp4")
+      expect "$clip_frames frames in the clip of camera $channel" test "$clip_frames" -ge 30
+    done
+    ;;
   # What systemd sees; a second recorder; streams that stop and go on.
   service)
     perl -MIO::Socket::UNIX -e '
