@@ -20,6 +20,7 @@ struct AudioRun {
   std::size_t file;                    ///< its number in the list of recordings
   std::int64_t block = 0, blocks = 0;  ///< the number of the first, and how many
   Milliseconds start = 0;              ///< when the first one begins
+  bool set_back = false;               ///< by a clock that was set back in front of it
   Milliseconds end() const;
 };
 /// Returns the runs of audio files, which are in order. The index of a file tells when they were recorded.
@@ -37,14 +38,19 @@ class AudioReader {
   AudioReader(const std::vector<Recording> &audio, const std::vector<Recording> &video, Milliseconds from,
               Report &report);
 
-  /// Goes on at the first block that begins at a time or behind it.
+  /// Goes on at the first block that begins at a time or behind it, since the clock was last set back.
   void seek(Milliseconds time);
-  /// Reads the next block if it begins before `until`.
+  /// The clock was set back once more: seek() looks behind the next run that it shows in.
+  void set_back();
+  /// Reads the next block if it begins before `until`, up to where the clock was set back. Reports runs that
+  /// cannot be read, and leaves them out.
   bool next(AudioBlock &block, Milliseconds until);
 
  private:
   std::vector<std::string> paths_;
   std::vector<AudioRun> runs_;
+  Report &report_;
+  std::size_t pass_ = 0;    ///< the first run since the clock was last set back
   std::size_t run_ = 0;     ///< the run of the next block
   std::int64_t block_ = 0;  ///< its number in the run
   std::ifstream stream_;    ///< the file of the run, open behind its first block that was read

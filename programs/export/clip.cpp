@@ -18,11 +18,31 @@ constexpr Milliseconds kNear = 1000;
 /// The offset of the first frame of a recording.
 constexpr std::int64_t kFirstFrame = sizeof(RECORD_FILE_HEADER);
 
-/// Returns the offset of the last intra frame at or before a time; 0 without an index.
+/// A step back of the clock; less is jitter.
+constexpr Milliseconds kSetBack = 2000;
+/// The longest time that a frame is shown in mp4. It counts in 32 bits, of up to 60000 ticks a second.
+constexpr Milliseconds kLongestInMp4 = kHour;
+
+/// Returns the offset of the last intra frame at or before a time, but of none behind a place where the clock
+/// was set back; 0 without an index.
 std::int64_t intra_before(const Recording &recording, Milliseconds time) {
   std::int64_t offset = 0;
+  Milliseconds before = Stretch().from;
+  for (const recording::IndexEntry &entry : recording.index) {
+    if (entry.kind != recording::IndexEntry::Kind::intra) continue;
+    if (entry.time > time || entry.time + kSetBack < before) break;
+    offset = entry.offset;
+    before = entry.time;
+  }
+  return offset;
+}
+
+/// Returns the offset of the last intra frame in front of a time, wherever the clock was set back; -1 without
+/// one and without an index.
+std::int64_t last_before(const Recording &recording, Milliseconds time) {
+  std::int64_t offset = -1;
   for (const recording::IndexEntry &entry : recording.index)
-    if (entry.kind == recording::IndexEntry::Kind::intra && entry.time <= time) offset = entry.offset;
+    if (entry.kind == recording::IndexEntry::Kind::intra && entry.time < time) offset = entry.offset;
   return offset;
 }
 
@@ -39,10 +59,16 @@ void Clip::add(const Recording &recording) try {
   StreamReader reader(recording.path);
   if (!accept(recording, reader)) return;
   timeline_->begin_file(recording.index, recording.start);
+  // Files that the user names follow each other, whatever is between them.
+  if (!options_.files.empty()) writing_ = false;
+  if (!recording.index.empty()) choose_stretch(*recording.start);
+  stray_.clear();
+  const std::int64_t last = last_before(recording, stretches_.back().to);
   Group group;
   bool seek = true;
-  while (!stopping && stretch_ < stretches_.size()) {
+  while (!stopping && (stretch_ < stretches_.size() || group.end() <= last)) {
     // Between two stretches, and in front of the first, the index tells where to go on.
+    seek = seek && stretch_ < stretches_.size();
     const std::int64_t target = seek ? intra_before(recording, stretches_[stretch_].from) : 0;
     if (target > group.end()) reader.seek(target);
     if (!reader.next(group)) break;
@@ -50,6 +76,7 @@ void Clip::add(const Recording &recording) try {
     add_group(recording, group);
     seek = stretch_ != before;
   }
+  report_stray(recording);
 } catch (const RecordingError &error) {
   report_.skipped(error.what());
 }
@@ -62,12 +89,31 @@ bool Clip::accept(const Recording &recording, const StreamReader &reader) {
                     ": skipped, its size, codec or rate is not that of the recordings before");
     return false;
   }
+  const std::string label = recording::label_of(reader.header());
+  if (format_ && label != label_)
+    report_.note(recording.path + " is of " + label + ", the first recording of " + label_ +
+                 ": joined all the same");
   if (format_) return true;
   format_ = format;
-  label_ = recording::label_of(reader.header());
+  label_ = label;
   timeline_.emplace(format.rate);
   checker_.emplace(format.codec);
   return true;
+}
+
+/// Chooses the first stretch that ends behind a time. The clock may have been set back.
+void Clip::choose_stretch(Milliseconds time) {
+  const auto chosen =
+      std::ranges::partition_point(stretches_, [time](const Stretch &stretch) { return stretch.to <= time; });
+  const auto number = static_cast<std::size_t>(chosen - stretches_.begin());
+  if (number != stretch_) writing_ = false;
+  stretch_ = number;
+}
+
+/// Reports bytes at the end of a recording that belong to no frame, if the recording is asked for.
+void Clip::report_stray(const Recording &recording) {
+  if (stray_.empty() || stretch_ == stretches_.size()) return;
+  if (!recording.hour || recording.hour->overlaps(stretches_[stretch_])) report_.skipped(stray_);
 }
 
 void Clip::add_group(const Recording &recording, Group &group) {
@@ -78,13 +124,14 @@ void Clip::add_group(const Recording &recording, Group &group) {
   }
   const std::string stray = std::exchange(stray_, "");
   place_frames(group);
-  const Milliseconds begin = timeline_->time_of(places_.front().period);
-  const Milliseconds end = timeline_->time_of(places_.back().period + 1);
-  while (stretch_ < stretches_.size() && stretches_[stretch_].to <= begin) {
-    ++stretch_;
-    writing_ = false;
+  report_clock(group);
+  anew_ = anew_ || places_.front().back > kSetBack;
+  const Milliseconds end = places_.back().end;
+  choose_stretch(places_.front().time);
+  if (stretch_ == stretches_.size() || end <= stretches_[stretch_].from) {
+    anew_ = true;
+    return;
   }
-  if (stretch_ == stretches_.size() || end <= stretches_[stretch_].from) return;
   // Stretches that meet in this group become one.
   Stretch &stretch = stretches_[stretch_];
   const auto later = stretches_.begin() + static_cast<std::ptrdiff_t>(stretch_) + 1;
@@ -95,9 +142,8 @@ void Clip::add_group(const Recording &recording, Group &group) {
   if (!stray.empty()) report_.skipped(stray);
   check_frames(recording, group);
   if (group.sizes.empty()) return;
-  // Files that the user names follow each other, whatever is between them.
-  const bool joined = writing_ && (options_.files.empty() || group.offset > kFirstFrame);
-  if (!writing_) begin_stretch(recording, group);
+  const bool joined = writing_;
+  if (!writing_ || anew_) begin_stretch(recording, group);
   write_frames(group, stretch.to, joined);
   show_progress();
 }
@@ -107,10 +153,15 @@ void Clip::write_frames(const Group &group, Milliseconds until, bool joined) {
   std::size_t at = 0;
   for (std::size_t frame = 0; frame < group.sizes.size(); at += group.sizes[frame++]) {
     const Timeline::Place &place = places_[frame];
-    const Milliseconds time = timeline_->time_of(place.period);
-    if (time >= until) break;
-    if (place.hole > 0 && (joined || frame > 0)) report_hole(place);
-    write_audio(time);
+    if (place.time >= until) break;
+    if (joined || frame > 0) {
+      if (place.hole > 0) report_hole(place);
+      shorten_hole(place);
+      audio_shift_ -= place.back;
+      if (audio_ != nullptr && place.back > kSetBack) audio_->seek(place.time);
+    }
+    write_audio(place.time);
+    end_ = place.end;
     next_ = place.period - shift_;
     muxer_->write_video(group.data.subspan(at, group.sizes[frame]), next_++, frame == 0);
   }
@@ -120,8 +171,31 @@ void Clip::report_hole(const Timeline::Place &place) {
   char seconds[32];
   std::snprintf(seconds, sizeof seconds, "%.2f",
                 static_cast<double>(timeline_->length_of(place.hole)) / 1000);
-  report_.skipped("no pictures from " + local_text(timeline_->time_of(place.period - place.hole)) + " to " +
-                  local_text(timeline_->time_of(place.period)) + ", for " + seconds + " seconds");
+  report_.skipped("no pictures from " + local_text(place.time - timeline_->length_of(place.hole)) + " to " +
+                  local_text(place.time) + ", for " + seconds + " seconds");
+}
+
+/// In mp4, leaves out what is longer than an hour of the time in front of a frame.
+void Clip::shorten_hole(const Timeline::Place &place) {
+  const std::int64_t longest = timeline_->periods_in(kLongestInMp4);
+  const std::int64_t excess = place.period - shift_ - next_ - longest;
+  if (excess <= 0 || !options_.output.ends_with(".mp4")) return;
+  report_.skipped("the hole before " + local_text(place.time) +
+                  " lasts an hour in the clip: mp4 holds no longer one, mkv does");
+  write_audio(end_ + timeline_->length_of(longest));
+  shift_ += excess;
+  audio_shift_ += timeline_->length_of(excess);
+  if (audio_ != nullptr) audio_->seek(place.time);
+}
+
+/// Says where the clock was set back. Files that the user names may be in any order.
+void Clip::report_clock(const Group &group) {
+  if (!options_.files.empty() && group.offset == kFirstFrame) return;
+  for (const Timeline::Place &place : places_) {
+    if (place.back <= kSetBack) continue;
+    report_.note("the clock was set back to " + local_text(place.time) + ", by " + length_text(place.back));
+    if (audio_ != nullptr) audio_->set_back();
+  }
 }
 
 void Clip::place_frames(const Group &group) {
@@ -158,12 +232,14 @@ void Clip::check_frames(const Recording &recording, Group &group) {
 
 /// The stretch begins with the intra frame of a group; it follows the stretch before without a gap.
 void Clip::begin_stretch(const Recording &recording, const Group &group) {
-  const Milliseconds begin = timeline_->time_of(places_.front().period);
-  if (audio_ != nullptr && muxer_ != nullptr) write_audio(timeline_->time_of(next_ + shift_));
+  const Milliseconds begin = places_.front().time;
+  if (audio_ != nullptr && muxer_ != nullptr) write_audio(end_);
   shift_ = places_.front().period - next_;
   audio_shift_ = begin - timeline_->length_of(next_);
   if (audio_ != nullptr) audio_->seek(begin);
+  places_.front().back = 0;
   writing_ = true;
+  anew_ = false;
   if (muxer_ != nullptr) return;
   begin_ = begin;
   if (format_->codec == VIDEO_CODEC_ZV_MPEG4) {
@@ -188,14 +264,13 @@ void Clip::write_audio(Milliseconds until) {
 void Clip::finish() {
   if (stopping) throw std::runtime_error("stopped; no clip is written");
   if (muxer_ == nullptr) throw std::runtime_error("no picture is recorded there; no clip is written");
-  write_audio(timeline_->time_of(next_ + shift_));
+  write_audio(end_);
   muxer_->finish();
   output_.commit();
-  const Milliseconds end = timeline_->time_of(next_ + shift_);
   if (!options_.motion && begin_ > options_.range.from + kNear && options_.range.from > Stretch().from)
     report_.note("nothing is recorded before " + local_text(begin_));
-  if (!options_.motion && end < options_.range.to - kNear && options_.range.to < Stretch().to)
-    report_.note("nothing is recorded after " + local_text(end));
+  if (!options_.motion && end_ < options_.range.to - kNear && options_.range.to < Stretch().to)
+    report_.note("nothing is recorded after " + local_text(end_));
   if (shown_ >= 0) std::fprintf(stderr, "\r%s  done\n", length_text(timeline_->length_of(next_)).c_str());
 }
 

@@ -35,9 +35,13 @@ class Clip {
  private:
   bool accept(const Recording &recording, const StreamReader &reader);
   void add_group(const Recording &recording, Group &group);
+  void report_stray(const Recording &recording);
   void place_frames(const Group &group);
   void write_frames(const Group &group, Milliseconds until, bool joined);
+  void choose_stretch(Milliseconds time);
   void report_hole(const Timeline::Place &place);
+  void shorten_hole(const Timeline::Place &place);
+  void report_clock(const Group &group);
   void check_frames(const Recording &recording, Group &group);
   void begin_stretch(const Recording &recording, const Group &group);
   void write_audio(Milliseconds until);
@@ -60,9 +64,11 @@ class Clip {
   std::vector<Timeline::Place> places_;  ///< of the frames of the current group
   std::string stray_;                    ///< says which bytes in front of the current group belong to none
   bool writing_ = false;                 ///< a part of the current stretch is written
+  bool anew_ = false;                    ///< the next group does not follow it, as the clock was set back
   std::int64_t shift_ = 0;               ///< period of the recordings that is period 0 of the clip
   std::int64_t next_ = 0;                ///< where the clip ends, in its periods
   Milliseconds begin_ = 0;               ///< when the first frame of the clip was recorded
+  Milliseconds end_ = 0;                 ///< when the last one ended
   Milliseconds audio_shift_ = 0;         ///< the same shift in time
   Milliseconds shown_ = -1;              ///< the progress on the terminal
 };

@@ -31,7 +31,7 @@ void report_missing_hours(const std::vector<Recording> &found, const Stretch &ra
 
 /// Returns the stretches with motion, and what is around them. Takes away the recordings that do not tell.
 std::vector<Stretch> motion_in(std::vector<Recording> &recordings, const Stretch &range, Report &report) {
-  std::vector<Stretch> stretches;
+  std::vector<Stretch> found, stretches;
   std::string none = "nothing is recorded there";
   for (const Recording &recording : recordings) {
     if (recording.index.empty()) {
@@ -44,9 +44,12 @@ std::vector<Stretch> motion_in(std::vector<Recording> &recordings, const Stretch
     for (Stretch stretch : contents.motion) {
       stretch.from = std::max(stretch.from - kAroundMotion, range.from);
       stretch.to = std::min(stretch.to + kAroundMotion, range.to);
-      if (stretch.from < stretch.to) append(stretches, stretch);
+      if (stretch.from < stretch.to) found.push_back(stretch);
     }
   }
+  // Not in order if the clock was set back.
+  std::ranges::sort(found, {}, &Stretch::from);
+  for (const Stretch &stretch : found) append(stretches, stretch);
   if (stretches.empty()) throw std::runtime_error(none + "; no clip is written");
   std::erase_if(recordings, [](const Recording &recording) { return recording.index.empty(); });
   return stretches;

@@ -23,13 +23,24 @@ Milliseconds Timeline::length_of(std::int64_t periods) const {
   return std::llround(static_cast<double>(periods) * 1000 * rate_.denominator / rate_.numerator);
 }
 
-/// Moves the next period to a time if it is further behind it than the tolerance. Never moves it back: the
-/// clock may have been set, and frames must stay in order.
-void Timeline::meet(Milliseconds time, Milliseconds tolerance) {
+std::int64_t Timeline::periods_in(Milliseconds length) const {
+  return std::llround(static_cast<double>(length) * rate_.numerator / rate_.denominator / 1000);
+}
+
+Milliseconds Timeline::jitter() const {
+  return std::max(kJitter, length_of(2));
+}
+
+/// Moves the next period to a time that is behind it. Never moves it back, because frames must stay in order:
+/// if the clock was set back, the periods have earlier times from here on. Returns how much earlier.
+Milliseconds Timeline::meet(Milliseconds time, bool gap) {
   if (!epoch_) epoch_ = time - length_of(next_);
   const Milliseconds late = time - time_of(next_);
-  if (late > tolerance)
-    next_ += std::llround(static_cast<double>(late) * rate_.numerator / rate_.denominator / 1000);
+  if (late > (gap ? length_of(1) / 2 : jitter())) next_ += periods_in(late);
+  // Without an index the time is an estimate.
+  if (late >= -jitter() || index_->empty()) return 0;
+  *epoch_ += late;
+  return -late;
 }
 
 Timeline::Place Timeline::place(std::int64_t offset) {
@@ -43,12 +54,11 @@ Timeline::Place Timeline::place(std::int64_t offset) {
     if (gap || (entry.kind == Kind::intra && entry.offset == offset)) time = entry.time;
   }
   const std::int64_t expected = next_;
-  const Milliseconds jitter = std::max(kJitter, length_of(2));
-  if (time) meet(*time, gap ? length_of(1) / 2 : jitter);
+  const Milliseconds back = time ? meet(*time, gap) : 0;
   const std::int64_t period = next_++;
   // A small step without an event is the clock, which drifts against that of the card.
-  const bool missing = gap || length_of(period - expected) > 2 * jitter;
-  return {period, missing ? period - expected : 0};
+  const bool missing = gap || length_of(period - expected) > 2 * jitter();
+  return {period, missing ? period - expected : 0, time_of(period), time_of(next_), back};
 }
 
 }  // namespace clips

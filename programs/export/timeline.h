@@ -26,18 +26,23 @@ class Timeline {
   struct Place {
     std::int64_t period;  ///< the number of the period that shows the frame
     std::int64_t hole;    ///< how many periods in front of it have no frame, since frames are missing
+    Milliseconds time;    ///< when the period began, by the clock of the recording
+    Milliseconds end;     ///< and ended
+    Milliseconds back;    ///< how far the clock was set back in front of it
   };
   /// Places the next frame, which is at an offset of the file.
   Place place(std::int64_t offset);
   /// Leaves out the periods of frames that are lost.
   void skip(std::size_t frames) { next_ += static_cast<std::int64_t>(frames); }
 
-  /// Returns when a period begins.
+  /// Returns when a period begins, by the clock of the last frame.
   Milliseconds time_of(std::int64_t period) const { return epoch_.value_or(0) + length_of(period); }
   Milliseconds length_of(std::int64_t periods) const;
+  std::int64_t periods_in(Milliseconds length) const;
 
  private:
-  void meet(Milliseconds time, Milliseconds tolerance);
+  Milliseconds meet(Milliseconds time, bool gap);
+  Milliseconds jitter() const;
 
   recording::FrameRate rate_;
   const std::vector<recording::IndexEntry> *index_ = nullptr;

@@ -2,6 +2,7 @@
 #include <array>
 
 #include "export_tree.h"
+#include "programs/export/audio_reader.h"
 
 namespace clips {
 namespace {
@@ -35,9 +36,46 @@ TEST_F(ExportTree, AClipHoldsEachPictureOnceAtItsTime) {
   // Files that the user names follow each other; a gap in one of them is still one.
   Options options;
   options.files = {video("20261125-13.rec"), video("20261125-14.1.rec")};
-  EXPECT_EQ(made(options), "0-49@0 100-124@12480");
+  EXPECT_EQ(made(options), "0-49@0 100-124@2000");
+  std::fstream(options.files[1], std::ios::in | std::ios::out).seekp(16).write("Channel 4", 9);
+  options.files = {options.files[1], options.files[0]};
+  EXPECT_EQ(made(options), "100-124@0 0-49@1000");
+  EXPECT_THAT(lines_,
+              HasSubstr("13.rec is of Channel 3, the first recording of Channel 4: joined all the same\n"));
+  EXPECT_THAT(lines_, Not(HasSubstr("clock")));
   options.files = {video("20261125-14.rec")};
   EXPECT_EQ(made(options), "50-74@0 75-99@3000 !");
+}
+
+// Catches: pictures of mp4 that all come at once behind a hole of a day; audio that stays where they were.
+TEST_F(ExportTree, AnMp4ShowsNoPictureForMoreThanAnHour) {
+  record("20261125-14", {{"14:00:00", 25}});
+  record("20261125-23", {{"23:00:00", 25}, {"23:30:01", 25}});
+  clip_ = root_ / "clip.mp4";
+  EXPECT_EQ(clip("14:00", "23:59"), "0-24@0 25-49@3601000 50-74@5402000 !");
+  EXPECT_THAT(lines_, HasSubstr("the hole before 2026-11-25 23:00:00 lasts an hour in the clip"));
+  clip_ = root_ / "clip.mkv";
+  record_audio("20261125-23", {{"23:00:00.016", 62}});
+  EXPECT_EQ(clip("14:00", "23:59", false, 2), "0-24@0 25-49@32400000 50-74@34201000 !");
+  EXPECT_EQ(audio_, "0-61@32400000");
+}
+
+// The clock is set back by 30 minutes at 14:40:01, and by ten in a file.
+// Catches: pictures, motion and sound of other minutes; a clip that ends where the clock was set back.
+TEST_F(ExportTree, PicturesHaveTheTimesOfAClockThatWasSetBack) {
+  record("20261125-14", {{"14:10:00", 25}, {"14:40:00", 25}});
+  record("20261125-14.1", {{"14:10:01", 25, 1}, {"14:10:02", 25}, {"14:59:59", 25}});
+  record("20261125-15", {{"15:00:00", 25}, {"15:20:00", 25, 1}, {"15:10:00", 25}});
+  record_audio("20261125-14", {{"14:40:00.016", 62}});
+  record_audio("20261125-14.1", {{"14:10:01.016", 62}, {"14:59:59.016", 62}});
+  EXPECT_EQ(clip("14:10", "14:11"), "0-24@0 50-99@1000");
+  EXPECT_THAT(lines_, HasSubstr("the clock was set back to 2026-11-25 14:10:01, by 0:29:59\n"));
+  EXPECT_EQ(clip("14:59:59", "15:10:01", false, 2), "100-149@0 175-199@2000 !");
+  EXPECT_EQ(audio_, "124-185@0");
+  EXPECT_EQ(clip("14:39:59", "15:00", false, 2), "25-49@0 100-124@1000 !");
+  EXPECT_EQ(audio_, "0-61@0 124-185@1000");
+  EXPECT_EQ(clip("15:20", "15:30"), "150-174@0");
+  EXPECT_EQ(clip("14:00", "16:00", true), "0-24@0 50-99@1000 150-174@3000");
 }
 
 // MPEG-4 in groups of five pictures; the last one of a file is decoded, and these are none.
@@ -58,6 +96,8 @@ TEST_F(ExportTree, AClipBeginsWithTheIntraFrameBeforeItsRange) {
   EXPECT_EQ(clip("15:00:00.200", "15:00:02.200"), "35-36@0 37-41@1800 !");
   EXPECT_THAT(lines_,
               HasSubstr("no pictures from 2026-11-25 15:00:00 to 2026-11-25 15:00:02, for 1.72 seconds"));
+  record("20261125-16", {{"16:59:59", 5}, {"17:04:59", 10}});  // as far as 300 frames of one a second
+  EXPECT_EQ(clip("17:04:59", "17:04:59.200"), "52-56@0 !");
 }
 
 // Catches: pictures of two fields at half their speed; sizes that are not shown as 4:3.
@@ -118,6 +158,14 @@ TEST_F(ExportTree, AnIndexThatDoesNotFitIsNotUsed) {
   fs::resize_file(video("20261125-15.rec"), fs::file_size(video("20261125-15.rec")) - 10);
   EXPECT_EQ(clip("15:00", "15:00:30"), "300-324@0 325-348@2000 !");
   EXPECT_THAT(lines_, HasSubstr("15.rec: its index does not fit from byte "));
+  // Not one intra frame is left.
+  std::ofstream(video("20261125-16.rec"), std::ios::binary)
+      << std::ifstream(video("20261125-15.rec"), std::ios::binary).rdbuf();
+  std::fstream(video("20261125-16.rec"), std::ios::in | std::ios::out | std::ios::binary)
+      .seekp(32)
+      .write(std::string(9000, 'x').data(), 9000);
+  EXPECT_EQ(clip("15:00:02", "16:30"), "325-348@0 !");
+  EXPECT_THAT(lines_, HasSubstr("16.rec: bytes 32 to 9032 belong to no intra frame: skipped\n"));
 }
 
 // Catches: two hours on top of each other; the second hour in the place of the first; a file of the dialog,
@@ -161,6 +209,24 @@ TEST_F(ExportTree, AudioIsPlacedByTime) {
   fs::remove(audio("20261125-14.idx"));
   clip("14:00", "14:00:04", false, 2);
   EXPECT_EQ(audio_, "0-173@0");
+  // A file that cannot be read, and no folder.
+  record_audio("20261125-14.1", {{"14:10:00.016", 62}});
+  fs::remove(audio("20261125-14.aud"));
+  fs::create_directory(audio("20261125-14.aud"));
+  EXPECT_EQ(clip("14:00", "14:10:04", false, 2), "0-99@0 100-199@600000 !");
+  EXPECT_EQ(audio_, "174-235@600000");
+  EXPECT_THAT(lines_, HasSubstr("14.aud: Is a directory\n"));
+  record_audio("20261125-14.2", {{"14:20:00.016", 62}});
+  Report report;
+  AudioReader reader(find_recordings(root_, recording::Kind::audio, 2, {}), {}, 0, report);
+  fs::resize_file(audio("20261125-14.1.aud"), 480);
+  int blocks = 0;
+  for (AudioBlock block; reader.next(block, Stretch().to);) ++blocks;
+  EXPECT_EQ(blocks, 10 + 62);
+  fs::remove_all(root_ / "Audio");
+  clip_ = root_ / "clip.mp4";
+  EXPECT_EQ(clip("14:10", "14:10:04", false, 2), "100-199@0 !");
+  EXPECT_THAT(lines_, HasSubstr("no recording of audio input 2 from 2026-11-25 14:00:00"));
 }
 
 // Catches: a gap that closes in mp4, and samples that are lost at the end.

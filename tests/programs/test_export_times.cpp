@@ -78,7 +78,8 @@ TEST(ExportTimes, OnlyWhatIsNoJitterMovesAFrame) {
     EXPECT_EQ(third.period, row.period) << row.what;
     EXPECT_EQ(third.hole, row.hole) << row.what;
     EXPECT_EQ(timeline.place(30).period, row.period + 1) << row.what;
-    EXPECT_EQ(timeline.time_of(0), 5000);
+    EXPECT_EQ(third.time, row.time < 0 ? 5000 + row.time : timeline.time_of(row.period)) << row.what;
+    EXPECT_EQ(third.back, row.time < 0 ? 67 - row.time : 0) << row.what;
   }
   EXPECT_EQ(Timeline({30000, 1001}).time_of(107892), 3599996);
 }
