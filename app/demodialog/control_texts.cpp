@@ -16,8 +16,10 @@ struct ControlText {
   const char *counts;
 };
 
-constexpr char kAtNextPreview[] =
-    QT_TRANSLATE_NOOP("DemoDialog", "Takes effect at the next start of the preview.");
+constexpr char kAtNextStart[] =
+    QT_TRANSLATE_NOOP("DemoDialog", "Takes effect for the previews and recordings that start next.");
+constexpr char kForAllStreams[] = QT_TRANSLATE_NOOP(
+    "DemoDialog", "Takes effect for the previews and recordings that start next; Frame Rate starts anew.");
 constexpr char kAtOnce[] = QT_TRANSLATE_NOOP("DemoDialog", "Takes effect at once.");
 constexpr char kAtRecordStart[] =
     QT_TRANSLATE_NOOP("DemoDialog", "Takes effect at the next start of a recording.");
@@ -35,10 +37,10 @@ constexpr char kReadBack[] = QT_TRANSLATE_NOOP("DemoDialog", "Shown when a recor
 
 constexpr ControlText kTexts[] = {
 #define T(text) QT_TRANSLATE_NOOP("DemoDialog", text)
-    {"radioNTSC", T("NTSC"), T("30 pictures a second, 480 lines"), kAtNextPreview},
-    {"radioPAL", T("PAL"), T("25 pictures a second, 576 lines"), kAtNextPreview},
-    {"radio720", T("720"), T("pixels in a line"), kAtNextPreview},
-    {"radio704", T("704"), T("pixels in a line"), kAtNextPreview},
+    {"radioNTSC", T("NTSC"), T("30 pictures a second, 480 lines"), kForAllStreams},
+    {"radioPAL", T("PAL"), T("25 pictures a second, 576 lines"), kForAllStreams},
+    {"radio720", T("720"), T("pixels in a line"), kAtNextStart},
+    {"radio704", T("704"), T("pixels in a line"), kAtNextStart},
     {"btnPreviewStart", T("Start preview"), T("opens the preview window"), kAtOnce},
     {"btnPreviewStop", T("Stop preview"), T("closes the preview window"), kAtOnce},
     {"btnSplit#", T("Split %1"), T("number of pictures in the preview window"), kAtOnce},
@@ -52,7 +54,7 @@ constexpr ControlText kTexts[] = {
     {"btnMotionStatus", T("Motion status"), T("the channel boxes show which channels have motion"), kAtOnce},
     {"ChecksGroup", T("Channels"), T("the set that Channels Setting or Channels Status has chosen"), kAtOnce},
     {"checkCh#", T("Channel %1"), T("the set that Channels Setting or Channels Status has chosen"),
-     T("The preview follows at once; record and audio sets count at the next start of a recording.")},
+     T("The preview follows at once; record and audio sets take effect at the next start of a recording.")},
     {"comboMotion", T("Sensitivity: channel"), kChannels, kForSetAndGet},
     {"edtSensitivity", T("Sensitivity"),
      T("threshold, 0 to 65535; a small number reports more motion, 65535 reports none"), kWithSet},

@@ -48,15 +48,19 @@ for log in zarvo-demo.log zarvo-demo.log.1; do
   expect "$log is too large" test "$(stat -c %s "$work/$log")" -le 400
 done
 
-# With a card: it is used if its nodes may be used; else the group is named.
-touch "$FOLDER/dev/zarvo_enc0" "$FOLDER/dev/zarvo_vin0"
+# With a card: it is used if its nodes may be used; else it is said why not.
+touch "$FOLDER/dev/zarvo_"{enc0,disp0,vin0}
+launch 1 "zarvo_g723_0 is missing" -- "$work"
+touch "$FOLDER/dev/zarvo_g723_0"
 launch 0 'The card of this machine is in use' -- "$work"
 expect "the virtual card is in front of the real one" grep -qx 'preload ' "$FOLDER/output"
 chmod 660 "$FOLDER/dev/zarvo_vin0"
 if [ "$(id -u)" -eq 0 ]; then # nothing is forbidden to root
   AS=(setpriv --reuid 65534 --regid 65534 --clear-groups)
-  chmod 666 "$FOLDER/dev/zarvo_enc0"
-  launch 1 "zarvo_vin0: you are not in the group 'root'" -- "$work"
+  chmod 666 "$FOLDER/dev/zarvo_"{enc0,disp0,g723_0}
+  launch 1 "zarvo_vin0: its group is 'root' and its mode 660" -- "$work"
+  chgrp video "$FOLDER/dev/zarvo_vin0"
+  launch 1 "zarvo_vin0: you are not in the group 'video'" -- "$work"
 fi
 rm "$FOLDER/dev"/*
 

@@ -115,3 +115,14 @@ expect "the dialog is $DIALOG_HEIGHT lines high, too many for a screen of 768" t
 expect "a smaller dialog than the screen requires: $DIALOG_HEIGHT" test "$DIALOG_HEIGHT" -gt 700
 expect "the ground is not light" test "$(convert "$FOLDER/dark.png" -crop 1x1+2+2 -colorspace gray -format '%[fx:mean > 0.8]' info:)" = 1
 end_program
+close_display
+
+# On a dense screen the dialog grows with the scale.
+for scale in 150 200; do
+  export QT_SCALE_FACTOR=$((scale / 100)).$((scale % 100))
+  on_screen 2560x1800
+  picture "$DIALOG" "$FOLDER/scale-$scale.png"
+  expect "the dialog is $DIALOG_HEIGHT lines high at $scale %" test "$DIALOG_HEIGHT" -ge $((780 * scale / 100))
+  end_program
+  close_display
+done

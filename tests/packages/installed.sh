@@ -8,6 +8,7 @@ set -euo pipefail
 . /test/tools/streams.sh
 # shellcheck source=tools/operator.sh
 . /test/tools/operator.sh
+WIDGET_MAP=/test/widget_map
 ON_CARD=(env LD_PRELOAD=libzarvo_virtual_card.so)
 NAMES=(libzarvo-sdk1 libzarvo-sdk-dev zarvo-virtual-card zarvo-tools zarvo-demo)
 
@@ -30,19 +31,28 @@ install_packages() {
 # expect_no_missing_library FILE...: catches a package that lacks a dependency.
 expect_no_missing_library() { ! ldd "$@" | grep 'not found' || die "a library is missing"; }
 
-# The command of the menu entry opens the dialog and ends with it.
-open_dialog() {
+# The command of the menu entry opens the dialog, which records, and ends with it.
+record_with_dialog() {
   local command
-  say "Opening the dialog by the menu entry"
+  say "Recording with the dialog, opened by the menu entry"
   read -ra command <<<"$(sed -n 's/^Exec=//p' /usr/share/applications/zarvo-demo.desktop)"
   open_display
   "${command[@]}" >/tmp/log 2>&1 </dev/null &
   DEMO=$!
+  LOG=/tmp/log
   wait_until 120 dialog_shown || die "no dialog appeared: $(cat /tmp/log)"
+  read_widget_map
+  choose comboQualityMode 1
+  click btnRecordStart
+  wait_line kbps 3
+  click btnRecordStop
   close_program
   close_display
   [ "$STATUS" -eq 0 ] || die "the dialog ended with status $STATUS: $(cat /tmp/log)"
   [ -x /root/Zarvo/Videoplayer ] || die "the launcher has prepared no folder"
+  [ "$(grep -c kbps /root/Zarvo/zarvo-demo.log)" -ge 3 ] || die "the launcher keeps no log"
+  quietly zarvo_export /root/Zarvo/Data/Video/*/CH16/*.rec /root/dialog.mkv
+  quietly ffmpeg -nostdin -v error -xerror -i /root/dialog.mkv -f null -
 }
 
 record() {
@@ -120,7 +130,7 @@ purge() {
 }
 
 install_packages
-open_dialog
+record_with_dialog
 record
 use_tools
 completed=$(complete_option --se)
