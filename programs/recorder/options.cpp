@@ -1,7 +1,9 @@
 // Parses the command line of zarvo_recorder.
 #include "options.h"
 
+#include <algorithm>
 #include <bit>
+#include <cmath>
 
 #include "frame.h"
 #include "programs/common/command_line.h"
@@ -164,8 +166,7 @@ void complete(Options &options, const Later &later) {
   if (!later.rate.empty()) options.rate = parse_name("--rate", later.rate, rate_names(options.standard));
   if (options.two_fields) check_two_fields(options);
   if (options.channels == 0) options.channels = most_channels(options);
-  if (options.gop == 0)
-    options.gop = (options.standard == VIDEO_STANDARD_ZV_NTSC ? 30 : 25) * (options.two_fields ? 2 : 1);
+  if (options.gop == 0) options.gop = static_cast<u32>(std::max(1L, std::lround(stream_rate(options, 0))));
 }
 
 }  // namespace

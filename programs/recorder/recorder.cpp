@@ -1,6 +1,8 @@
 // Configures the card, and starts and ends a recording.
 #include "recorder.h"
 
+#include "programs/common/command_line.h"
+
 namespace recorder {
 namespace {
 
@@ -12,6 +14,13 @@ void on_video(u32 channel, u8 *data, i32 length, i32 flags) {
 
 void on_audio(u32 input, u8 *data, i32 length, i32 flags) {
   active->take(ZV_CHANNELS + input, data, length, flags);
+}
+
+/// A combination that the card cannot encode is a wrong option: no new start mends it.
+void check_settings(int status, const char *call) {
+  if (status == ZV_ERR_CONFIG)
+    throw UsageError(std::string("--channels, --scale, --rate: ") + status_text(status));
+  check(status, call);
 }
 
 /// The card keeps what an earlier program has set: sets everything that the recording depends on.
@@ -30,8 +39,8 @@ void configure(HANDLE card, const Options &options) {
   config.CBREnable = options.bit_rate != 0 ? 1 : 0;
   for (u32 channel = 0; channel < ZV_CHANNELS; ++channel)
     if (options.channels >> channel & 1u)
-      check(zv_SetVideoEncodeConfig(card, channel, &config), "zv_SetVideoEncodeConfig");
-  check(zv_EnableVideoRecordChannels(card, options.channels), "zv_EnableVideoRecordChannels");
+      check_settings(zv_SetVideoEncodeConfig(card, channel, &config), "zv_SetVideoEncodeConfig");
+  check_settings(zv_EnableVideoRecordChannels(card, options.channels), "zv_EnableVideoRecordChannels");
   check(zv_EnableAudioChannels(card, options.audio), "zv_EnableAudioChannels");
   check(zv_StartMotionDetection(card), "zv_StartMotionDetection");
 }

@@ -201,6 +201,7 @@ TEST(RecorderOptions, AreTakenOrRefusedWithALine) {
   EXPECT_EQ(std::tuple(fields.root, fields.channels, fields.audio, fields.gop),
             std::tuple("/", 0xFu, 0u, 50u));
   EXPECT_EQ(stream_rate(fields, 3), 50);
+  EXPECT_EQ(std::pair(parse("--root r --rate 15").gop, parse("--root r --rate 1.2").gop), std::pair(15u, 1u));
   const Options many =
       parse("--root r --rate 7.5 --bps 1M --buffer 2 --sync 9 --when-full delete-oldest --gop 7");
   EXPECT_EQ(recording::frame_rate_list(many.standard)[many.rate], std::string("7.5"));
