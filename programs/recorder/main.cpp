@@ -1,5 +1,6 @@
 // zarvo_recorder: records channels of the card for months, without a window.
 #include <signal.h>
+#include <unistd.h>
 
 #include <atomic>
 #include <cstdio>
@@ -32,9 +33,9 @@ void tell_service(const std::string &line, bool frames_come) {
   recorder::notify("STATUS=" + line + (frames_come ? "\nWATCHDOG=1" : ""));
 }
 
+/// A reader that does not read costs lines, but never holds up what else this thread does.
 void print(const std::string &text) {
-  std::fputs(text.c_str(), stdout);
-  std::fflush(stdout);
+  recorder::print_in_time(STDOUT_FILENO, text);
 }
 
 /// Watches the recording until a signal ends it.
