@@ -3,6 +3,7 @@
 
 #include <sys/stat.h>
 
+#include <cerrno>
 #include <charconv>
 #include <cstdio>
 #include <string_view>
@@ -37,8 +38,9 @@ std::optional<unsigned> number_in(std::string_view digits) {
   return error == std::errc{} && end == last ? std::optional(number) : std::nullopt;
 }
 
-void make_folder(const std::string &path) {
-  mkdir(path.c_str(), 0777);
+/// Returns 0 if the folder exists now, else an errno.
+int make_folder(const std::string &path) {
+  return mkdir(path.c_str(), 0777) == 0 || errno == EEXIST ? 0 : errno;
 }
 
 }  // namespace
@@ -104,12 +106,16 @@ std::string extension_of(Kind kind) {
   return row_of(kind).extension;
 }
 
-void make_day_folder(const std::string &root, Kind kind, const std::tm &time) {
-  make_folder(kind_folder(root, kind));
+int make_day_folder(const std::string &root, Kind kind, const std::tm &time) {
+  int first_error = make_folder(kind_folder(root, kind));
+  const auto make = [&first_error](const std::string &path) {
+    const int error = make_folder(path);
+    if (first_error == 0) first_error = error;
+  };
   const std::string day = day_folder(root, kind, time);
-  make_folder(day);
-  for (unsigned channel = 0; channel < row_of(kind).channels; ++channel)
-    make_folder(channel_folder(day, channel));
+  make(day);
+  for (unsigned channel = 0; channel < row_of(kind).channels; ++channel) make(channel_folder(day, channel));
+  return first_error;
 }
 
 }  // namespace recording

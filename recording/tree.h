@@ -45,8 +45,8 @@ std::optional<unsigned> parse_channel_folder(const std::string &name);
 std::string extension_of(Kind kind);
 
 /// Creates the folders of a kind and a day, with all channel folders, if they are missing. The root must
-/// exist. Reports no error: if a folder cannot be created, opening a file in it fails.
-void make_day_folder(const std::string &root, Kind kind, const std::tm &time);
+/// exist. Returns 0 or the errno of the first folder that cannot be created.
+int make_day_folder(const std::string &root, Kind kind, const std::tm &time);
 
 }  // namespace recording
 
