@@ -3,6 +3,7 @@
 
 #include <unistd.h>
 
+#include <cerrno>
 #include <utility>
 
 namespace recorder {
@@ -32,6 +33,7 @@ void IndexWriter::add(Kind kind, std::int64_t time, std::int64_t offset) {
 
 void IndexWriter::begin(int file, std::int64_t time, std::int64_t offset) {
   file_ = file;
+  error_taken_ = false;
   text_.clear();
   group_ = {};
   start_.kind = Kind::start;
@@ -78,6 +80,15 @@ void IndexWriter::add_last_gap(std::int64_t time, std::int64_t offset, std::uint
   add(event);
 }
 
+void IndexWriter::add_last_loss(std::int64_t offset, std::uint32_t lost) {
+  IndexEntry event;
+  event.kind = Kind::buffer;
+  event.time = end_;
+  event.offset = offset;
+  event.frames = lost;
+  add(event);
+}
+
 void IndexWriter::add_disk_error(std::int64_t time, std::int64_t offset, const std::string &error) {
   IndexEntry event;
   event.kind = Kind::disk;
@@ -101,6 +112,12 @@ void IndexWriter::write() {
   if (file_ < 0 || text_.empty()) return;
   const ssize_t written = ::write(file_, text_.data(), text_.size());
   if (written > 0) text_.erase(0, static_cast<std::size_t>(written));
+  if (written < 0 && !error_taken_) error_ = errno;
+}
+
+int IndexWriter::take_error() {
+  if (error_ != 0) error_taken_ = true;
+  return std::exchange(error_, 0);
 }
 
 }  // namespace recorder

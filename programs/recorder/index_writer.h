@@ -28,6 +28,8 @@ class IndexWriter {
   void add_frame(const Frame &frame, std::int64_t offset, std::uint32_t lost);
   /// Adds a silence that lasts until now, and that the file ends with.
   void add_last_gap(std::int64_t time, std::int64_t offset, std::uint32_t gap_ms);
+  /// Adds the frames that are lost behind the last frame of the file.
+  void add_last_loss(std::int64_t offset, std::uint32_t lost);
   /// Without an index the event goes into the next.
   void add_disk_error(std::int64_t time, std::int64_t offset, const std::string &error);
   /// Adds the last line, and writes. Its time is the end of the last frame or gap: that of the next frame can
@@ -36,6 +38,8 @@ class IndexWriter {
 
   /// Writes the lines that are not yet in the file. What the disk does not take is written by a later call.
   void write();
+  /// Returns the errno of a write that failed, once for each file; else 0.
+  int take_error();
 
  private:
   void add(recording::IndexEntry::Kind kind, std::int64_t time, std::int64_t offset);
@@ -47,6 +51,8 @@ class IndexWriter {
   std::int64_t end_ = 0;                      ///< when the last frame or gap ended
   std::string text_;                          ///< lines that are not yet in the file
   std::vector<recording::IndexEntry> early_;  ///< events that came while there was no index
+  int error_ = 0;                             ///< of a write, until it is taken
+  bool error_taken_ = false;                  ///< in this file
   recording::IndexEntry group_;               ///< the counts since the last intra line
 };
 

@@ -55,6 +55,9 @@ class Intake {
   /// Returns how long a stream has been silent, in milliseconds; 0 if that is no gap, and before its first
   /// frame.
   std::uint32_t silence_ms(unsigned stream, Clock::time_point now) const;
+  /// Returns how many frames found the buffer full since the last frame that is in it. Call it when no
+  /// callback runs any more.
+  std::uint32_t last_loss(unsigned stream) const { return losses_[stream].frames; }
 
  private:
   /// What the next frame of a stream tells of those before it. Belongs to the thread of the SDK.

@@ -103,8 +103,8 @@ StreamFiles::StreamFiles(const Options &options, RootLock &lock, unsigned stream
       index_(start_entry(options), period_of(options, stream), least_group(stream)) {}
 
 StreamFiles::~StreamFiles() {
-  retire();
-  for (const int file : retired_) close(file);
+  end_file();
+  for (const Retired &retired : retired_) close(retired.file);
 }
 
 void StreamFiles::queue(const Ring::Taken &taken) {
@@ -119,6 +119,10 @@ void StreamFiles::queue(const Ring::Taken &taken) {
 int StreamFiles::write() {
   while (!queue_.empty()) {
     const Frame &first = *queue_.front().frame;
+    if (!is_open() && !first.intra) {
+      drop_until(oldest());  // its file has gone
+      continue;
+    }
     if (!belongs_here(first))
       if (const int error = change_file(first)) return error;
     if (const int error = write_batch()) return error;
@@ -132,7 +136,7 @@ bool StreamFiles::belongs_here(const Frame &frame) const {
 }
 
 int StreamFiles::change_file(const Frame &first) {
-  retire();
+  end_file();
   hour_ = hour_of(first.time);
   if (const int error = create_part()) return error;
   replace_ = false;
@@ -172,7 +176,7 @@ int StreamFiles::create_part() {
     if (has_index || errno == EEXIST) {
       ++part;
     } else if (errno == ENOENT && !folders_made) {
-      recording::make_day_folder(options_.root, kind, hour_.local);
+      if (const int error = recording::make_day_folder(options_.root, kind, hour_.local)) return error;
       folders_made = true;
     } else {
       return errno;
@@ -218,7 +222,7 @@ int StreamFiles::write_batch() {
 /// Ends the file, and drops what belongs to the group that it ends with: the next file begins with an intra
 /// frame.
 void StreamFiles::skip_group() {
-  retire();
+  end_file();
   drop_until(oldest());
 }
 
@@ -236,32 +240,30 @@ void StreamFiles::note_disk_error(std::int64_t time, int error) {
   index_.add_disk_error(time, offset_, error_text(error));
 }
 
-/// Ends the open file. sync() closes it, so that the writer does not wait for the disk at the change of the
-/// hour.
-void StreamFiles::retire() {
+void StreamFiles::end_file() {
   if (file_ < 0) return;
-  retired_.push_back(file_);
+  retired_.push_back({file_, path_});
   file_ = -1;
-  if (const int index = index_.end(offset_); index >= 0) retired_.push_back(index);
+  if (const int index = index_.end(offset_); index >= 0)
+    retired_.push_back({index, recording::index_path(path_)});
 }
 
-int StreamFiles::sync() {
-  int error = 0;
-  const auto sync_file = [&error](int file) {
-    const bool synced = file < 0 || fdatasync(file) == 0;
-    if (!synced) error = errno;
-    return synced;
-  };
-  for (const int file : retired_) {
-    sync_file(file);
+std::vector<Unsynced> StreamFiles::sync() {
+  std::vector<Unsynced> failed;
+  for (const auto &[file, path] : retired_) {
+    if (fdatasync(file) != 0) failed.push_back({path, errno, false});
     close(file);
   }
   retired_.clear();
-  // An index is synced at its end: a recording is good without the last lines.
-  if (!sync_file(file_)) replace_ = true;
+  // An index is synced at its end: a recording is good without the last lines. A file that is to be replaced
+  // is synced at its end too, so that its error is told only once.
+  if (is_open() && !replace_ && fdatasync(file_) != 0) {
+    failed.push_back({path_, errno, true});
+    replace_ = true;
+  }
   if (folder_changed_) sync_folders();
   folder_changed_ = false;
-  return error;
+  return failed;
 }
 
 int StreamFiles::check_place() {
@@ -274,7 +276,7 @@ int StreamFiles::check_place() {
   if (in_place) return 0;
   // A file that was moved takes the rest of its group. A file that was deleted takes nothing any more.
   replace_ = true;
-  if (opened.st_nlink == 0) retire();
+  if (opened.st_nlink == 0) end_file();
   return ENOENT;
 }
 
@@ -289,9 +291,11 @@ void StreamFiles::sync_folders() const {
   }
 }
 
-int StreamFiles::finish(std::int64_t time, std::uint32_t silence_ms) {
+std::vector<Unsynced> StreamFiles::finish(std::int64_t time, std::uint32_t silence_ms, std::uint32_t lost) {
+  lost += static_cast<std::uint32_t>(dropped_ - told_);
+  if (is_open() && lost > 0) index_.add_last_loss(offset_, lost);
   if (is_open() && silence_ms > 0) index_.add_last_gap(time, offset_, silence_ms);
-  retire();
+  end_file();
   return sync();
 }
 

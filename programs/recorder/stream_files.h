@@ -31,6 +31,13 @@ Hour hour_of(std::int64_t time);
 /// Returns what an error of StreamFiles means.
 std::string error_text(int error);
 
+/// A file that could not be written through to the disk.
+struct Unsynced {
+  std::string path;
+  int error;
+  bool is_open;  ///< else it has ended
+};
+
 class StreamFiles {
  public:
   /// Holds the lock of the root whenever it creates a file.
@@ -53,17 +60,22 @@ class StreamFiles {
   /// Returns how many frames have been dropped.
   std::uint64_t dropped() const { return dropped_; }
 
-  /// Writes what has been written through to the disk. Returns 0 or an errno. If the open file could not be
-  /// synced, the next intra frame begins a new file.
-  int sync();
+  /// Writes what has been written through to the disk. Returns the files that failed. If the open file is one
+  /// of them, the next intra frame begins a new file.
+  std::vector<Unsynced> sync();
+  /// Returns an error of the index, once for each file; else 0.
+  int take_index_error() { return index_.take_error(); }
+  /// Ends the open file; sync() closes it, so that the writer does not wait for the disk at the change of the
+  /// hour. The next intra frame begins a new file, and the frames in front of it are dropped.
+  void end_file();
   /// Returns ENOENT, once, if the file is no longer in its folder. The next intra frame then begins a new
   /// file. If the file was deleted, the frames until then are dropped. Call it every second.
   int check_place();
   /// Whether a file is open, and stays open at the next intra frame of its hour.
   bool in_place() const { return file_ >= 0 && !replace_; }
-  /// Ends the file at a time, when the stream has been silent for so long. Returns 0 or the errno of the
-  /// sync.
-  int finish(std::int64_t time, std::uint32_t silence_ms);
+  /// Ends the file at a time, when the stream has been silent for so long. `lost` is how many frames found
+  /// the buffer full since the last frame. Returns the files that could not be synced.
+  std::vector<Unsynced> finish(std::int64_t time, std::uint32_t silence_ms, std::uint32_t lost);
   /// Adds an event to the index.
   void note_disk_error(std::int64_t time, int error);
 
@@ -81,7 +93,6 @@ class StreamFiles {
   int create_index(std::int64_t time);
   int write_batch();
   void skip_group();
-  void retire();
   void sync_folders() const;
 
   const Options &options_;
@@ -99,7 +110,11 @@ class StreamFiles {
   std::int64_t offset_ = 0;      ///< bytes of the file, whole frames only
   bool replace_ = false;         ///< the next intra frame begins a new file
   bool folder_changed_ = false;  ///< the name of the file is not yet on the disk
-  std::vector<int> retired_;     ///< files that have ended, to be synced and closed
+  struct Retired {
+    int file;
+    std::string path;
+  };
+  std::vector<Retired> retired_;  ///< files that have ended, to be synced and closed
 };
 
 }  // namespace recorder

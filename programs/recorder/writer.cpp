@@ -70,6 +70,7 @@ void Writer::run() {
   }
   for (auto &output : outputs_) output->next_try = {};  // the last try
   full_ = false;
+  next_check_ = Clock::time_point::max();  // the last frames may take what must stay free
   pass(Clock::now());
   end_files();
 }
@@ -78,8 +79,10 @@ void Writer::pass(Clock::time_point now) {
   if (now >= next_check_) {
     next_check_ = now + kCheck;
     check_space(now);
-    for (auto &output : outputs_)
+    for (auto &output : outputs_) {
       if (const int error = output->files.check_place()) report_error(*output, error);
+      tell_index_error(*output);
+    }
   }
   take_frames(intake_.video());
   take_frames(intake_.audio());
@@ -96,12 +99,15 @@ void Writer::take_frames(Ring &ring) {
   for (Ring::Taken taken = ring.take(); taken.frame != nullptr; taken = ring.take()) {
     const Frame &frame = *taken.frame;
     if (frame.gap_ms > 0) tell_gap(frame.stream, frame.gap_ms, frame.time);
-    if (frame.lost > 0)
-      messages_.add(stream_name(frame.stream) + ": the buffer was full: " + std::to_string(frame.lost) +
-                        (is_video(frame.stream) ? " frames" : " blocks") + " are lost",
-                    frame.time);
+    if (frame.lost > 0) tell_loss(frame.stream, frame.lost, frame.time);
     by_stream_[frame.stream]->files.queue(taken);
   }
+}
+
+void Writer::tell_loss(unsigned stream, std::uint32_t lost, std::int64_t time) {
+  messages_.add(stream_name(stream) + ": the buffer was full: " + std::to_string(lost) +
+                    (is_video(stream) ? " frames" : " blocks") + " are lost",
+                time);
 }
 
 void Writer::tell_gap(unsigned stream, std::uint32_t gap_ms, std::int64_t time) {
@@ -157,15 +163,30 @@ void Writer::make_room(Ring &ring, bool video) {
 
 void Writer::sync(Output &output, Clock::time_point now) {
   output.next_sync = now + options_.sync;
-  if (const int error = output.files.sync()) {
-    report_error(output, error);
+  report_unsynced(output, output.files.sync(), now);
+}
+
+/// Only an error of the open file makes the stream pause: the others have ended.
+void Writer::report_unsynced(Output &output, const std::vector<Unsynced> &files, Clock::time_point now) {
+  for (const Unsynced &file : files) {
+    messages_.add(stream_name(output.stream) + ": " + file.path + ": " + error_text(file.error) + ": up to " +
+                  std::to_string(options_.sync.count()) + " s may be lost");
+    if (!file.is_open) continue;
+    output.error = file.error;
+    output.files.note_disk_error(wall_ms(), file.error);
     output.next_try = now + kRetry;
   }
 }
 
+void Writer::tell_index_error(Output &output) {
+  if (const int error = output.files.take_index_error())
+    messages_.add(stream_name(output.stream) + ": index: " + error_text(error) + ": lines may be missing");
+}
+
 void Writer::check_space(Clock::time_point now) {
   free_ = recorder::free_percent(options_.root).value_or(-1);
-  const bool low = free_ >= 0 && free_ < options_.min_free;
+  if (free_ < 0) return;  // the root is away
+  const bool low = free_ < options_.min_free;
   const bool full = low && !(options_.delete_oldest && make_space(now));
   if (full == full_) return;
   full_ = full;
@@ -182,14 +203,29 @@ void Writer::check_space(Clock::time_point now) {
 bool Writer::make_space(Clock::time_point now) {
   if (!pause_.is_over(now, free_)) return true;
   if (lock_.hold() != 0) return false;
-  std::set<std::string> kept{name_of(hour_of(wall_ms()))};
-  for (const auto &output : outputs_)
-    if (output->files.is_open()) kept.insert(name_of(output->files.hour()));
-  const std::string hour = delete_oldest_hour(options_.root, kept);
+  const std::string hour = delete_hour(now);
   if (hour.empty()) return false;
   pause_ = {now + kRetry, free_};
+  free_ = recorder::free_percent(options_.root).value_or(free_);
   messages_.add("deleted the recordings of hour " + hour + " to make room");
   return true;
+}
+
+/// Deletes the oldest hour and returns it. An hour of an open file goes last: a file keeps the rest of its
+/// group when the hour changes, unless there is no other space.
+std::string Writer::delete_hour(Clock::time_point now) {
+  const std::string current = name_of(hour_of(wall_ms()));
+  std::set<std::string> kept{current};
+  for (const auto &output : outputs_)
+    if (output->files.is_open()) kept.insert(name_of(output->files.hour()));
+  std::string hour = delete_oldest_hour(options_.root, kept);
+  if (!hour.empty() || kept.size() == 1) return hour;
+  for (auto &output : outputs_) {
+    if (!output->files.is_open() || name_of(output->files.hour()) == current) continue;
+    output->files.end_file();
+    sync(*output, now);  // closes it: a file that is open keeps its space
+  }
+  return delete_oldest_hour(options_.root, {current});
 }
 
 void Writer::end_files() {
@@ -199,7 +235,10 @@ void Writer::end_files() {
     tell_dropped(*output);
     const std::uint32_t silence_ms = intake_.silence_ms(output->stream, end_);
     if (silence_ms > 0) tell_gap(output->stream, silence_ms, end_wall_);
-    if (const int error = output->files.finish(end_wall_, silence_ms)) report_error(*output, error);
+    const std::uint32_t lost = intake_.last_loss(output->stream);
+    if (lost > 0) tell_loss(output->stream, lost, wall_ms());
+    report_unsynced(*output, output->files.finish(end_wall_, silence_ms, lost), {});
+    tell_index_error(*output);
   }
 }
 

@@ -61,9 +61,13 @@ class Writer {
   void make_room(Ring &ring, bool video);
   void sync(Output &output, Clock::time_point now);
   void report_error(Output &output, int error);
+  void report_unsynced(Output &output, const std::vector<Unsynced> &files, Clock::time_point now);
+  void tell_index_error(Output &output);
+  void tell_loss(unsigned stream, std::uint32_t lost, std::int64_t time);
   void tell_gap(unsigned stream, std::uint32_t gap_ms, std::int64_t time);
   void check_space(Clock::time_point now);
   bool make_space(Clock::time_point now);
+  std::string delete_hour(Clock::time_point now);
   void end_files();
 
   const Options &options_;

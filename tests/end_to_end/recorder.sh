@@ -164,13 +164,13 @@ case $1 in
     goes_on
     mount --bind "$ROOT" "$ROOT"
     mount -o remount,bind,ro "$ROOT"
-    set_clock '2026-11-25 15:10:00'
+    set_clock '2026-11-26 00:10:00'
     wait_told "channel 16: .*: Read-only file system"
     umount "$ROOT"
-    wait_told 'channel 16: goes on in .*15.rec'
+    wait_told 'channel 16: goes on in .*00.rec'
     goes_on
     mv "$ROOT" "$ROOT.away"
-    wait_told 'channel 16: .*15.rec: No such file'
+    wait_told 'channel 16: .*00.rec: No such file'
     mv "$ROOT.away" "$ROOT"
     goes_on
     stop
@@ -179,7 +179,7 @@ case $1 in
     expect "no disk error in the index" test "$(files idx | xargs cat | grep -c '"disk"')" -ge 32
     ROOT=$MOUNT
     ;;
-  # The oldest hours make room, the current one stays.
+  # The oldest hours make room, the current one stays, also while its files are paused.
   delete)
     small_disk 16m
     mkdir -p "$ROOT"/{Video,Audio}/20261120/CH01
@@ -189,9 +189,14 @@ case $1 in
     wait_told 'deleted the recordings of hour 20261120-10'
     wait_told 'deleted the recordings of hour 20261120-11'
     wait_told 'recording pauses'
+    expect_equal "recordings" 16 "$(files rec | wc -l)"
+    set_clock '2026-11-25 15:10:00'
+    wait_told 'deleted the recordings of hour 20261125-14'
+    wait_told 'recording goes on'
+    goes_on
     stop
     expect "an old folder stays" test ! -e "$ROOT/Video/20261120"
-    expect_equal "recordings" 16 "$(files rec | wc -l)"
+    expect_equal "recordings of the last hour" 16 "$(files rec -name '*-15.rec' | wc -l)"
     ;;
   # Both fields of each frame. Catches: a clip that plays at half the speed.
   fields)
@@ -267,11 +272,19 @@ case $1 in
       "$(grep -xE 'READY=1|STOPPING=1' "$FOLDER/notified" | paste -sd ' ')"
     expect "no gap in the index" test "$(index_sum ms '"gap"')" -ge 4000
     expect_equal "files" 6 "$(find "$ROOT" -type f ! -name '.*' | wc -l)"
-    for wrong in '--rate 29' '--bps 3M --qp 4' '--min-free 0' '--standard pal --rate 30' 'word'; do
+    for wrong in '--rate 29' '--bps 3M --qp 4' '--min-free 0' '--standard pal --rate 30' 'word' '--scale d1 --channels 1-16'; do
       status=0
       # shellcheck disable=SC2086 # options are words
-      "$ZARVO_RECORDER" --root "$ROOT" $wrong 2>"$ERR" || status=$?
+      "${ON_CARD[@]}" "$ZARVO_RECORDER" --root "$ROOT" $wrong 2>"$ERR" || status=$?
       expect_equal "status for $wrong ($(cat "$ERR"))" 2 "$status"
     done
+    # Catches: a recorder that waits for ever for a reader that does not read.
+    mkfifo "$FOLDER/full"
+    exec 3<>"$FOLDER/full"
+    head -c 65536 /dev/zero >&3
+    OUT=$FOLDER/full start --channels 1 --audio none
+    kill -USR1 "$RECORDER"
+    kill -TERM "$RECORDER"
+    expect "a reader holds the recorder up" wait_until 30 process_gone "$RECORDER"
     ;;
 esac

@@ -13,10 +13,19 @@
 #include "programs/recorder/stream_files.h"
 #include "recorder_test.h"
 
+namespace fs = std::filesystem;
+
+static std::string broken_file;  // its name; a sync of it fails
+
+extern "C" int fdatasync(int file) {
+  if (fs::read_symlink("/proc/self/fd/" + std::to_string(file)).filename() != broken_file) return fsync(file);
+  errno = EIO;
+  return -1;
+}
+
 namespace recorder {
 namespace {
 
-namespace fs = std::filesystem;
 using recording::IndexEntry;
 using testing::ElementsAre;
 
@@ -91,7 +100,7 @@ TEST_F(StreamFilesTest, NewHourBeginsWithItsFirstIntraFrame) {
   give(kTwoOClock + 20, true, 7);
   give(kTwoOClock + 60, true, 8);
   EXPECT_EQ(files->write(), 0);
-  EXPECT_EQ(files->finish(kTwoOClock + 100, 0), 0);
+  EXPECT_TRUE(files->finish(kTwoOClock + 100, 0, 0).empty());
   EXPECT_THAT(marks("20251125-13.rec"), ElementsAre(1, 2, 3));
   EXPECT_THAT(marks("20251125-14.rec"), ElementsAre(4, 5));
   EXPECT_THAT(marks("20251125-13.1.rec"), ElementsAre(6));
@@ -182,17 +191,39 @@ TEST_F(StreamFilesTest, VanishedRootIsToldAndComesBack) {
   EXPECT_THAT(marks("20251125-14.1.rec"), ElementsAre(2, 3));
 }
 
-// Catches: frames that are counted as recorded although their file has been deleted.
+// Catches: frames that are counted as recorded although their file has been deleted, and a file that begins
+// in the middle of a group.
 TEST_F(StreamFilesTest, FramesForADeletedFileAreCountedAsDropped) {
   give(kTwoOClock, true, 1);
   ASSERT_EQ(files->write(), 0);
   fs::remove(path("20251125-14.rec"));
   EXPECT_EQ(files->check_place(), ENOENT);
   give(kTwoOClock + 40, false, 2);
-  files->drop_until(0);
-  EXPECT_EQ(files->dropped(), 1u);
+  EXPECT_EQ(files->write(), 0);
+  give(kTwoOClock + 80, false, 3);
+  EXPECT_EQ(files->dropped(), 2u);
+  give(kTwoOClock + 120, true, 4);
+  EXPECT_EQ(files->write(), 0);
+  EXPECT_THAT(marks("20251125-14.1.rec"), ElementsAre(4));
+}
+
+// Catches: a sync error that is told of another file, or makes another file end, and one that is told twice.
+TEST_F(StreamFilesTest, SyncErrorNamesItsFile) {
+  give(kTwoOClock - 40, true, 1);
+  for (const bool is_open : {false, true}) {
+    give(kTwoOClock, true, 2);
+    ASSERT_EQ(files->write(), 0);
+    broken_file = is_open ? "20251125-14.rec" : "20251125-13.rec";
+    const std::vector<Unsynced> failed = files->sync();
+    ASSERT_EQ(failed.size(), 1u);
+    EXPECT_EQ(std::tuple(failed[0].path, failed[0].error, failed[0].is_open),
+              std::tuple(path(broken_file), EIO, is_open));
+    EXPECT_TRUE(files->sync().empty());
+  }
+  broken_file.clear();
   give(kTwoOClock + 80, true, 3);
   EXPECT_EQ(files->write(), 0);
+  EXPECT_THAT(marks("20251125-14.rec"), ElementsAre(2, 2));
   EXPECT_THAT(marks("20251125-14.1.rec"), ElementsAre(3));
 }
 
@@ -202,11 +233,12 @@ TEST_F(StreamFilesTest, SilenceIsInNoFile) {
   give(kTwoOClock - 80, true, 1);
   give(kTwoOClock + kHourMs, true, 2, 0, kHourMs + 80);
   EXPECT_EQ(files->write(), 0);
-  EXPECT_EQ(files->finish(kTwoOClock + kHourMs + 5000, 5000), 0);
+  EXPECT_TRUE(files->finish(kTwoOClock + kHourMs + 5000, 5000, 4).empty());
   EXPECT_THAT(index("20251125-13.idx"), ElementsAre("start -80", "intra -80", "stop -47"));
-  EXPECT_THAT(index("20251125-15.idx"),
-              ElementsAre("start 3600000", "gap 3600000", "intra 3600000", "gap 3605000", "stop 3605000"));
-  EXPECT_EQ(recording::read_index(path("20251125-15.idx"))[3].ms, 5000);
+  EXPECT_THAT(index("20251125-15.idx"), ElementsAre("start 3600000", "gap 3600000", "intra 3600000",
+                                                    "buffer 3600033", "gap 3605000", "stop 3605000"));
+  EXPECT_EQ(recording::read_index(path("20251125-15.idx"))[3].frames, 4);
+  EXPECT_EQ(recording::read_index(path("20251125-15.idx"))[4].ms, 5000);
 }
 
 // Catches: a frame that is lost or doubled where a write takes no more frames, or where the hour changes
@@ -234,11 +266,11 @@ TEST_F(StreamFilesTest, AnHourClosesItsFiles) {
   for (int hour = 0; hour < 5; ++hour) {
     give(kTwoOClock + hour * kHourMs, true, 1);
     EXPECT_EQ(files->write(), 0);
-    EXPECT_EQ(files->sync(), 0);
+    EXPECT_TRUE(files->sync().empty());
     if (hour == 0) first = open_files();
   }
   EXPECT_EQ(open_files(), first);
-  EXPECT_EQ(files->finish(kTwoOClock + 5 * kHourMs, 0), 0);
+  EXPECT_TRUE(files->finish(kTwoOClock + 5 * kHourMs, 0, 0).empty());
   EXPECT_EQ(open_files(), first - 2);
   EXPECT_THAT(index("20251125-17.idx"), ElementsAre("start 10800000", "intra 10800000", "stop 10800033"));
 }
@@ -286,7 +318,7 @@ TEST_F(StreamFilesTest, AudioHasNoHeader) {
   files = std::make_unique<StreamFiles>(options, *lock, ZV_CHANNELS + 3);
   for (int n = 0; n < 100; ++n) give(kTwoOClock - 800 + 16 * n, true, 1);
   EXPECT_EQ(files->write(), 0);
-  EXPECT_EQ(files->finish(kTwoOClock + 800, 0), 0);
+  EXPECT_TRUE(files->finish(kTwoOClock + 800, 0, 0).empty());
   const fs::path folder = options.root + "/Audio/20251125/CH04";
   for (const char *hour : {"20251125-13", "20251125-14"}) {
     const auto lines = recording::read_index(folder / (std::string(hour) + ".idx"));

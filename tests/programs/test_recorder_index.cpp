@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <cstdio>
 #include <sstream>
 
@@ -52,7 +53,7 @@ TEST_F(IndexWriterTest, AudioHasALineASecondAndBehindAGap) {
 }
 
 // Catches: a line that is torn or lost where the disk takes a part of what is written, and text that grows
-// for ever while it takes nothing.
+// for ever while it takes nothing; an error that is told at each try, or not at all.
 TEST_F(IndexWriterTest, KeepsWhatTheDiskDoesNotTake) {
   int ends[2];
   ASSERT_EQ(pipe2(ends, O_NONBLOCK), 0);
@@ -70,6 +71,10 @@ TEST_F(IndexWriterTest, KeepsWhatTheDiskDoesNotTake) {
     return size > 0;
   };
   for (frame.time = 1; frame.time <= 5000; ++frame.time) index.add_frame(frame, 32, 0);
+  index.write();
+  index.write();
+  EXPECT_EQ(index.take_error(), EAGAIN);
+  EXPECT_EQ(index.take_error(), 0);
   while (write_and_read()) continue;
   std::istringstream lines(text);
   std::int64_t count = -1;  // without the line "start"

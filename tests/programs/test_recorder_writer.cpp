@@ -150,41 +150,48 @@ TEST_F(WriterTest, RootThatStaysAwayIsCounted) {
                                      HasSubstr("audio input 2: 5 could not be written and are lost")));
 }
 
-// Catches: a full disk that costs the frames that the buffer still holds at the end, and a pause that nobody
-// hears of.
+// Catches: a full disk that costs the frames that the buffer still holds at the end, a pause that nobody
+// hears of, and one that ends because the root is away.
 TEST_F(WriterTest, FullDiskPauses) {
   options.min_free = 101;
   start();
   feed();
   ASSERT_TRUE(eventually([this] { return told().find("recording pauses") != std::string::npos; }));
   EXPECT_TRUE(recorded(0).empty());
+  fs::rename(options.root, options.root + ".away");
+  ASSERT_TRUE(eventually([this] { return writer->free_percent() < 0; }));
   feed();
+  fs::rename(options.root + ".away", options.root);
   writer->finish();
   EXPECT_EQ(recorded(3), given[3]);
-  EXPECT_THAT(told(), HasSubstr("--min-free is 101"));
+  EXPECT_THAT(told(), testing::AllOf(HasSubstr("--min-free is 101"), testing::Not(HasSubstr("goes on"))));
 }
 
 // Catches: a stream that was silent when the recording ended, and whose file looks as if it had recorded
-// until then.
+// until then; frames that found the buffer full at the end, in no line and in no index.
 TEST_F(WriterTest, SilenceAtTheEndIsAGap) {
   start();
   feed();
-  ASSERT_TRUE(eventually([this] { return intake->silence_ms(ZV_CHANNELS + 1, Clock::now()) > 0; }));
+  const std::vector<u8> too_long = frame_data(true, options.buffer);
+  intake->take(0, too_long.data(), static_cast<i32>(too_long.size()), 0);
+  ASSERT_TRUE(eventually([this] { return intake->silence_ms(0, Clock::now()) > 0; }));
   writer->note_end();
   writer->finish();
-  EXPECT_THAT(told(), testing::AllOf(HasSubstr("channel 4: gap of "), HasSubstr("audio input 2: gap of ")));
-  unsigned indexes = 0;
+  EXPECT_THAT(told(), testing::AllOf(HasSubstr("channel 4: gap of "), HasSubstr("audio input 2: gap of "),
+                                     HasSubstr("channel 1: the buffer was full: 1 frames are lost")));
+  unsigned indexes = 0, losses = 0;
   for (const auto &entry : fs::recursive_directory_iterator(options.root)) {
     if (entry.path().extension() != ".idx") continue;
     ++indexes;
     const auto index = recording::read_index(entry.path());
+    losses += index.at(index.size() - 3).kind == recording::IndexEntry::Kind::buffer ? 1 : 0;
     const recording::IndexEntry &gap = index.at(index.size() - 2);
     EXPECT_EQ(gap.kind, recording::IndexEntry::Kind::gap);
     EXPECT_GE(gap.ms, 200);
     EXPECT_EQ(index.back().kind, recording::IndexEntry::Kind::stop);
     EXPECT_EQ(index.back().time, gap.time);
   }
-  EXPECT_EQ(indexes, 3u);
+  EXPECT_EQ(std::pair(indexes, losses), std::pair(3u, 1u));
 }
 
 }  // namespace
