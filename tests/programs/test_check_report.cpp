@@ -58,7 +58,7 @@ class CheckReport : public testing::Test {
   PreparedBench bench;
   int status = -1;
   const Check holds = check_of("one.holds", [](Bench &) { return held(); });
-  const Check breaks = check_of("two.breaks", [](Bench &) { return broken("a\tb", "c\xFF\nd"); });
+  const Check breaks = check_of("two.breaks", [](Bench &) { return broken("a\tb", "c\xFF\ne"); });
   const Check skips = check_of("one.skips", [](Bench &) { return skipped("no camera"); });
   const Check throws =
       check_of("two.throws", [](Bench &) -> Result { throw std::out_of_range("the driver lies"); });
@@ -75,7 +75,7 @@ TEST_F(CheckReport, TapTellsEachCheckAndCountsTheThemes) {
             "TAP version 14\n1..4\n"
             "ok 1 - one.holds\n"
             "not ok 2 - two.breaks\n  ---\n  proves: \"It \\\"works\\\".\"\n  expected: \"a\\tb\"\n"
-            "  got: \"c\uFFFD\\nd\"\n  meaning: \"Nothing: nowhere\"\n  ...\n"
+            "  got: \"c\uFFFD\\ne\"\n  meaning: \"Nothing: nowhere\"\n  ...\n"
             "ok 3 - one.skips # SKIP no camera\n"
             "not ok 4 - two.throws\n  ---\n  proves: \"It \\\"works\\\".\"\n"
             "  expected: \"the check can be carried out\"\n  got: \"the driver lies\"\n"
@@ -92,7 +92,7 @@ TEST_F(CheckReport, JsonTellsTheSame) {
   const auto &checks = document["checks"];
   ASSERT_EQ(checks.size(), 4u);
   EXPECT_EQ(checks[1]["expected"], "a\tb");
-  EXPECT_EQ(checks[1]["got"], "c\uFFFD\nd");
+  EXPECT_EQ(checks[1]["got"], "c\uFFFD\ne");
   EXPECT_EQ(checks[2]["outcome"], "skipped");
   EXPECT_EQ(checks[2]["reason"], "no camera");
   EXPECT_EQ(document["themes"].dump(),
