@@ -76,6 +76,12 @@ TEST_F(ExportList, TellsTimesMotionAndGaps) {
   EXPECT_THAT(table, HasSubstr(" 16:00:00  no index                             /"));
 }
 
+TEST_F(ExportList, AddsUpTheLosses) {
+  std::vector<IndexEntry> index(4);
+  for (IndexEntry &entry : index) entry.kind = Kind::buffer, entry.frames = 7;
+  EXPECT_EQ(contents_of(index).lost_frames, 28);
+}
+
 // Catches: a bar at the wrong time or in the row of another channel.
 TEST_F(ExportList, DrawsBarsAtTheirTimes) {
   record("20261125-14", {{"14:00:00", 250}, {"14:00:50", 250}});

@@ -92,7 +92,10 @@ TEST_P(IndexFit, OfAudioEndsWhereTheFileEnds) {
     std::ofstream(audio_) << std::string(size, 'x');
     return believed(audio_, index);
   };
+  const auto open_files = [] { return std::distance(fs::directory_iterator("/proc/self/fd"), {}); };
+  const auto before = open_files();
   EXPECT_EQ(of_size(48000 + 180000), 3);  // killed
+  EXPECT_EQ(open_files(), before);
   EXPECT_EQ(of_size(48000 + 180048), 0);
   EXPECT_EQ(of_size(47952), 0);
   index[2].kind = Kind::stop;

@@ -62,6 +62,8 @@ TEST_F(Picture, PropertiesSurviveARoundTrip) {
 TEST_F(Picture, MotionThresholdsAndAreas) {
   EXPECT_EQ(sent(zv_SetMotionSensitivity(handle, 3, 0x1234)),
             "VIN_IOC_SET_MOTION_MAP 3 0 0 64 64: 4096 x 4660; write 0x268 ffff");
+  EXPECT_EQ(sent(zv_SetMotionSensitivity(handle, 5, 65535)),  // the highest: never
+            "VIN_IOC_SET_MOTION_MAP 5 0 0 64 64: 4096 x 65535; write 0x268 ffff");
   struct Area {
     ZV_RECT rect;
     u32 mark;
