@@ -15,7 +15,7 @@ const char *__lsan_default_options() {
 }
 
 int main(int argc, char **argv) {
-  qputenv("QT_QPA_PLATFORM", "offscreen");
+  if (!qEnvironmentVariableIsSet("QT_QPA_PLATFORM")) qputenv("QT_QPA_PLATFORM", "offscreen");
   qputenv("SDL_VIDEODRIVER", "dummy");
   testing::InitGoogleMock(&argc, argv);
   const QApplication application(argc, argv);

@@ -124,5 +124,9 @@ for scale in 150 200; do
   picture "$DIALOG" "$FOLDER/scale-$scale.png"
   expect "the dialog is $DIALOG_HEIGHT lines high at $scale %" test "$DIALOG_HEIGHT" -ge $((780 * scale / 100))
   end_program
+  for style in fusion windows; do
+    QT_STYLE_OVERRIDE=$style "$ZARVO_BUILD/tests/app/test_dialog" --gtest_filter='DialogTest.ClipsNothing*:DialogTest.EveryText*' \
+      >"$FOLDER/clips" 2>&1 || die "text is clipped in the style $style at $scale %: $(cat "$FOLDER/clips")"
+  done
   close_display
 done
