@@ -29,9 +29,9 @@ TEST_F(ExportList, OnlyRecordingsAreListedInTheirOrder) {
     record(name, {{"14:00", 1}});
   fs::create_directories(root_ / "Video/20261125/CH01");
   fs::create_directories(root_ / "Video/notes/CH0x");
-  std::ofstream(root_ / "Video/20261125/CH01/20261126-00.rec");
-  std::ofstream(root_ / "Video/20261125/CH01.rec");
-  std::ofstream(root_ / "Video/notes/CH0x/20261125-14.rec");
+  std::ofstream(root_ / "Video/20261125/CH01/20261126-00.rec") << "";
+  std::ofstream(root_ / "Video/20261125/CH01.rec") << "";
+  std::ofstream(root_ / "Video/notes/CH0x/20261125-14.rec") << "";
   for (const char *name :
        {"20261125-24.rec", "20261125-14.x.rec", "20261125-14..rec", "20261125-1a.rec", "20261125.rec",
         "20261125-14.rec.part", "20261125-14.1.2.rec", "20261125-14.99999999999.rec", "-14.rec", ".rec",
