@@ -184,7 +184,8 @@ TABLE
     expect_equal "frames that are not in the recordings" '' \
       "$(comm -13 <(source_hashes 0 8 | sort) <(hashes -i "$FOLDER/clip.mkv" | sort))"
     kept=$(times "$FOLDER/clip.mkv")
-    expect "$(wc -w <<<"$kept") frames" test "$(wc -w <<<"$kept")" -gt 220
+    source=$(source_hashes 0 8 | wc -l) # a slow machine misses frames
+    expect "$(wc -w <<<"$kept") of $source frames" test "$(wc -w <<<"$kept")" -ge $((source - 21))
     expect "the frame behind the damaged ones has moved" grep -qx 2002 <<<"$kept"
 
     # Only a decoder sees this.
