@@ -1,6 +1,5 @@
 // What zarvo_export lists: which files it takes for recordings, and what it says of them.
 #include <nlohmann/json.hpp>
-#include <regex>
 
 #include "export_tree.h"
 #include "programs/export/listing.h"
@@ -89,11 +88,18 @@ TEST_F(ExportList, DrawsBarsAtTheirTimes) {
   draw(rows(), root_ / "list.svg", false);
   std::ifstream file(root_ / "list.svg");
   const std::string svg((std::istreambuf_iterator<char>(file)), {});
-  const std::regex bar("<rect x='([^']*)' y='([^']*)' width='([^']*)' [^>]*><title>([a-z]*) ?2026");
+  const auto behind = [&svg](const std::string &mark, char end, std::size_t at) {
+    const std::size_t begin = svg.find(mark, at) + mark.size();
+    return svg.substr(begin, svg.find(end, begin) - begin);
+  };
   std::vector<std::string> bars;
-  for (std::sregex_iterator at(svg.begin(), svg.end(), bar), end; at != end; ++at)
-    bars.push_back((*at)[4].str() + " " + (*at)[1].str() + "+" + (*at)[3].str() + " " + (*at)[2].str());
-  EXPECT_THAT(bars, ElementsAre(" 90+600 60", "gap 190+400 58", " 90+1000 86"));
+  for (std::size_t at = 0; (at = svg.find("<rect x='", at)) != std::string::npos; ++at) {
+    const std::string title = behind("<title>", '<', at);
+    if (svg.find("<title>", at) > svg.find('\n', at) || title.find("2026") == std::string::npos) continue;
+    bars.push_back(title.substr(0, title.find("2026")) + "|" + behind("x='", '\'', at) + "+" +
+                   behind("width='", '\'', at) + " " + behind(" y='", '\'', at));
+  }
+  EXPECT_THAT(bars, ElementsAre("|90+600 60", "gap |190+400 58", "|90+1000 86"));
   EXPECT_THROW(draw(rows(), root_ / "list.svg", false), std::runtime_error);
 }
 
