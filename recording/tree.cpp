@@ -8,6 +8,7 @@
 #include <cstdio>
 #include <string_view>
 
+#include "recording/wall_time.h"
 #include "zv_type.h"
 
 namespace recording {
@@ -46,11 +47,8 @@ int make_folder(const std::string &path) {
 }  // namespace
 
 std::tm local_time() {
-  const std::time_t now = std::time(nullptr);
-  std::tm fields{};
   tzset();
-  localtime_r(&now, &fields);
-  return fields;
+  return local_fields(std::int64_t{std::time(nullptr)} * 1000);
 }
 
 std::string kind_folder(const std::string &root, Kind kind) {
@@ -67,25 +65,29 @@ std::string channel_folder(const std::string &day_folder, unsigned channel) {
   return day_folder + name;
 }
 
-std::string file_name(Kind kind, const std::tm &time, unsigned part) {
+std::string hour_name(const std::tm &time) {
   char hour[16];
   std::snprintf(hour, sizeof hour, "-%02d", time.tm_hour);
+  return day_name(time) + hour;
+}
+
+std::string file_name(Kind kind, const std::tm &time, unsigned part) {
   const std::string number = part == 0 ? "" : "." + std::to_string(part);
-  return day_name(time) + hour + number + row_of(kind).extension;
+  return hour_name(time) + number + row_of(kind).extension;
 }
 
 std::optional<NamedHour> parse_file_name(const std::string &name) {
-  constexpr std::size_t kDay = 8, kHour = 11;  // the lengths of "20090303" and "20090303-14"
+  constexpr std::size_t kDayLength = 8, kHourLength = 11;  // "20090303", "20090303-14"
   const std::string_view text = name;
-  if (text.size() < kHour || text[kDay] != '-') return std::nullopt;
-  const auto day = number_in(text.substr(0, kDay)), hour = number_in(text.substr(kDay + 1, 2));
+  if (text.size() < kHourLength || text[kDayLength] != '-') return std::nullopt;
+  const auto day = number_in(text.substr(0, kDayLength)), hour = number_in(text.substr(kDayLength + 1, 2));
   if (!day || !hour || *hour > 23) return std::nullopt;
   NamedHour named;
   named.hour.tm_year = static_cast<int>(*day / 10000) - 1900;
   named.hour.tm_mon = static_cast<int>(*day / 100 % 100) - 1;
   named.hour.tm_mday = static_cast<int>(*day % 100);
   named.hour.tm_hour = static_cast<int>(*hour);
-  const std::string_view rest = text.substr(kHour);
+  const std::string_view rest = text.substr(kHourLength);
   if (rest.empty()) return named;
   const std::size_t dot = rest.rfind('.');
   if (dot == std::string_view::npos) return std::nullopt;

@@ -27,6 +27,8 @@ std::tm local_time();
 std::string kind_folder(const std::string &root, Kind kind);
 std::string day_folder(const std::string &root, Kind kind, const std::tm &time);
 std::string channel_folder(const std::string &day_folder, unsigned channel);
+/// Returns an hour as the names of its files begin: "20090303-14".
+std::string hour_name(const std::tm &time);
 /// Returns the name of a file, with the extension of its kind, ".rec" or ".aud". The further parts of an hour
 /// have their number in front of the extension: "20090303-14.1.rec".
 std::string file_name(Kind kind, const std::tm &time, unsigned part = 0);

@@ -1,6 +1,6 @@
 /**
  * @file support.h
- * What every folder of tests needs: waiting for a condition, and what an action prints.
+ * What every folder of tests needs: waiting for a condition, what an action prints, open descriptors.
  */
 #ifndef TESTS_SUPPORT_H
 #define TESTS_SUPPORT_H
@@ -8,6 +8,8 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
+#include <filesystem>
+#include <iterator>
 #include <string>
 #include <thread>
 
@@ -24,6 +26,11 @@ bool eventually(Condition condition) {
     std::this_thread::sleep_for(std::chrono::milliseconds(1));
   }
   return true;
+}
+
+/// Returns how many descriptors this process has open.
+inline std::ptrdiff_t open_files() {
+  return std::distance(std::filesystem::directory_iterator("/proc/self/fd"), {});
 }
 
 /// What `action` and the threads that end within it print.

@@ -13,9 +13,6 @@ constexpr Milliseconds kBlockLength = kBlockSamples * 1000 / kSampleRate;
 /// of the samples is not that of the wall.
 constexpr Milliseconds kSameRun = 2000;
 
-/// A time in the index is when a block reached the recorder. It may be off by this much without a gap.
-constexpr Milliseconds kJitter = 200;
-
 /// Returns how many blocks a file has; 0 if it has vanished.
 std::int64_t blocks_of(const Recording &audio) {
   std::error_code error;
@@ -41,7 +38,7 @@ void add_runs(const std::vector<Recording> &audio, std::size_t file, std::vector
     if (run.blocks <= 0) return;
     // Without an index, the time in front is an estimate.
     run.set_back =
-        !runs.empty() && !audio[runs.back().file].index.empty() && run.start < runs.back().end() - kSameRun;
+        !runs.empty() && !audio[runs.back().file].index.empty() && run.start < runs.back().end() - kSetBack;
     runs.push_back(run);
   };
   for (const recording::IndexEntry &entry : audio[file].index) {
@@ -51,7 +48,7 @@ void add_runs(const std::vector<Recording> &audio, std::size_t file, std::vector
     // The time is that of the block's end.
     const Milliseconds start = entry.time - kBlockLength;
     const Milliseconds late = start - run.start - (block - run.block) * kBlockLength;
-    if (begun && !gap && late <= kJitter && late >= -kSameRun) continue;
+    if (begun && !gap && late <= kJitter && late >= -kSetBack) continue;
     if (begun) end_run(block);
     run = {file, block, 0, start};
     begun = true;

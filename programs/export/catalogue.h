@@ -36,7 +36,7 @@ struct Recording {
   std::optional<Stretch> hour;
   unsigned part = 0;                         ///< 0 for the first file of the hour
   std::vector<recording::IndexEntry> index;  ///< empty if there is none
-  Contents contents;                         ///< of a reduced index
+  Contents contents;                         ///< of a reduced index, and of a listed recording
   std::string doubt;                         ///< says which part of the index does not fit; mostly empty
   std::optional<Milliseconds> start;         ///< when the first frame was recorded, by the index
 };

@@ -18,8 +18,6 @@ constexpr Milliseconds kNear = 1000;
 /// The offset of the first frame of a recording.
 constexpr std::int64_t kFirstFrame = sizeof(RECORD_FILE_HEADER);
 
-/// A step back of the clock; less is jitter.
-constexpr Milliseconds kSetBack = 2000;
 /// The longest time that a frame is shown in mp4. It counts in 32 bits, of up to 60000 ticks a second.
 constexpr Milliseconds kLongestInMp4 = kHour;
 

@@ -69,7 +69,7 @@ void draw_axis(Drawing &drawing, const Stretch &span, double bottom) {
 }
 
 void draw_row(Drawing &drawing, const ListedRecording &row, double y) {
-  const Contents &contents = row.contents;
+  const Contents &contents = row.recording.contents;
   const bool known = row.is_known();
   drawing.bar(contents.recorded, y, kBar, known ? kRecorded : kNoIndex,
               title_of(contents.recorded) + (known ? "" : ", no index"));
@@ -98,15 +98,15 @@ void draw_legend(Drawing &drawing, const Stretch &span) {
 
 void draw(const std::vector<ListedRecording> &rows, const std::string &file, bool force) {
   if (rows.empty()) throw std::runtime_error("nothing is recorded there; nothing is drawn");
-  Stretch span = rows.front().contents.recorded;
+  Stretch span = rows.front().recording.contents.recorded;
   struct Line {
     std::string name;
     double y;
   };
   std::map<std::pair<bool, unsigned>, Line> lines;  // of each channel and input
   for (const ListedRecording &row : rows) {
-    span.from = std::min(span.from, row.contents.recorded.from);
-    span.to = std::max(span.to, row.contents.recorded.to);
+    span.from = std::min(span.from, row.recording.contents.recorded.from);
+    span.to = std::max(span.to, row.recording.contents.recorded.to);
     lines[{!row.video, row.recording.number}] = {row.name(), 0};
   }
   span.to = std::max(span.to, span.from + 1000);

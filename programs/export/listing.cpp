@@ -37,23 +37,24 @@ std::vector<ListedRecording> list_recordings(const Options &options, Report &rep
       find_recordings(options.root, Kind::video, options.channel, options.range, Indexes::reduced);
   std::vector<ListedRecording> rows;
   rows.reserve(video.size());
-  for (const Recording &recording : video) rows.push_back({recording, true, {*recording.hour, {}, {}}});
+  for (const Recording &recording : video) {
+    rows.push_back({recording, true});
+    if (recording.index.empty()) rows.back().recording.contents.recorded = *recording.hour;
+  }
   if (options.channel == 0) {
     const auto audio = find_recordings(options.root, Kind::audio, 0, options.range, Indexes::reduced);
     const auto runs = audio_runs(audio, video);
     for (std::size_t file = 0; file < audio.size(); ++file) {
       const auto run = std::ranges::find(runs, file, &AudioRun::file);
-      if (!audio[file].index.empty())
-        rows.push_back({audio[file], false, {}});
-      else if (run != runs.end())
-        rows.push_back({audio[file], false, {{run->start, run->end()}, {}, {}}});
+      const bool has_index = !audio[file].index.empty();
+      if (!has_index && run == runs.end()) continue;
+      rows.push_back({audio[file], false});
+      if (!has_index) rows.back().recording.contents.recorded = {run->start, run->end()};
     }
   }
-  for (ListedRecording &row : rows) {
-    note_doubt(row.recording, report);
-    if (!row.recording.index.empty()) row.contents = row.recording.contents;
-  }
-  std::erase_if(rows, [&](const auto &row) { return !row.contents.recorded.overlaps(options.range); });
+  for (const ListedRecording &row : rows) note_doubt(row.recording, report);
+  std::erase_if(rows,
+                [&](const auto &row) { return !row.recording.contents.recorded.overlaps(options.range); });
   return rows;
 }
 
@@ -61,7 +62,7 @@ void print_table(const std::vector<ListedRecording> &rows) {
   std::printf("%-11s %-19s  %-19s %9s %9s %6s %9s  %s\n", "", "from", "to", "length", "motion", "gaps",
               "gaps", "file");
   for (const ListedRecording &row : rows) {
-    const auto &[recorded, motion, gaps, lost] = row.contents;
+    const auto &[recorded, motion, gaps, lost] = row.recording.contents;
     std::printf("%-11s %-19s  %-19s ", row.name().c_str(), local_text(recorded.from).c_str(),
                 local_text(recorded.to).c_str());
     const std::string length = row.is_known() ? length_text(recorded.to - recorded.from) : "no index";
@@ -83,12 +84,12 @@ void print_json(const std::vector<ListedRecording> &rows) {
     item[row.video ? "channel" : "audio"] = row.recording.number;
     item["file"] = row.recording.path;
     item["index"] = !row.recording.index.empty();
-    item["from"] = local_text(row.contents.recorded.from);
-    item["to"] = local_text(row.contents.recorded.to);
+    item["from"] = local_text(row.recording.contents.recorded.from);
+    item["to"] = local_text(row.recording.contents.recorded.to);
     if (!row.recording.index.empty()) {
-      if (row.video) item["motion"] = as_json(row.contents.motion);
-      item["gaps"] = as_json(row.contents.gaps);
-      item["lost_frames"] = row.contents.lost_frames;
+      if (row.video) item["motion"] = as_json(row.recording.contents.motion);
+      item["gaps"] = as_json(row.recording.contents.gaps);
+      item["lost_frames"] = row.recording.contents.lost_frames;
     }
     list.push_back(item);
   }

@@ -16,9 +16,8 @@ namespace clips {
 
 /// A row of the list.
 struct ListedRecording {
-  Recording recording;
+  Recording recording;  ///< with its contents; without an index they are the whole clock hour of video
   bool video;
-  Contents contents;  ///< of video without an index the whole clock hour
 
   /// Returns "channel 3" or "audio 2".
   std::string name() const { return (video ? "channel " : "audio ") + std::to_string(recording.number); }

@@ -5,13 +5,6 @@
 #include <cmath>
 
 namespace clips {
-namespace {
-
-/// A time in the index is when a frame reached the recorder. It may be late by this much without a gap.
-constexpr Milliseconds kJitter = 200;
-
-}  // namespace
-
 void Timeline::begin_file(const std::vector<recording::IndexEntry> &index,
                           std::optional<Milliseconds> start) {
   index_ = &index;

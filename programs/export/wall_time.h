@@ -20,6 +20,12 @@ using Milliseconds = std::int64_t;  ///< since 1970, or a length
 
 using recording::hour_begin, recording::kHour, recording::local_text;
 
+/// A time in an index is when a frame or block reached the recorder. It may be late by this much without a
+/// gap.
+inline constexpr Milliseconds kJitter = 200;
+/// A step back of the clock; less is jitter.
+inline constexpr Milliseconds kSetBack = 2000;
+
 /// From `from`, included, to `to`, excluded.
 struct Stretch {
   Milliseconds from = std::numeric_limits<Milliseconds>::min();

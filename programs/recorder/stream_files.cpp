@@ -227,7 +227,7 @@ void StreamFiles::skip_group() {
 }
 
 void StreamFiles::drop_until(std::uint64_t position) {
-  bool any = file_ < 0;
+  bool any = !is_open();
   while (!queue_.empty() && (queue_.front().position < position || (any && !queue_.front().frame->intra))) {
     any = true;
     ++dropped_;
@@ -241,7 +241,7 @@ void StreamFiles::note_disk_error(std::int64_t time, int error) {
 }
 
 void StreamFiles::end_file() {
-  if (file_ < 0) return;
+  if (!is_open()) return;
   retired_.push_back({file_, path_});
   file_ = -1;
   if (const int index = index_.end(offset_); index >= 0)
@@ -257,7 +257,7 @@ std::vector<Unsynced> StreamFiles::sync() {
   retired_.clear();
   // An index is synced at its end: a recording is good without the last lines. A file that is to be replaced
   // is synced at its end too, so that its error is told only once.
-  if (is_open() && !replace_ && fdatasync(file_) != 0) {
+  if (in_place() && fdatasync(file_) != 0) {
     failed.push_back({path_, errno, true});
     replace_ = true;
   }
@@ -267,7 +267,7 @@ std::vector<Unsynced> StreamFiles::sync() {
 }
 
 int StreamFiles::check_place() {
-  if (file_ < 0 || replace_) return 0;
+  if (!in_place()) return 0;
   struct stat at_path {
   }, opened{};
   if (fstat(file_, &opened) != 0) return 0;

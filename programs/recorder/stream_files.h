@@ -72,7 +72,7 @@ class StreamFiles {
   /// file. If the file was deleted, the frames until then are dropped. Call it every second.
   int check_place();
   /// Whether a file is open, and stays open at the next intra frame of its hour.
-  bool in_place() const { return file_ >= 0 && !replace_; }
+  bool in_place() const { return is_open() && !replace_; }
   /// Ends the file at a time, when the stream has been silent for so long. `lost` is how many frames found
   /// the buffer full since the last frame. Returns the files that could not be synced.
   std::vector<Unsynced> finish(std::int64_t time, std::uint32_t silence_ms, std::uint32_t lost);

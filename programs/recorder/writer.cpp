@@ -20,10 +20,8 @@ constexpr auto kPeriod = std::chrono::milliseconds(48);
 constexpr auto kRetry = std::chrono::seconds(10);
 constexpr auto kCheck = std::chrono::seconds(1);
 
-/// Returns an hour as the names of its files begin.
 std::string name_of(const Hour &hour) {
-  const std::string name = recording::file_name(recording::Kind::video, hour.local);
-  return name.substr(0, name.find('.'));
+  return recording::hour_name(hour.local);
 }
 
 }  // namespace

@@ -12,6 +12,7 @@
 
 #include "programs/recorder/stream_files.h"
 #include "recorder_test.h"
+#include "support.h"
 
 namespace fs = std::filesystem;
 
@@ -259,9 +260,6 @@ TEST_F(StreamFilesTest, ManyFramesAreWrittenInOrder) {
 // Catches: descriptors that stay open for ever, and an index that is written to a number that is another file
 // by then.
 TEST_F(StreamFilesTest, AnHourClosesItsFiles) {
-  const auto open_files = [] {
-    return std::distance(fs::directory_iterator("/proc/self/fd"), fs::directory_iterator());
-  };
   std::ptrdiff_t first = 0;
   for (int hour = 0; hour < 5; ++hour) {
     give(kTwoOClock + hour * kHourMs, true, 1);

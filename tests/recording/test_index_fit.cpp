@@ -6,6 +6,7 @@
 
 #include "recording/header.h"
 #include "recording/index.h"
+#include "support.h"
 
 namespace recording {
 namespace {
@@ -92,7 +93,6 @@ TEST_P(IndexFit, OfAudioEndsWhereTheFileEnds) {
     std::ofstream(audio_) << std::string(size, 'x');
     return believed(audio_, index);
   };
-  const auto open_files = [] { return std::distance(fs::directory_iterator("/proc/self/fd"), {}); };
   const auto before = open_files();
   EXPECT_EQ(of_size(48000 + 180000), 3);  // killed
   EXPECT_EQ(open_files(), before);
